@@ -1,0 +1,8 @@
+/* zor: image and signal processing primitives. Include this header. */
+#ifndef ZOR_H
+#define ZOR_H
+
+#include "zortypes.h"
+#include "zorcore.h"
+
+#endif

@@ -1,0 +1,54 @@
+/* Per-level facts for variant code. Each variant source is compiled once
+ * per level with ZOR_LEVEL_<name> defined and that level's instruction
+ * flags; a level refuses to build without the instructions it promises. */
+#ifndef ZOR_LEVEL_CONFIG_H
+#define ZOR_LEVEL_CONFIG_H
+
+#if defined(ZOR_LEVEL_m7)
+#  if !defined(__SSE3__)
+#    error "m7 needs SSE3"
+#  endif
+#  define ZOR_VECTOR_BYTES 16
+#  define ZOR_LEVEL_TEXT "zorIP SSE3 (m7)"
+#elif defined(ZOR_LEVEL_n8)
+#  if !defined(__SSSE3__) || !defined(__MOVBE__)
+#    error "n8 needs SSSE3 and MOVBE"
+#  endif
+#  define ZOR_VECTOR_BYTES 16
+#  define ZOR_LEVEL_TEXT "zorIP Lark (n8)"
+#elif defined(ZOR_LEVEL_y8)
+#  if !defined(__SSE4_2__) || !defined(__POPCNT__)
+#    error "y8 needs SSE4.2 and POPCNT"
+#  endif
+#  define ZOR_VECTOR_BYTES 16
+#  define ZOR_LEVEL_TEXT "zorIP SSE4.2 (y8)"
+#elif defined(ZOR_LEVEL_e9)
+#  if !defined(__AVX__) || defined(__AVX2__)
+#    error "e9 is exactly AVX"
+#  endif
+#  define ZOR_VECTOR_BYTES 32
+#  define ZOR_LEVEL_TEXT "zorIP AVX (e9)"
+#elif defined(ZOR_LEVEL_l9)
+#  if !defined(__AVX2__) || !defined(__FMA__) || !defined(__BMI2__) || defined(__AVX512F__)
+#    error "l9 is AVX2 with FMA, BMI1 and BMI2"
+#  endif
+#  define ZOR_VECTOR_BYTES 32
+#  define ZOR_LEVEL_TEXT "zorIP AVX2 (l9)"
+#elif defined(ZOR_LEVEL_n0)
+/* F and CD only, so that this body runs on any AVX-512 processor. */
+#  if !defined(__AVX512F__) || !defined(__AVX512CD__) || defined(__AVX512BW__) || defined(__AVX512DQ__) || defined(__AVX512VL__)
+#    error "n0 is AVX-512F/CD without BW/DQ/VL"
+#  endif
+#  define ZOR_VECTOR_BYTES 64
+#  define ZOR_LEVEL_TEXT "zorIP AVX-512F/CD/ER/PF (n0)"
+#elif defined(ZOR_LEVEL_k0)
+#  if !defined(__AVX512F__) || !defined(__AVX512CD__) || !defined(__AVX512BW__) || !defined(__AVX512DQ__) || !defined(__AVX512VL__)
+#    error "k0 needs AVX-512F/CD/BW/DQ/VL"
+#  endif
+#  define ZOR_VECTOR_BYTES 64
+#  define ZOR_LEVEL_TEXT "zorIP AVX-512F/CD/BW/DQ/VL (k0)"
+#else
+#  error "variant code must be built for one level"
+#endif
+
+#endif
