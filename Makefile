@@ -21,6 +21,7 @@ test: build
 
 bench: build
 	$(BUILD)/bench/zor_bench
+	if [ -x $(BUILD)/bench/zor_bench_internal ]; then $(BUILD)/bench/zor_bench_internal; fi
 
 clean:
 	rm -rf $(BUILD)

@@ -4,5 +4,6 @@
 
 #include "zortypes.h"
 #include "zorcore.h"
+#include "zors.h"
 
 #endif

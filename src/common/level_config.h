@@ -51,4 +51,12 @@
 #  error "variant code must be built for one level"
 #endif
 
+#define ZOR_PASTE_(a, b) a##_##b
+#define ZOR_PASTE(a, b) ZOR_PASTE_(a, b)
+/* ZOR_NAME(zoriAdd_32f_C1R) is e9_zoriAdd_32f_C1R in the e9 build. */
+#define ZOR_NAME(name) ZOR_PASTE(ZOR_LEVEL, name)
+/* Namespace for everything else a variant defines; the partial link makes
+ * it local as well, this keeps the names apart at compile time. */
+#define ZOR_NS ZOR_PASTE(zor, ZOR_LEVEL)
+
 #endif

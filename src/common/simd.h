@@ -1,0 +1,50 @@
+// Vectors of this level's natural width (16, 32 or 64 bytes) as compiler
+// vector types, with unaligned loads and stores. Kernels written on these
+// compile to SSE, AVX or AVX-512 code from one source; anything that needs
+// a particular instruction goes in a small per-level helper instead.
+#ifndef ZOR_SIMD_H
+#define ZOR_SIMD_H
+
+#include <stdint.h>
+#include <string.h>
+
+#include "level_config.h"
+
+namespace ZOR_NS {
+namespace simd {
+
+constexpr int vectorBytes = ZOR_VECTOR_BYTES;
+
+typedef float vf32 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
+typedef double vf64 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
+typedef uint8_t vu8 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
+typedef uint16_t vu16 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
+typedef int16_t vs16 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
+typedef int32_t vs32 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
+typedef uint32_t vu32 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
+typedef int64_t vs64 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
+
+template <typename V> struct Lanes {
+    typedef __typeof__(V()[0]) Element;
+    static constexpr int count = ZOR_VECTOR_BYTES / sizeof(Element);
+};
+
+// memcpy of a whole vector compiles to one unaligned load or store.
+template <typename V> inline V load(const void* p) {
+    V v;
+    memcpy(&v, p, sizeof v);
+    return v;
+}
+
+template <typename V> inline void store(void* p, V v) {
+    memcpy(p, &v, sizeof v);
+}
+
+template <typename V> inline V broadcast(typename Lanes<V>::Element x) {
+    return V{} + x;
+}
+
+}  // namespace simd
+}  // namespace ZOR_NS
+
+#endif

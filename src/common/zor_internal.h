@@ -1,0 +1,70 @@
+/* Operations that every level has but does not export: other operations
+ * of the same level call them by their prefixed names (ZOR_NAME), and the
+ * tests reach them the same way. Checks as in the public headers: null
+ * pointers -8, then len < 1 -6, unless noted. */
+#ifndef ZOR_INTERNAL_H
+#define ZOR_INTERNAL_H
+
+#include "zortypes.h"
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+ZorStatus zorsAbs_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len);
+ZorStatus zorsSqr_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len);
+/* value == 0 (or -0) returns at once. */
+ZorStatus zorsAddC_32f_I(Zor32f* pSrcDst, int32_t len, Zor32f value);
+/* value == 1 returns at once; value == 0 zero-fills. */
+ZorStatus zorsMulC_64f_I(Zor64f* pSrcDst, int32_t len, Zor64f value);
+
+/* In-place reversal. */
+ZorStatus zorsFlip_32f_I(Zor32f* pSrcDst, int32_t len);
+ZorStatus zorsFlip_32fc_I(Zor32fc* pSrcDst, int32_t len);
+ZorStatus zorsFlip_64f_I(Zor64f* pSrcDst, int32_t len);
+ZorStatus zorsFlip_64fc_I(Zor64fc* pSrcDst, int32_t len);
+
+/* All bytes of the vector zero; the byte count is formed in 32 bits. */
+ZorStatus zorsZero_8u(Zor8u* pDst, int32_t len);
+ZorStatus zorsZero_32s(Zor32s* pDst, int32_t len);
+ZorStatus zorsZero_32f(Zor32f* pDst, int32_t len);
+ZorStatus zorsZero_64f(Zor64f* pDst, int32_t len);
+ZorStatus zorsZero_32fc(Zor32fc* pDst, int32_t len);
+ZorStatus zorsZero_64fc(Zor64fc* pDst, int32_t len);
+
+ZorStatus zorsCopy_8u(const Zor8u* pSrc, Zor8u* pDst, int32_t len);
+ZorStatus zorsCopy_16s(const Zor16s* pSrc, Zor16s* pDst, int32_t len);
+ZorStatus zorsCopy_32s(const Zor32s* pSrc, Zor32s* pDst, int32_t len);
+
+/* dst = saturate(round(src * 2^-scaleFactor)). rndMode 0 truncates,
+ * 1 rounds to nearest (ties to even), any other value rounds toward zero
+ * through the MXCSR rounding control, restored afterwards. */
+ZorStatus zorsConvert_32f8u_Sfs(const Zor32f* pSrc, Zor8u* pDst, int32_t len, int32_t rndMode,
+                                int32_t scaleFactor);
+ZorStatus zorsConvert_32f16u_Sfs(const Zor32f* pSrc, Zor16u* pDst, int32_t len, int32_t rndMode,
+                                 int32_t scaleFactor);
+ZorStatus zorsConvert_32f16s_Sfs(const Zor32f* pSrc, Zor16s* pDst, int32_t len, int32_t rndMode,
+                                 int32_t scaleFactor);
+
+ZorStatus zorsMin_32f(const Zor32f* pSrc, int32_t len, Zor32f* pMin);
+/* Lowest index of equal minima on every path; a null pIndx acts as Min. */
+ZorStatus zorsMinIndx_32f(const Zor32f* pSrc, int32_t len, Zor32f* pMin, int32_t* pIndx);
+
+/* Quicksort (median of three, explicit stack, selection below 10). */
+ZorStatus zorsSortAscend_32f_I(Zor32f* pSrcDst, int32_t len);
+/* dataType 1, 5, 7, 9, 11, 13, 15, 17, 19; others store 0 and give -59. */
+ZorStatus zorsSortRadixGetBufferSize(int32_t len, ZorDataType dataType, int32_t* pBufSize);
+/* Stable radix sort by bit pattern: -0 before +0, NaNs beyond the infinities. */
+ZorStatus zorsSortRadixAscend_32f_I(Zor32f* pSrcDst, int32_t len, Zor8u* pBuffer);
+
+double zorsFloorOne(double x);
+double zorsCeilOne(double x);
+double zorsSqrtOne(double x);
+double zorsSinOne(double x);
+double zorsCosOne(double x);
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif
