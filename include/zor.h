@@ -5,5 +5,6 @@
 #include "zortypes.h"
 #include "zorcore.h"
 #include "zors.h"
+#include "zori.h"
 
 #endif

@@ -8,6 +8,7 @@
 #include "level_config.h"
 #include "zor.h"
 #include "zor_internal.h"
+#include "zori_internal.h"
 
 #define ZOR_BEGIN namespace ZOR_NS {
 #define ZOR_END }
@@ -23,6 +24,7 @@
 #define ZOR_INTERNAL extern "C" __attribute__((visibility("hidden")))
 #define ZOR_INTERNAL_API(name) ZOR_INTERNAL decltype(::name) ZOR_NAME(name);
 #include "internal_names.def"
+#include "internal_image_names.def"
 #undef ZOR_INTERNAL_API
 
 #endif
