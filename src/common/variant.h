@@ -9,6 +9,7 @@
 #include "zor.h"
 #include "zor_internal.h"
 #include "zori_internal.h"
+#include "zori_border.h"
 
 #define ZOR_BEGIN namespace ZOR_NS {
 #define ZOR_END }
@@ -25,6 +26,7 @@
 #define ZOR_INTERNAL_API(name) ZOR_INTERNAL decltype(::name) ZOR_NAME(name);
 #include "internal_names.def"
 #include "internal_image_names.def"
+#include "internal_border_names.def"
 #undef ZOR_INTERNAL_API
 
 #endif

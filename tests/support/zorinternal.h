@@ -9,12 +9,14 @@
 
 #include "zor_internal.h"
 #include "zori_internal.h"
+#include "zori_border.h"
 #include "zortest.h"
 
 #define ZOR_TEST_DECLARE(level, fn) extern "C" decltype(::fn) level##_##fn;
 #define ZOR_INTERNAL_API(fn) ZOR_LEVEL_NAMES(ZOR_TEST_DECLARE, fn)
 #include "internal_names.def"
 #include "internal_image_names.def"
+#include "internal_border_names.def"
 #undef ZOR_INTERNAL_API
 #undef ZOR_TEST_DECLARE
 
