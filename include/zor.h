@@ -6,5 +6,6 @@
 #include "zorcore.h"
 #include "zors.h"
 #include "zori.h"
+#include "zoriborder.h"
 
 #endif

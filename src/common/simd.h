@@ -25,7 +25,7 @@ typedef uint32_t vu32 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
 typedef int64_t vs64 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
 
 template <typename V> struct Lanes {
-    typedef __typeof__(V()[0]) Element;
+    typedef __typeof__((*(V*)0)[0]) Element;
     static constexpr int count = ZOR_VECTOR_BYTES / sizeof(Element);
 };
 
