@@ -1,0 +1,343 @@
+// Minimum searches, quicksort and radix sort of every level against plain
+// models: the strict-below rule of the minimum on the scalar and vector
+// paths, sortedness and content of the quicksort on hard patterns, and the
+// radix sort's exact order by bit pattern.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+#include <limits>
+#include <random>
+#include <vector>
+
+#include "zorinternal.h"
+
+namespace {
+
+using MinSearch = zortest::LevelTest;
+using QuickSort = zortest::LevelTest;
+using RadixSort = zortest::LevelTest;
+
+const float kInf = std::numeric_limits<float>::infinity();
+const float kNaN = std::numeric_limits<float>::quiet_NaN();
+
+uint32_t bits(float x) {
+    uint32_t u;
+    std::memcpy(&u, &x, 4);
+    return u;
+}
+
+float from_bits(uint32_t u) {
+    float x;
+    std::memcpy(&x, &u, 4);
+    return x;
+}
+
+std::vector<float> random_floats(size_t n, uint32_t seed, int range = 1000) {
+    std::mt19937 gen(seed);
+    std::uniform_int_distribution<int> d(-range, range);
+    std::vector<float> v(n);
+    for (auto& x : v) x = d(gen) * 0.25f;
+    return v;
+}
+
+// ---- minimum -----------------------------------------------------------------
+
+void min_model(const float* p, int len, float* value, int* index) {
+    *value = p[0];
+    *index = 0;
+    for (int i = 1; i < len; ++i) {
+        if (p[i] < *value) {
+            *value = p[i];
+            *index = i;
+        }
+    }
+}
+
+std::vector<int> min_lengths() {
+    std::vector<int> v;
+    for (int n = 1; n <= 70; ++n) v.push_back(n);
+    for (int k = 7; k <= 12; ++k) {
+        for (int d = -1; d <= 1; ++d) v.push_back((1 << k) + d);
+    }
+    return v;
+}
+
+void expect_like_model(const float* p, int len, const char* what, int level) {
+    float mv, v = 1234, w = 5678;
+    int mi, i = -7;
+    min_model(p, len, &mv, &mi);
+    ASSERT_EQ(ZOR_BODIES(zorsMinIndx_32f)[level](p, len, &v, &i), zorStsNoErr);
+    ASSERT_EQ(ZOR_BODIES(zorsMin_32f)[level](p, len, &w), zorStsNoErr);
+    ASSERT_EQ(bits(v), bits(mv)) << what << " len " << len;
+    ASSERT_EQ(i, mi) << what << " len " << len;
+    ASSERT_EQ(bits(w), bits(mv)) << what << " len " << len;
+}
+
+TEST_P(MinSearch, AgreesWithTheStrictScanOnEveryPath) {
+    const int level = GetParam().index;
+    // Few distinct values, so that equal minima land in different lanes.
+    auto data = random_floats(4096 + 8, 3, 6);
+    for (int offset = 0; offset < 4; ++offset) {
+        for (int len : min_lengths()) expect_like_model(data.data() + offset, len, "random", level);
+    }
+    // The minimum at every position of a vector-path length, once and twice.
+    for (int len : {34, 35, 67, 100}) {
+        for (int at = 0; at < len; ++at) {
+            std::vector<float> v(len, 5.0f);
+            v[at] = -1.0f;
+            expect_like_model(v.data(), len, "single", level);
+            v[len - 1 - at / 2] = -1.0f;
+            expect_like_model(v.data(), len, "twice", level);
+        }
+    }
+}
+
+TEST_P(MinSearch, EqualMinimaKeepTheLowestIndex) {
+    const int level = GetParam().index;
+    float v;
+    int i;
+    const float three[3] = {1, 0, 0};
+    ASSERT_EQ(ZOR_BODY(zorsMinIndx_32f)(three, 3, &v, &i), zorStsNoErr);
+    EXPECT_EQ(i, 1);
+    for (int len : {34, 40, 64, 129}) {
+        for (int offset = 0; offset < 4; ++offset) {
+            std::vector<float> buf(len + 4, 1.0f);
+            float* p = buf.data() + offset;
+            for (int k = 1; k < len; ++k) p[k] = 0.0f;
+            ZOR_BODY(zorsMinIndx_32f)(p, len, &v, &i);
+            EXPECT_EQ(i, 1) << len << " " << offset;
+            // +0 and -0 compare equal: the first of them stays.
+            p[len / 2] = -0.0f;
+            p[len - 1] = -0.0f;
+            expect_like_model(p, len, "signed zeros", level);
+        }
+    }
+}
+
+TEST_P(MinSearch, NaNsArePassedOverUnlessFirst) {
+    const int level = GetParam().index;
+    for (int len : {2, 33, 34, 50, 200}) {
+        std::vector<float> v(len);
+        for (int k = 0; k < len; ++k) v[k] = (float)(len - k);
+        v[len - 1] = kNaN;
+        expect_like_model(v.data(), len, "NaN last", level);
+        v[len / 2] = kNaN;
+        v[len - 1] = -kInf;
+        expect_like_model(v.data(), len, "-inf last", level);
+        v[0] = kNaN;
+        float m;
+        int i;
+        ZOR_BODY(zorsMinIndx_32f)(v.data(), len, &m, &i);
+        EXPECT_TRUE(std::isnan(m));
+        EXPECT_EQ(i, 0);
+    }
+}
+
+TEST_P(MinSearch, ChecksAndNullIndex) {
+    const float v[3] = {3, 1, 2};
+    float m = 9;
+    int i = 9;
+    EXPECT_EQ(ZOR_BODY(zorsMin_32f)(nullptr, 0, &m), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsMin_32f)(v, 3, nullptr), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsMin_32f)(v, 0, &m), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(nullptr, -1, &m, &i), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, -1, nullptr, &i), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, 0, &m, nullptr), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, -4, &m, &i), zorStsSizeErr);
+    EXPECT_EQ(m, 9);
+    EXPECT_EQ(i, 9);
+    // A null index pointer is no error: the search acts as Min.
+    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, 3, &m, nullptr), zorStsNoErr);
+    EXPECT_EQ(m, 1);
+}
+
+// ---- quicksort ---------------------------------------------------------------
+
+// Patterns that trouble quicksorts: presorted runs, many equal keys,
+// organ pipes, sawtooth.
+std::vector<float> pattern(int kind, int n, uint32_t seed) {
+    std::vector<float> v = random_floats(n, seed, 1 << 20);
+    switch (kind) {
+        case 0: break;
+        case 1: std::sort(v.begin(), v.end()); break;
+        case 2: std::sort(v.begin(), v.end(), std::greater<float>()); break;
+        case 3: for (auto& x : v) x = std::fmod(std::fabs(x), 4.0f); break;
+        case 4: std::fill(v.begin(), v.end(), 2.5f); break;
+        case 5: for (int i = 0; i < n; ++i) v[i] = (float)std::min(i, n - i); break;
+        case 6: for (int i = 0; i < n; ++i) v[i] = (float)(i % 17); break;
+        case 7: for (int i = 0; i < n; ++i) v[i] = (i % 2) ? -0.0f : 0.0f; break;
+    }
+    return v;
+}
+
+// The bit patterns as a multiset: zeros of either sign compare equal, so
+// they may change places, never count.
+std::vector<uint32_t> sorted_bits(const std::vector<float>& v) {
+    std::vector<uint32_t> b;
+    for (float x : v) b.push_back(bits(x));
+    std::sort(b.begin(), b.end());
+    return b;
+}
+
+void expect_sorted_permutation(const std::vector<float>& in, const std::vector<float>& out) {
+    ASSERT_TRUE(std::is_sorted(out.begin(), out.end())) << "n " << in.size();
+    ASSERT_EQ(sorted_bits(in), sorted_bits(out)) << "n " << in.size();
+}
+
+TEST_P(QuickSort, SortsEveryPattern) {
+    std::vector<int> sizes;
+    for (int n = 1; n <= 40; ++n) sizes.push_back(n);
+    for (int n : {63, 64, 65, 100, 1000, 4096, 100000}) sizes.push_back(n);
+    for (int kind = 0; kind < 8; ++kind) {
+        for (int n : sizes) {
+            const auto in = pattern(kind, n, 100 + n);
+            auto out = in;
+            ASSERT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(out.data(), n), zorStsNoErr);
+            expect_sorted_permutation(in, out);
+            if (HasFatalFailure()) return;
+        }
+    }
+}
+
+TEST_P(QuickSort, SameOrderOnEveryLevel) {
+    // Signed zeros make the order observable; the algorithm fixes it.
+    auto in = random_floats(5000, 9, 3);
+    for (size_t i = 0; i < in.size(); i += 3) in[i] = (i % 2) ? -0.0f : 0.0f;
+    auto mine = in;
+    ZOR_BODY(zorsSortAscend_32f_I)(mine.data(), (int)mine.size());
+    auto first = in;
+    ZOR_BODIES(zorsSortAscend_32f_I)[0](first.data(), (int)first.size());
+    for (size_t i = 0; i < in.size(); ++i) ASSERT_EQ(bits(mine[i]), bits(first[i])) << i;
+}
+
+TEST_P(QuickSort, NaNsNeitherHangNorLoseElements) {
+    for (int n : {2, 9, 10, 11, 50, 1000}) {
+        auto in = random_floats(n, 5 + n);
+        for (int i = 0; i < n; i += 3) in[i] = kNaN;
+        auto out = in;
+        ASSERT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(out.data(), n), zorStsNoErr);
+        EXPECT_EQ(sorted_bits(in), sorted_bits(out)) << n;
+    }
+}
+
+TEST_P(QuickSort, Checks) {
+    float v[2] = {2, 1};
+    EXPECT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(nullptr, 0), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(v, 0), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(v, 1), zorStsNoErr);
+    EXPECT_EQ(v[0], 2);
+}
+
+// ---- radix sort --------------------------------------------------------------
+
+// The order the radix sort promises: by key, the sign bit flipped for
+// positives and every bit for negatives; equal keys are equal bits.
+uint32_t sort_key(float x) {
+    const uint32_t v = bits(x);
+    return (v & 0x80000000u) ? ~v : (v | 0x80000000u);
+}
+
+std::vector<float> radix_model(std::vector<float> v) {
+    std::sort(v.begin(), v.end(), [](float a, float b) { return sort_key(a) < sort_key(b); });
+    return v;
+}
+
+// Random bit patterns: every class of float, NaNs of both signs included.
+std::vector<float> random_patterns(int n, uint32_t seed) {
+    std::mt19937 gen(seed);
+    std::vector<float> v(n);
+    for (auto& x : v) {
+        const uint32_t r = gen();
+        switch (r % 8) {
+            case 0: x = from_bits(gen()); break;
+            case 1: x = from_bits(gen() & 0x807FFFFFu); break;  // denormals, zeros
+            case 2: x = (r & 16) ? -0.0f : 0.0f; break;
+            case 3: x = (r & 16) ? -kInf : kInf; break;
+            default: x = (float)((int)(gen() % 2001) - 1000) * 0.5f; break;
+        }
+    }
+    return v;
+}
+
+int buffer_size(int n) {
+    int32_t size = 0;
+    EXPECT_EQ(ZOR_BODIES(zorsSortRadixGetBufferSize)[0](n, zor32f, &size), zorStsNoErr);
+    return size;
+}
+
+void run_radix(int level, std::vector<float>& v, int misalign) {
+    const int size = buffer_size((int)v.size());
+    std::vector<Zor8u> buf(size + misalign + 64, 0xA5);
+    ASSERT_EQ(ZOR_BODIES(zorsSortRadixAscend_32f_I)[level](v.data(), (int)v.size(), buf.data() + misalign),
+              zorStsNoErr);
+    for (int k = 0; k < 64; ++k) ASSERT_EQ(buf[misalign + size + k], 0xA5) << "wrote past its buffer";
+}
+
+TEST_P(RadixSort, OrdersByBitPattern) {
+    const int level = GetParam().index;
+    std::vector<int> sizes;
+    for (int n = 1; n <= 70; ++n) sizes.push_back(n);
+    for (int n : {1023, 1024, 1025, 4096, 100000}) sizes.push_back(n);
+    for (int n : sizes) {
+        const auto in = random_patterns(n, 1000 + n);
+        auto out = in;
+        run_radix(level, out, n % 4);
+        const auto expected = radix_model(in);
+        for (int i = 0; i < n; ++i) ASSERT_EQ(bits(out[i]), bits(expected[i])) << "n " << n << " at " << i;
+    }
+}
+
+TEST_P(RadixSort, SignedZerosAndNaNsHaveTheirPlaces) {
+    const int level = GetParam().index;
+    std::vector<float> v = {0.0f, from_bits(0xFFC00001u), -0.0f, kInf, from_bits(0x7FC00000u), -kInf,
+                            -0.0f, from_bits(0x7F800001u), 0.0f, -1.0f, from_bits(0x80000001u)};
+    run_radix(level, v, 0);
+    const uint32_t expected[] = {0xFFC00001u, 0xFF800000u, 0xBF800000u, 0x80000001u, 0x80000000u, 0x80000000u,
+                                 0x00000000u, 0x00000000u, 0x7F800000u, 0x7F800001u, 0x7FC00000u};
+    for (size_t i = 0; i < v.size(); ++i) EXPECT_EQ(bits(v[i]), expected[i]) << i;
+}
+
+TEST_P(RadixSort, ChecksInOrder) {
+    float v[2] = {2, 1};
+    Zor8u buf[20480 + 8];
+    EXPECT_EQ(ZOR_BODY(zorsSortRadixAscend_32f_I)(nullptr, 2, buf), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsSortRadixAscend_32f_I)(v, 0, nullptr), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsSortRadixAscend_32f_I)(v, 0, buf), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsSortRadixAscend_32f_I)(v, -2, buf), zorStsSizeErr);
+    EXPECT_EQ(v[0], 2);
+}
+
+TEST_P(RadixSort, BufferSizeByType) {
+    struct Row {
+        int type;
+        int32_t len;
+        ZorStatus status;
+        int32_t size;
+    };
+    const Row rows[] = {
+        {1, 10, zorStsNoErr, 1034},      {5, 10, zorStsNoErr, 2068},     {7, 1, zorStsNoErr, 2050},
+        {9, 10, zorStsNoErr, 20520},     {11, 10, zorStsNoErr, 20520},   {13, 100, zorStsNoErr, 20880},
+        {15, 10, zorStsNoErr, 82000},    {17, 1, zorStsNoErr, 81928},    {19, 10, zorStsNoErr, 41040},
+        {3, 10, zorStsDataTypeErr, 0},   {0, 10, zorStsDataTypeErr, 0},  {20, 10, zorStsDataTypeErr, 0},
+        {-1, 10, zorStsDataTypeErr, 0},  {13, 0x7FFFFFFF, zorStsSizeErr, -1},
+    };
+    for (const Row& r : rows) {
+        int32_t size = -1;
+        EXPECT_EQ(ZOR_BODY(zorsSortRadixGetBufferSize)(r.len, (ZorDataType)r.type, &size), r.status) << r.type;
+        EXPECT_EQ(size, r.size) << r.type;
+    }
+    int32_t size = -1;
+    EXPECT_EQ(ZOR_BODY(zorsSortRadixGetBufferSize)(0, zor32f, &size), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsSortRadixGetBufferSize)(0, (ZorDataType)3, &size), zorStsSizeErr);
+    EXPECT_EQ(size, -1) << "a size error stores nothing";
+    EXPECT_EQ(ZOR_BODY(zorsSortRadixGetBufferSize)(-1, zor32f, nullptr), zorStsNullPtrErr);
+}
+
+ZOR_INSTANTIATE_LEVELS(MinSearch);
+ZOR_INSTANTIATE_LEVELS(QuickSort);
+ZOR_INSTANTIATE_LEVELS(RadixSort);
+
+}  // namespace

@@ -1,0 +1,308 @@
+// Sum and dot products on every level: the fixed orders (accurate sum,
+// short dot products) bit for bit against models of those orders, the
+// level-dependent wide orders within an error bound, special values, and
+// the checks in their order.
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+#include <limits>
+#include <random>
+#include <vector>
+
+#include "zors.h"
+#include "zortest.h"
+
+namespace {
+
+using Sum = zortest::LevelTest;
+using DotProd = zortest::LevelTest;
+
+uint32_t bits(float x) {
+    uint32_t u;
+    std::memcpy(&u, &x, 4);
+    return u;
+}
+
+uint64_t bits(double x) {
+    uint64_t u;
+    std::memcpy(&u, &x, 8);
+    return u;
+}
+
+// Lengths 1..70 and around powers of two up to 2^14.
+std::vector<int> lengths() {
+    std::vector<int> v;
+    for (int n = 1; n <= 70; ++n) v.push_back(n);
+    for (int k = 7; k <= 14; ++k) {
+        for (int d = -1; d <= 1; ++d) v.push_back((1 << k) + d);
+    }
+    return v;
+}
+
+// Values of mixed sign and magnitude, so that order shows in the bits.
+template <typename T> std::vector<T> random_values(size_t n, uint32_t seed) {
+    std::mt19937_64 gen(seed);
+    std::uniform_real_distribution<T> mant(-1, 1);
+    std::uniform_int_distribution<int> expo(-12, 12);
+    std::vector<T> v(n);
+    for (auto& x : v) x = std::ldexp(mant(gen), expo(gen));
+    return v;
+}
+
+// The accurate sum's order: an element off an 8-byte boundary first into
+// lane 0, element 8k+j of the rest into lane j, then the fold.
+float accurate_model(const float* p, int len) {
+    double lane[8];
+    for (double& l : lane) l = -0.0;
+    int i = 0;
+    if (reinterpret_cast<uintptr_t>(p) % 8 != 0) lane[0] = p[i++];
+    for (int j = 0; i < len; ++i, j = (j + 1) % 8) lane[j] += p[i];
+    return (float)(((lane[0] + lane[4]) + (lane[2] + lane[6])) +
+                   ((lane[1] + lane[5]) + (lane[3] + lane[7])));
+}
+
+TEST_P(Sum, AccurateFormFollowsItsLaneOrderForEveryHintButOne) {
+    const auto data = random_values<float>(16384 + 8, 7);
+    for (int offset = 0; offset < 4; ++offset) {
+        for (int len : lengths()) {
+            const float* p = data.data() + offset;
+            const float expected = accurate_model(p, len);
+            for (int hint : {0, 2, -1, 77}) {
+                float s = 0;
+                ASSERT_EQ(zorsSum_32f(p, len, &s, hint), zorStsNoErr);
+                ASSERT_EQ(bits(s), bits(expected)) << "len " << len << " offset " << offset << " hint " << hint;
+            }
+        }
+    }
+}
+
+TEST_P(Sum, FastFormIsWithinTheBoundOfSinglePrecisionAddition) {
+    const auto data = random_values<float>(16384 + 8, 11);
+    for (int offset = 0; offset < 4; ++offset) {
+        for (int len : lengths()) {
+            const float* p = data.data() + offset;
+            long double exact = 0, magnitude = 0;
+            for (int i = 0; i < len; ++i) {
+                exact += p[i];
+                magnitude += std::fabs(p[i]);
+            }
+            float s = 0;
+            ASSERT_EQ(zorsSum_32f(p, len, &s, 1), zorStsNoErr);
+            const long double bound = (len + 1) * (long double)std::numeric_limits<float>::epsilon() * magnitude;
+            ASSERT_LE(std::fabs((long double)s - exact), bound) << "len " << len << " offset " << offset;
+        }
+    }
+}
+
+TEST_P(Sum, SpecialValuesPassThrough) {
+    const float inf = std::numeric_limits<float>::infinity();
+    const float nan = std::numeric_limits<float>::quiet_NaN();
+    for (int len : {1, 7, 8, 9, 40, 100}) {
+        for (int hint : {0, 1}) {
+            std::vector<float> v(len, 1.0f);
+            float s = 0;
+            v[len / 2] = inf;
+            zorsSum_32f(v.data(), len, &s, hint);
+            EXPECT_EQ(s, inf) << len << " " << hint;
+            v[len - 1] = len > 1 ? -inf : nan;
+            zorsSum_32f(v.data(), len, &s, hint);
+            EXPECT_TRUE(std::isnan(s)) << len << " " << hint;
+            std::fill(v.begin(), v.end(), -0.0f);
+            zorsSum_32f(v.data(), len, &s, hint);
+            EXPECT_EQ(bits(s), bits(-0.0f)) << "all -0 sums to -0";
+            // Beyond single precision only in the accurate form's lanes.
+            std::fill(v.begin(), v.end(), 3e38f);
+            zorsSum_32f(v.data(), len, &s, hint);
+            EXPECT_EQ(s, len == 1 ? 3e38f : inf);
+            std::fill(v.begin(), v.end(), 1e-45f);
+            zorsSum_32f(v.data(), len, &s, hint);
+            EXPECT_EQ(s, len * 1e-45f) << "denormals add exactly";
+        }
+    }
+    // 2^24 + 1 + 1: the double lanes keep the ones, float lanes may not.
+    float v[3] = {16777216.0f, 1.0f, 1.0f};
+    float s = 0;
+    zorsSum_32f(v, 3, &s, 0);
+    EXPECT_EQ(s, 16777218.0f);
+}
+
+TEST_P(Sum, ChecksPointersThenLength) {
+    float v[4] = {1, 2, 3, 4};
+    float s = 42;
+    EXPECT_EQ(zorsSum_32f(nullptr, 0, &s, 0), zorStsNullPtrErr);
+    EXPECT_EQ(zorsSum_32f(v, -1, nullptr, 1), zorStsNullPtrErr);
+    EXPECT_EQ(zorsSum_32f(v, 0, &s, 0), zorStsSizeErr);
+    EXPECT_EQ(zorsSum_32f(v, -5, &s, 1), zorStsSizeErr);
+    EXPECT_EQ(s, 42);
+}
+
+// ---- dot products -----------------------------------------------------------
+
+template <typename T> struct Cx { T re, im; };
+
+// Exact enough references: long double sums of the products and of their
+// magnitudes, each component separately.
+struct Reference {
+    long double re = 0, im = 0, magRe = 0, magIm = 0;
+    void add(long double r, long double i, long double mr, long double mi) {
+        re += r;
+        im += i;
+        magRe += mr;
+        magIm += mi;
+    }
+};
+
+// Product of element i, in the element's precision, as (re, im).
+template <typename T> Cx<T> prod(const T* a, const T* b, int i) { return {a[i] * b[i], 0}; }
+template <typename T> Cx<T> prod(const Cx<T>* a, const Cx<T>* b, int i) {
+    return {a[i].re * b[i].re - a[i].im * b[i].im, a[i].re * b[i].im + a[i].im * b[i].re};
+}
+template <typename T> Cx<T> prod(const T* a, const Cx<T>* b, int i) {
+    return {a[i] * b[i].re, a[i] * b[i].im};
+}
+
+template <typename T> void ref_add(Reference& r, const T* a, const T* b, int i) {
+    const long double p = (long double)a[i] * b[i];
+    r.add(p, 0, std::fabs(p), 0);
+}
+template <typename T> void ref_add(Reference& r, const Cx<T>* a, const Cx<T>* b, int i) {
+    const long double rr = (long double)a[i].re * b[i].re, ii = (long double)a[i].im * b[i].im;
+    const long double ri = (long double)a[i].re * b[i].im, ir = (long double)a[i].im * b[i].re;
+    r.add(rr - ii, ri + ir, std::fabs(rr) + std::fabs(ii), std::fabs(ri) + std::fabs(ir));
+}
+template <typename T> void ref_add(Reference& r, const T* a, const Cx<T>* b, int i) {
+    const long double pr = (long double)a[i] * b[i].re, pi = (long double)a[i] * b[i].im;
+    r.add(pr, pi, std::fabs(pr), std::fabs(pi));
+}
+
+// Below 16: even products in lane 0, odd in lane 1; lane 1 plus an odd
+// last product, plus lane 0.
+template <typename T, typename A, typename B> Cx<T> short_model(const A* a, const B* b, int len) {
+    Cx<T> l0 = {-0.0, -0.0}, l1 = {-0.0, -0.0};
+    int i = 0;
+    for (; i + 2 <= len; i += 2) {
+        const Cx<T> p = prod(a, b, i), q = prod(a, b, i + 1);
+        l0 = {l0.re + p.re, l0.im + p.im};
+        l1 = {l1.re + q.re, l1.im + q.im};
+    }
+    if (i < len) {
+        const Cx<T> p = prod(a, b, i);
+        l1 = {l1.re + p.re, l1.im + p.im};
+    }
+    return {l1.re + l0.re, l1.im + l0.im};
+}
+
+// Runs one form over lengths and offsets: bitwise to the model below 16,
+// within (len + 4) eps of the magnitude sum from 16 on.
+template <typename T, typename A, typename B, typename R, bool Complex>
+void check_form(ZorStatus (*fn)(const A*, const B*, int32_t, R*), uint32_t seed) {
+    constexpr int aw = sizeof(A) / sizeof(T), bw = sizeof(B) / sizeof(T);
+    const int maxLen = 16384 + 4;
+    const auto ra = random_values<T>(maxLen * aw, seed), rb = random_values<T>(maxLen * bw, seed + 1);
+    const T eps = std::numeric_limits<T>::epsilon();
+    for (int offA = 0; offA < 3; ++offA) {
+        for (int len : lengths()) {
+            const int offB = (offA * 5 + len) % 3;
+            const A* a = reinterpret_cast<const A*>(ra.data() + offA * aw);
+            const B* b = reinterpret_cast<const B*>(rb.data() + offB * bw);
+            R out;
+            std::memset(&out, 0, sizeof out);
+            ASSERT_EQ(fn(a, b, len, &out), zorStsNoErr);
+            T got[2];
+            std::memcpy(got, &out, sizeof out);
+            using CA = std::conditional_t<(aw == 2), Cx<T>, T>;
+            using CB = std::conditional_t<(bw == 2), Cx<T>, T>;
+            const CA* ma = reinterpret_cast<const CA*>(a);
+            const CB* mb = reinterpret_cast<const CB*>(b);
+            if (len < 16) {
+                const Cx<T> m = short_model<T>(ma, mb, len);
+                ASSERT_EQ(bits(got[0]), bits(m.re)) << "len " << len;
+                if (Complex) ASSERT_EQ(bits(got[1]), bits(m.im)) << "len " << len;
+            } else {
+                Reference r;
+                for (int i = 0; i < len; ++i) ref_add(r, ma, mb, i);
+                ASSERT_LE(std::fabs(got[0] - r.re), (len + 4) * eps * r.magRe) << "len " << len;
+                if (Complex) ASSERT_LE(std::fabs(got[1] - r.im), (len + 4) * eps * r.magIm) << "len " << len;
+            }
+        }
+    }
+}
+
+TEST_P(DotProd, ShortOrderExactWideOrderBounded) {
+    check_form<float, Zor32f, Zor32f, Zor32f, false>(zorsDotProd_32f, 1);
+    check_form<double, Zor64f, Zor64f, Zor64f, false>(zorsDotProd_64f, 2);
+    check_form<float, Zor32fc, Zor32fc, Zor32fc, true>(zorsDotProd_32fc, 3);
+    check_form<double, Zor64fc, Zor64fc, Zor64fc, true>(zorsDotProd_64fc, 4);
+    check_form<float, Zor32f, Zor32fc, Zor32fc, true>(zorsDotProd_32f32fc, 5);
+    check_form<double, Zor64f, Zor64fc, Zor64fc, true>(zorsDotProd_64f64fc, 6);
+}
+
+TEST_P(DotProd, ComplexFormsDoNotConjugate) {
+    for (int len : {1, 15, 16, 17, 64}) {
+        std::vector<Zor32fc> a(len, Zor32fc{0, 1}), b(len, Zor32fc{0, 1});
+        std::vector<Zor64f> ra(len, 2.0);
+        std::vector<Zor64fc> rb(len, Zor64fc{0, 1});
+        Zor32fc r;
+        ASSERT_EQ(zorsDotProd_32fc(a.data(), b.data(), len, &r), zorStsNoErr);
+        EXPECT_EQ(r.re, -len);  // i * i = -1
+        EXPECT_EQ(r.im, 0);
+        Zor64fc q;
+        ASSERT_EQ(zorsDotProd_64f64fc(ra.data(), rb.data(), len, &q), zorStsNoErr);
+        EXPECT_EQ(q.re, 0);
+        EXPECT_EQ(q.im, 2.0 * len);
+    }
+}
+
+TEST_P(DotProd, SpecialValuesPassThrough) {
+    const float inf = std::numeric_limits<float>::infinity();
+    for (int len : {1, 5, 15, 16, 33, 100}) {
+        std::vector<float> a(len, 1.0f), b(len, 2.0f);
+        float r;
+        a[len - 1] = inf;
+        zorsDotProd_32f(a.data(), b.data(), len, &r);
+        EXPECT_EQ(r, inf) << len;
+        b[0] = len > 1 ? -inf : 0.0f;
+        zorsDotProd_32f(a.data(), b.data(), len, &r);
+        EXPECT_TRUE(std::isnan(r)) << len;
+        std::vector<double> c(len, 1e300), d(len, 1e300);
+        double q;
+        zorsDotProd_64f(c.data(), d.data(), len, &q);
+        EXPECT_EQ(q, std::numeric_limits<double>::infinity()) << "overflow is not reported";
+    }
+}
+
+TEST_P(DotProd, ChecksPointersThenLength) {
+    float f[2] = {1, 2};
+    Zor32fc c[2] = {};
+    double d[2] = {1, 2};
+    Zor64fc z[2] = {};
+    float rf = 7;
+    Zor32fc rc = {7, 7};
+    double rd = 7;
+    Zor64fc rz = {7, 7};
+    EXPECT_EQ(zorsDotProd_32f(nullptr, f, 0, &rf), zorStsNullPtrErr);
+    EXPECT_EQ(zorsDotProd_32f(f, nullptr, 2, &rf), zorStsNullPtrErr);
+    EXPECT_EQ(zorsDotProd_32f(f, f, -1, nullptr), zorStsNullPtrErr);
+    EXPECT_EQ(zorsDotProd_32f(f, f, 0, &rf), zorStsSizeErr);
+    EXPECT_EQ(zorsDotProd_64f(d, nullptr, 0, &rd), zorStsNullPtrErr);
+    EXPECT_EQ(zorsDotProd_64f(d, d, -3, &rd), zorStsSizeErr);
+    EXPECT_EQ(zorsDotProd_32fc(c, c, 0, nullptr), zorStsNullPtrErr);
+    EXPECT_EQ(zorsDotProd_32fc(c, c, 0, &rc), zorStsSizeErr);
+    EXPECT_EQ(zorsDotProd_64fc(nullptr, z, 1, &rz), zorStsNullPtrErr);
+    EXPECT_EQ(zorsDotProd_64fc(z, z, 0, &rz), zorStsSizeErr);
+    EXPECT_EQ(zorsDotProd_32f32fc(f, nullptr, -1, &rc), zorStsNullPtrErr);
+    EXPECT_EQ(zorsDotProd_32f32fc(f, c, 0, &rc), zorStsSizeErr);
+    EXPECT_EQ(zorsDotProd_64f64fc(nullptr, z, 0, &rz), zorStsNullPtrErr);
+    EXPECT_EQ(zorsDotProd_64f64fc(d, z, INT32_MIN, &rz), zorStsSizeErr);
+    EXPECT_EQ(rf, 7);
+    EXPECT_EQ(rd, 7);
+    EXPECT_EQ(rc.re, 7);
+    EXPECT_EQ(rz.im, 7);
+}
+
+ZOR_INSTANTIATE_LEVELS(Sum);
+ZOR_INSTANTIATE_LEVELS(DotProd);
+
+}  // namespace
