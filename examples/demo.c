@@ -2,7 +2,9 @@
  * run: detected features, the selected level and why, every level's
  * version record, cache and core answers. */
 #include <stdio.h>
+#include <stdlib.h>
 #include <string.h>
+#include <time.h>
 
 #include "zor.h"
 #include "zor_levels.h"
@@ -37,6 +39,81 @@ static const struct {
     ZOR_LEVEL_LIST(DEMO_LEVEL)
 #undef DEMO_LEVEL
 };
+
+static double now_us(void) {
+    struct timespec t;
+    clock_gettime(CLOCK_MONOTONIC, &t);
+    return t.tv_sec * 1e6 + t.tv_nsec / 1e3;
+}
+
+static int level_runs(size_t i, uint64_t detected) {
+    return (detected & levels[i].need) == levels[i].need;
+}
+
+/* Runs `op` once per runnable level (forcing the level), printing the best
+ * of a few timings and what `report` says about the result. */
+typedef void (*DemoOp)(void* ctx);
+typedef void (*DemoReport)(void* ctx, const char* level);
+static void on_every_level(const char* title, DemoOp op, DemoReport report, void* ctx) {
+    uint64_t detected = 0;
+    zorGetCpuFeatures(&detected, NULL);
+    printf("\n%s\n", title);
+    for (size_t i = 0; i < sizeof levels / sizeof levels[0]; ++i) {
+        if (!level_runs(i, detected)) continue;
+        zorSetCpuFeatures(levels[i].select);
+        double best = 1e30;
+        for (int rep = 0; rep < 5; ++rep) {
+            double t0 = now_us();
+            op(ctx);
+            double t = now_us() - t0;
+            if (t < best) best = t;
+        }
+        printf("  %s %10.1f us  ", levels[i].name, best);
+        report(ctx, levels[i].name);
+        printf("\n");
+    }
+    zorInit();
+}
+
+/* ---- vectors ---- */
+
+typedef struct {
+    Zor32f* a;
+    Zor32f* b;
+    int32_t len;
+    Zor32f sum, sumFast, dot;
+    ZorStatus status;
+} VectorDemo;
+
+static void vector_reduce(void* p) {
+    VectorDemo* d = (VectorDemo*)p;
+    d->status = zorsSum_32f(d->a, d->len, &d->sum, 0);
+    zorsSum_32f(d->a, d->len, &d->sumFast, 1);
+    zorsDotProd_32f(d->a, d->b, d->len, &d->dot);
+}
+
+static void vector_reduce_report(void* p, const char* level) {
+    VectorDemo* d = (VectorDemo*)p;
+    (void)level;
+    printf("sum %.9g (fast %.9g)  dot %.9g  %s", d->sum, d->sumFast, d->dot,
+           zorGetStatusString(d->status));
+}
+
+static void demo_vectors(void) {
+    VectorDemo d;
+    d.len = 1 << 20;
+    d.a = zorsMalloc_32f(d.len);
+    d.b = zorsMalloc_32f(d.len);
+    if (!d.a || !d.b) return;
+    for (int32_t i = 0; i < d.len; ++i) {
+        d.a[i] = (Zor32f)((i % 1000) * 0.001);
+        d.b[i] = (Zor32f)(1.0 / (1 + i % 7));
+    }
+    on_every_level("sum (accurate and fast) and dot product of 2^20 floats:", vector_reduce,
+                   vector_reduce_report, &d);
+    zorsFree(d.a);
+    zorsFree(d.b);
+}
 
 static void print_features(const char* title, uint64_t word) {
     printf("%-18s 0x%012llx ", title, (unsigned long long)word);
@@ -93,5 +170,7 @@ int main(void) {
     int32_t threads = 0;
     zorGetNumThreads(&threads);
     printf("threads            %d\n", threads);
+
+    demo_vectors();
     return 0;
 }
