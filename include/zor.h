@@ -7,5 +7,6 @@
 #include "zors.h"
 #include "zori.h"
 #include "zoriborder.h"
+#include "zorifilter64f.h"
 
 #endif
