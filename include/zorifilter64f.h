@@ -10,7 +10,8 @@
  *     sum over r < kh, c < kw of F[r][c] * S(x + c, y + r),
  * where S(0, 0) is the source pixel kw-1-ax columns left of and kh-1-ay
  * rows above pSrc. The anchor is thus counted in the flipped kernel and is
- * not tested: a wrong one reads outside the image.
+ * not tested: a wrong one reads outside the image. A 1 x 1 kernel scales
+ * the pixel at pSrc whatever the anchor.
  *
  * Every sum is formed in double precision without fused multiply-add, in
  * a fixed order, so each level returns the same bits:
