@@ -37,6 +37,12 @@ inline void st(char* p, double v) {
 inline vf64 vld(const char* p) {
     return simd::load<vf64>(p);
 }
+// Lane by lane, not as 0 + x, which would turn a -0 tap into +0.
+inline vf64 splat(double x) {
+    vf64 v;
+    for (int i = 0; i < kLanes; ++i) v[i] = x;
+    return v;
+}
 
 // A run of four equal taps, as the column form lays them out in the work
 // buffer, as one vector of this level.
@@ -55,7 +61,7 @@ struct KernelTaps {
     const double* last;
     ptrdiff_t kw;
     double at(ptrdiff_t r, int k) const { return last[-(r * kw + k)]; }
-    vf64 vec(ptrdiff_t r, int k) const { return simd::broadcast<vf64>(at(r, k)); }
+    vf64 vec(ptrdiff_t r, int k) const { return splat(at(r, k)); }
 };
 
 // Column taps from the work buffer: 32 bytes per kernel row, flipped, so
@@ -78,22 +84,28 @@ int group_vec(const char* s, ptrdiff_t srcStep, char* d, int x, int width, Taps 
         vf64 acc[U];
         {
             const vf64 t = taps.vec(0, 0);
+            #pragma GCC unroll 16
             for (int u = 0; u < U; ++u) {
                 const vf64 p = t * vld(sx + u * kLanes * 8);
                 acc[u] = Add ? vld(dx + u * kLanes * 8) + p : p;
             }
         }
+        #pragma GCC unroll 16
         for (int k = 1; k < G; ++k) {
             const vf64 t = taps.vec(0, k);
+            #pragma GCC unroll 16
             for (int u = 0; u < U; ++u) acc[u] = acc[u] + t * vld(sx + (k + u * kLanes) * 8);
         }
         for (int r = 1; r < kh; ++r) {
             const char* sr = sx + r * srcStep;
+            #pragma GCC unroll 16
             for (int k = 0; k < G; ++k) {
                 const vf64 t = taps.vec(r, k);
+                #pragma GCC unroll 16
                 for (int u = 0; u < U; ++u) acc[u] = acc[u] + t * vld(sr + (k + u * kLanes) * 8);
             }
         }
+        #pragma GCC unroll 16
         for (int u = 0; u < U; ++u) simd::store(dx + u * kLanes * 8, acc[u]);
     }
     return x;
@@ -107,9 +119,11 @@ void group_row(const char* s, ptrdiff_t srcStep, char* d, int width, Taps taps, 
         const char* sx = s + (ptrdiff_t)x * 8;
         const double p = taps.at(0, 0) * ld(sx);
         double a = Add ? ld(d + (ptrdiff_t)x * 8) + p : p;
+        #pragma GCC unroll 16
         for (int k = 1; k < G; ++k) a = a + taps.at(0, k) * ld(sx + k * 8);
         for (int r = 1; r < kh; ++r) {
             const char* sr = sx + r * srcStep;
+            #pragma GCC unroll 16
             for (int k = 0; k < G; ++k) a = a + taps.at(r, k) * ld(sr + k * 8);
         }
         st(d + (ptrdiff_t)x * 8, a);
@@ -185,18 +199,24 @@ inline vf64 flipped(const double* end, ptrdiff_t j) {
 template <int P>
 void row_long_sums(const char* s, const double* end, ptrdiff_t blocks, double* sums) {
     vf64 acc[P][kSumVectors];
+    #pragma GCC unroll 16
     for (int v = 0; v < kSumVectors; ++v) {
         const vf64 t = flipped(end, v * kLanes);
+        #pragma GCC unroll 16
         for (int p = 0; p < P; ++p) acc[p][v] = t * vld(s + (p + v * kLanes) * 8);
     }
     for (ptrdiff_t b = 1; b < blocks; ++b) {
         const char* sb = s + b * 16 * 8;
+        #pragma GCC unroll 16
         for (int v = 0; v < kSumVectors; ++v) {
             const vf64 t = flipped(end, b * 16 + v * kLanes);
+            #pragma GCC unroll 16
             for (int p = 0; p < P; ++p) acc[p][v] = acc[p][v] + t * vld(sb + (p + v * kLanes) * 8);
         }
     }
+    #pragma GCC unroll 16
     for (int p = 0; p < P; ++p)
+        #pragma GCC unroll 16
         for (int v = 0; v < kSumVectors; ++v) simd::store(sums + p * 16 + v * kLanes, acc[p][v]);
 }
 
@@ -223,8 +243,11 @@ void filter_row_long(const Image& im, const double* kernel, int kw) {
                 double* p = sums + i * 16;
                 const char* sr = s + ((ptrdiff_t)x + blocks * 16) * 8;
                 for (int t = 0; t < rest; ++t) p[t] = p[t] + fr[-t] * ld(sr + t * 8);
+                #pragma GCC unroll 16
                 for (int k = 0; k < 8; ++k) p[k] = p[k] + p[k + 8];
+                #pragma GCC unroll 16
                 for (int k = 0; k < 4; ++k) p[k] = p[k] + p[k + 4];
+                #pragma GCC unroll 16
                 for (int k = 0; k < 2; ++k) p[k] = p[k] + p[k + 2];
                 st(d + (ptrdiff_t)x * 8, p[0] + p[1]);
             }

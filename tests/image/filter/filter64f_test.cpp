@@ -313,6 +313,22 @@ TEST_P(Filter64f, ColumnWithoutBufferMatchesWithIt) {
     EXPECT_EQ(f.dst, f.want);
 }
 
+// Products of -0 taps and positive pixels are -0, and so is their sum:
+// the taps must reach the vectors with their sign.
+TEST_P(Filter64f, NegativeZeroTapsKeepTheirSign) {
+    const ZoriSize kernels[] = {{1, 5}, {1, 2}, {5, 1}, {20, 1}, {3, 3}, {7, 2}, {10, 2}};
+    const std::vector<double> src(40 * 40, 1.0);
+    for (ZoriSize ks : kernels) {
+        const std::vector<double> k((size_t)ks.width * ks.height, -0.0);
+        std::vector<double> dst(20 * 3, 5.0);
+        std::vector<Zor8u> buffer(1024);
+        ASSERT_EQ(zoriFilter_64f_C1R(src.data(), 40 * 8, dst.data(), 20 * 8, {20, 3}, k.data(), ks,
+                                     {ks.width - 1, ks.height - 1}, buffer.data()),
+                  zorStsNoErr);
+        for (double v : dst) ASSERT_TRUE(v == 0 && signbit(v)) << ks.width << "x" << ks.height << ": " << v;
+    }
+}
+
 TEST_P(Filter64f, SingleTapScalesAndIgnoresTheAnchor) {
     const double src[2][3] = {{1, 2, 3}, {4, 5, 6}};
     const double k = 0.5;
