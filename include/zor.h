@@ -7,7 +7,6 @@
 #include "zors.h"
 #include "zori.h"
 #include "zoriborder.h"
-#include "zorimedian.h"
 #include "zorifilter64f.h"
 
 #endif
