@@ -74,7 +74,9 @@ struct BufferTaps {
 
 // One pass of a G-column group over one destination row, U vectors of
 // pixels at a time; returns the first pixel it did not reach. Add: the
-// group adds to what an earlier group left in the row.
+// group adds to what an earlier group left in the row. The fixed-count
+// loops are unrolled by hand: at -O2 the compiler would otherwise keep the
+// accumulators in memory.
 template <int G, bool Add, int U, class Taps>
 int group_vec(const char* s, ptrdiff_t srcStep, char* d, int x, int width, Taps taps, int kh) {
     constexpr int kBlock = U * kLanes;
