@@ -40,8 +40,12 @@ template <typename V> inline void store(void* p, V v) {
     memcpy(p, &v, sizeof v);
 }
 
+// Lane by lane rather than V{} + x: an addition to zero would turn -0 into
+// +0 and quiet a signalling NaN.
 template <typename V> inline V broadcast(typename Lanes<V>::Element x) {
-    return V{} + x;
+    V v = V{};
+    for (int i = 0; i < Lanes<V>::count; ++i) v[i] = x;
+    return v;
 }
 
 }  // namespace simd
