@@ -40,12 +40,8 @@ template <typename V> inline void store(void* p, V v) {
     memcpy(p, &v, sizeof v);
 }
 
-// Lane by lane rather than V{} + x: an addition to zero would turn -0 into
-// +0 and quiet a signalling NaN.
 template <typename V> inline V broadcast(typename Lanes<V>::Element x) {
-    V v = V{};
-    for (int i = 0; i < Lanes<V>::count; ++i) v[i] = x;
-    return v;
+    return V{} + x;
 }
 
 }  // namespace simd
