@@ -8,6 +8,5 @@
 #include "zori.h"
 #include "zoriborder.h"
 #include "zorifilter64f.h"
-#include "zorifilter.h"
 
 #endif
