@@ -1,0 +1,273 @@
+// Vector kernels of the general filter on the SSE levels (m7, n8, y8).
+//
+// Integer pixels: each source row is converted once into a float row and
+// feeds two output lines at a time (the row's kernel row j for output y
+// and j - 1 for output y + 1), so every source row loaded serves two
+// outputs. The lines are then converted to nearest with saturation,
+// whatever rounding the record asks for.
+//
+// 32f (n8, y8): all taps of a block of outputs are summed in registers,
+// kernel rows in order and taps left to right, each product rounded before
+// it is added, which is the scalar path's arithmetic.
+#include "variant.h"
+
+#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_n8) || defined(ZOR_LEVEL_y8)
+
+#include <emmintrin.h>
+
+#include "pifilter.h"
+
+ZOR_BEGIN
+namespace filt {
+namespace {
+
+template <typename T> inline const T* row_at(const T* p, int32_t step, int32_t y) {
+    return (const T*)((const uint8_t*)p + (ptrdiff_t)y * step);
+}
+template <typename T> inline T* row_at(T* p, int32_t step, int32_t y) {
+    return (T*)((uint8_t*)p + (ptrdiff_t)y * step);
+}
+
+// ---- pixels to floats (SSE2 only: m7 has no pmovzx) --------------------------
+
+inline void to_float(const Zor8u* p, float* out, int32_t n) {
+    const __m128i z = _mm_setzero_si128();
+    int32_t i = 0;
+    for (; i + 16 <= n; i += 16) {
+        const __m128i v = _mm_loadu_si128((const __m128i*)(p + i));
+        const __m128i lo = _mm_unpacklo_epi8(v, z), hi = _mm_unpackhi_epi8(v, z);
+        _mm_storeu_ps(out + i, _mm_cvtepi32_ps(_mm_unpacklo_epi16(lo, z)));
+        _mm_storeu_ps(out + i + 4, _mm_cvtepi32_ps(_mm_unpackhi_epi16(lo, z)));
+        _mm_storeu_ps(out + i + 8, _mm_cvtepi32_ps(_mm_unpacklo_epi16(hi, z)));
+        _mm_storeu_ps(out + i + 12, _mm_cvtepi32_ps(_mm_unpackhi_epi16(hi, z)));
+    }
+    for (; i < n; ++i) out[i] = (float)p[i];
+}
+
+inline void to_float(const Zor16u* p, float* out, int32_t n) {
+    const __m128i z = _mm_setzero_si128();
+    int32_t i = 0;
+    for (; i + 8 <= n; i += 8) {
+        const __m128i v = _mm_loadu_si128((const __m128i*)(p + i));
+        _mm_storeu_ps(out + i, _mm_cvtepi32_ps(_mm_unpacklo_epi16(v, z)));
+        _mm_storeu_ps(out + i + 4, _mm_cvtepi32_ps(_mm_unpackhi_epi16(v, z)));
+    }
+    for (; i < n; ++i) out[i] = (float)p[i];
+}
+
+inline void to_float(const Zor16s* p, float* out, int32_t n) {
+    int32_t i = 0;
+    for (; i + 8 <= n; i += 8) {
+        const __m128i v = _mm_loadu_si128((const __m128i*)(p + i));
+        const __m128i lo = _mm_srai_epi32(_mm_unpacklo_epi16(v, v), 16);
+        const __m128i hi = _mm_srai_epi32(_mm_unpackhi_epi16(v, v), 16);
+        _mm_storeu_ps(out + i, _mm_cvtepi32_ps(lo));
+        _mm_storeu_ps(out + i + 4, _mm_cvtepi32_ps(hi));
+    }
+    for (; i < n; ++i) out[i] = (float)p[i];
+}
+
+// ---- line to pixels ------------------------------------------------------------
+
+// TEMPORARY: stand-ins for ZOR_NAME(zorsConvert_32f8u_Sfs) (and the 16u,
+// 16s forms) with rounding mode 1 and scale 0, and for
+// ZOR_NAME(zorsAddC_32f_I), until the vector layer's row functions land;
+// then these call them.
+// Saturate in float, then convert in the rounding mode in force (nearest).
+inline __m128i near_i32(const float* p, float lo, float hi) {
+    const __m128 v = _mm_min_ps(_mm_max_ps(_mm_loadu_ps(p), _mm_set1_ps(lo)), _mm_set1_ps(hi));
+    return _mm_cvtps_epi32(v);
+}
+template <typename T> inline T near1(float v, float lo, float hi) {
+    return v >= hi ? (T)hi : v <= lo ? (T)lo : v != v ? (T)0 : (T)_mm_cvtss_si32(_mm_set_ss(v));
+}
+inline void to_pixels(const float* line, Zor8u* out, int32_t w) {
+    int32_t i = 0;
+    for (; i + 16 <= w; i += 16) {
+        const __m128i a = _mm_packs_epi32(near_i32(line + i, 0.0f, 255.0f),
+                                          near_i32(line + i + 4, 0.0f, 255.0f));
+        const __m128i b = _mm_packs_epi32(near_i32(line + i + 8, 0.0f, 255.0f),
+                                          near_i32(line + i + 12, 0.0f, 255.0f));
+        _mm_storeu_si128((__m128i*)(out + i), _mm_packus_epi16(a, b));
+    }
+    for (; i < w; ++i) out[i] = near1<Zor8u>(line[i], 0.0f, 255.0f);
+}
+inline void to_pixels(const float* line, Zor16u* out, int32_t w) {
+    // No unsigned 32-to-16 pack before SSE4.1: shift into the signed range.
+    const __m128i bias32 = _mm_set1_epi32(32768);
+    const __m128i bias16 = _mm_set1_epi16((short)0x8000);
+    int32_t i = 0;
+    for (; i + 8 <= w; i += 8) {
+        const __m128i a = _mm_sub_epi32(near_i32(line + i, 0.0f, 65535.0f), bias32);
+        const __m128i b = _mm_sub_epi32(near_i32(line + i + 4, 0.0f, 65535.0f), bias32);
+        _mm_storeu_si128((__m128i*)(out + i), _mm_xor_si128(_mm_packs_epi32(a, b), bias16));
+    }
+    for (; i < w; ++i) out[i] = near1<Zor16u>(line[i], 0.0f, 65535.0f);
+}
+inline void to_pixels(const float* line, Zor16s* out, int32_t w) {
+    int32_t i = 0;
+    for (; i + 8 <= w; i += 8)
+        _mm_storeu_si128((__m128i*)(out + i),
+                         _mm_packs_epi32(near_i32(line + i, -32768.0f, 32767.0f),
+                                         near_i32(line + i + 4, -32768.0f, 32767.0f)));
+    for (; i < w; ++i) out[i] = near1<Zor16s>(line[i], -32768.0f, 32767.0f);
+}
+inline void add_bias(float* line, int32_t w, float bias) {
+    for (int32_t i = 0; i < w; ++i) line[i] += bias;
+}
+
+// ---- the line passes -------------------------------------------------------------
+
+// Taps of kernel row j in the caller's order: t[-i] is tap i.
+inline const float* taps_row(const Spec& s, int32_t j) {
+    return s.pTaps + s.kernelWidth * s.kernelHeight - 1 - j * s.kernelWidth;
+}
+
+// One kernel row over one line: line = (first ? 0 : line) + sum t[-i] * in[x + i].
+// Lines and the float row are padded to whole vectors, so the last block
+// runs on spare lanes that are never converted.
+template <bool kFirst>
+void pass1(const float* in, float* line, const float* t, int32_t w, int32_t kw) {
+    int32_t x = 0;
+    for (; x < w; x += 8) {
+        __m128 a0 = kFirst ? _mm_setzero_ps() : _mm_load_ps(line + x);
+        __m128 a1 = kFirst ? _mm_setzero_ps() : _mm_load_ps(line + x + 4);
+        for (int32_t i = 0; i < kw; ++i) {
+            const __m128 c = _mm_set1_ps(t[-i]);
+            a0 = _mm_add_ps(a0, _mm_mul_ps(c, _mm_loadu_ps(in + x + i)));
+            a1 = _mm_add_ps(a1, _mm_mul_ps(c, _mm_loadu_ps(in + x + i + 4)));
+        }
+        _mm_store_ps(line + x, a0);
+        _mm_store_ps(line + x + 4, a1);
+    }
+}
+
+// One float row into two lines with different kernel rows.
+template <bool kFirst0, bool kFirst1>
+void pass2(const float* in, float* l0, const float* t0, float* l1, const float* t1, int32_t w,
+           int32_t kw) {
+    for (int32_t x = 0; x < w; x += 8) {
+        __m128 a0 = kFirst0 ? _mm_setzero_ps() : _mm_load_ps(l0 + x);
+        __m128 a1 = kFirst0 ? _mm_setzero_ps() : _mm_load_ps(l0 + x + 4);
+        __m128 b0 = kFirst1 ? _mm_setzero_ps() : _mm_load_ps(l1 + x);
+        __m128 b1 = kFirst1 ? _mm_setzero_ps() : _mm_load_ps(l1 + x + 4);
+        for (int32_t i = 0; i < kw; ++i) {
+            const __m128 s0 = _mm_loadu_ps(in + x + i), s1 = _mm_loadu_ps(in + x + i + 4);
+            const __m128 c0 = _mm_set1_ps(t0[-i]), c1 = _mm_set1_ps(t1[-i]);
+            a0 = _mm_add_ps(a0, _mm_mul_ps(c0, s0));
+            a1 = _mm_add_ps(a1, _mm_mul_ps(c0, s1));
+            b0 = _mm_add_ps(b0, _mm_mul_ps(c1, s0));
+            b1 = _mm_add_ps(b1, _mm_mul_ps(c1, s1));
+        }
+        _mm_store_ps(l0 + x, a0);
+        _mm_store_ps(l0 + x + 4, a1);
+        _mm_store_ps(l1 + x, b0);
+        _mm_store_ps(l1 + x + 4, b1);
+    }
+}
+
+template <typename T>
+void finish(float* line, T* out, int32_t w, float bias) {
+    if (bias != 0.0f) add_bias(line, w, bias);
+    to_pixels(line, out, w);
+}
+
+template <typename T>
+void rowacc_t(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
+              const Spec& s, float* work) {
+    const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
+    const int32_t lw = (w + 7) & ~7;  // lines in whole blocks of 8
+    const int32_t inLen = w + kw - 1;
+    float* l0 = work;
+    float* l1 = work + lw;
+    float* in = work + 2 * lw;
+    // Spare lanes of the float row read by the last block: zeros, never
+    // denormals or NaN left over from another call.
+    for (int32_t i = inLen; i < lw + kw - 1; ++i) in[i] = 0.0f;
+    const float bias = bias_of(s);
+
+    int32_t y = 0;
+    for (; y + 1 < h; y += 2) {
+        for (int32_t r = 0; r <= kh; ++r) {
+            to_float(row_at(src, srcStep, y + r), in, inLen);
+            if (r == 0)
+                pass1<true>(in, l0, taps_row(s, 0), w, kw);
+            else if (r == kh && kh == 1)
+                pass1<true>(in, l1, taps_row(s, 0), w, kw);
+            else if (r == kh)
+                pass1<false>(in, l1, taps_row(s, kh - 1), w, kw);
+            else if (r == 1)
+                pass2<false, true>(in, l0, taps_row(s, 1), l1, taps_row(s, 0), w, kw);
+            else
+                pass2<false, false>(in, l0, taps_row(s, r), l1, taps_row(s, r - 1), w, kw);
+        }
+        finish(l0, row_at(dst, dstStep, y), w, bias);
+        finish(l1, row_at(dst, dstStep, y + 1), w, bias);
+    }
+    if (y < h) {
+        for (int32_t r = 0; r < kh; ++r) {
+            to_float(row_at(src, srcStep, y + r), in, inLen);
+            if (r == 0)
+                pass1<true>(in, l0, taps_row(s, 0), w, kw);
+            else
+                pass1<false>(in, l0, taps_row(s, r), w, kw);
+        }
+        finish(l0, row_at(dst, dstStep, y), w, bias);
+    }
+}
+
+// ---- 32f ---------------------------------------------------------------------
+
+template <int NB>
+inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* out, int32_t x, const Spec& s) {
+    const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
+    __m128 acc[NB];
+#pragma GCC unroll 16
+    for (int k = 0; k < NB; ++k) acc[k] = _mm_setzero_ps();
+    const float* t = s.pTaps + kw * kh - 1;
+    for (int32_t j = 0; j < kh; ++j, t -= kw) {
+        const Zor32f* p = row_at(src, srcStep, j) + x;
+        for (int32_t i = 0; i < kw; ++i) {
+            const __m128 c = _mm_set1_ps(t[-i]);
+#pragma GCC unroll 16
+            for (int k = 0; k < NB; ++k)
+                acc[k] = _mm_add_ps(acc[k], _mm_mul_ps(c, _mm_loadu_ps(p + i + 4 * k)));
+        }
+    }
+#pragma GCC unroll 16
+    for (int k = 0; k < NB; ++k) _mm_storeu_ps(out + x + 4 * k, acc[k]);
+}
+
+}  // namespace
+
+void rowacc(const Zor8u* src, int32_t srcStep, Zor8u* dst, int32_t dstStep, int32_t w, int32_t h,
+            const Spec& s, float* work) {
+    rowacc_t(src, srcStep, dst, dstStep, w, h, s, work);
+}
+void rowacc(const Zor16u* src, int32_t srcStep, Zor16u* dst, int32_t dstStep, int32_t w,
+            int32_t h, const Spec& s, float* work) {
+    rowacc_t(src, srcStep, dst, dstStep, w, h, s, work);
+}
+void rowacc(const Zor16s* src, int32_t srcStep, Zor16s* dst, int32_t dstStep, int32_t w,
+            int32_t h, const Spec& s, float* work) {
+    rowacc_t(src, srcStep, dst, dstStep, w, h, s, work);
+}
+
+// w > kw + 8 here, so a last block that overlaps the previous one stays
+// inside the row.
+void vec_32f_sse(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
+                 int32_t h, const Spec& s) {
+    for (int32_t y = 0; y < h; ++y) {
+        const Zor32f* in = row_at(src, srcStep, y);
+        Zor32f* out = row_at(dst, dstStep, y);
+        int32_t x = 0;
+        for (; x + 16 <= w; x += 16) block_32f<4>(in, srcStep, out, x, s);
+        for (; x + 4 <= w; x += 4) block_32f<1>(in, srcStep, out, x, s);
+        if (x < w) block_32f<1>(in, srcStep, out, w - 4, s);
+    }
+}
+
+}  // namespace filt
+ZOR_END
+
+#endif
