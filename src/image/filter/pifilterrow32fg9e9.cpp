@@ -1,0 +1,528 @@
+// Vector kernels of the general filter on the AVX levels (e9, l9, n0, k0).
+//
+// Integer pixels go through float rows in the kernel work area: for each
+// output row, every source row under the kernel is converted once into a
+// float row, its kernel row is applied tap by tap to a float line (the
+// first kernel row sets the line, later ones add), and the last kernel row
+// converts the line to nearest with saturation. Kernels one tap wide sum
+// straight from the pixels and need no work area. 32f pixels are summed
+// in registers over all taps and stored as they are. l9 and above use
+// fused multiply-add, so their last bit may differ from e9.
+#include "variant.h"
+
+#if defined(ZOR_LEVEL_e9) || defined(ZOR_LEVEL_l9) || defined(ZOR_LEVEL_n0) || \
+    defined(ZOR_LEVEL_k0)
+
+#include <immintrin.h>
+#include <string.h>
+
+#include "pifilter.h"
+
+ZOR_BEGIN
+namespace filt {
+namespace {
+
+// ---- per-level vector helpers -----------------------------------------------------
+
+#if ZOR_VECTOR_BYTES == 32
+
+typedef __m256 vf;
+constexpr int VL = 8;
+constexpr bool kMasked = false;
+
+inline vf vzero() { return _mm256_setzero_ps(); }
+inline vf vset(float x) { return _mm256_set1_ps(x); }
+inline vf vload(const float* p) { return _mm256_loadu_ps(p); }
+inline void vstore(float* p, vf v) { _mm256_storeu_ps(p, v); }
+inline vf vclamp(vf v, float lo, float hi) {
+    // max with the bound second: a NaN lane takes the bound.
+    return _mm256_min_ps(_mm256_max_ps(v, _mm256_set1_ps(lo)), _mm256_set1_ps(hi));
+}
+#if defined(ZOR_LEVEL_l9)
+inline vf vfma(vf a, vf b, vf c) { return _mm256_fmadd_ps(a, b, c); }
+#else
+inline vf vfma(vf a, vf b, vf c) { return _mm256_add_ps(_mm256_mul_ps(a, b), c); }
+#endif
+
+inline __m256i join(__m128i lo, __m128i hi) {
+    return _mm256_insertf128_si256(_mm256_castsi128_si256(lo), hi, 1);
+}
+
+#if defined(ZOR_LEVEL_e9)
+inline vf vpix(const Zor8u* p) {
+    const __m128i v = _mm_loadl_epi64((const __m128i*)p);
+    return _mm256_cvtepi32_ps(join(_mm_cvtepu8_epi32(v), _mm_cvtepu8_epi32(_mm_srli_si128(v, 4))));
+}
+inline vf vpix(const Zor16u* p) {
+    const __m128i v = _mm_loadu_si128((const __m128i*)p);
+    return _mm256_cvtepi32_ps(
+        join(_mm_cvtepu16_epi32(v), _mm_cvtepu16_epi32(_mm_srli_si128(v, 8))));
+}
+inline vf vpix(const Zor16s* p) {
+    const __m128i v = _mm_loadu_si128((const __m128i*)p);
+    return _mm256_cvtepi32_ps(
+        join(_mm_cvtepi16_epi32(v), _mm_cvtepi16_epi32(_mm_srli_si128(v, 8))));
+}
+#else
+inline vf vpix(const Zor8u* p) {
+    return _mm256_cvtepi32_ps(_mm256_cvtepu8_epi32(_mm_loadl_epi64((const __m128i*)p)));
+}
+inline vf vpix(const Zor16u* p) {
+    return _mm256_cvtepi32_ps(_mm256_cvtepu16_epi32(_mm_loadu_si128((const __m128i*)p)));
+}
+// 16s pixels in the upper half of each lane, for the taps scaled by 2^-16.
+inline vf vpix(const Zor16s* p) {
+    return _mm256_cvtepi32_ps(
+        _mm256_slli_epi32(_mm256_cvtepi16_epi32(_mm_loadu_si128((const __m128i*)p)), 16));
+}
+#endif
+
+inline void vput(Zor8u* p, vf v) {
+    const __m256i i = _mm256_cvtps_epi32(vclamp(v, 0.0f, 255.0f));
+    const __m128i w =
+        _mm_packus_epi32(_mm256_castsi256_si128(i), _mm256_extractf128_si256(i, 1));
+    _mm_storel_epi64((__m128i*)p, _mm_packus_epi16(w, w));
+}
+inline void vput(Zor16u* p, vf v) {
+    const __m256i i = _mm256_cvtps_epi32(vclamp(v, 0.0f, 65535.0f));
+    _mm_storeu_si128((__m128i*)p,
+                     _mm_packus_epi32(_mm256_castsi256_si128(i), _mm256_extractf128_si256(i, 1)));
+}
+inline void vput(Zor16s* p, vf v) {
+    const __m256i i = _mm256_cvtps_epi32(vclamp(v, -32768.0f, 32767.0f));
+    _mm_storeu_si128((__m128i*)p,
+                     _mm_packs_epi32(_mm256_castsi256_si128(i), _mm256_extractf128_si256(i, 1)));
+}
+
+// Partial vectors: staged through a local block.
+template <typename T> inline vf vpix_n(const T* p, int32_t n) {
+    T b[VL] = {};
+    memcpy(b, p, (size_t)n * sizeof(T));
+    return vpix(b);
+}
+template <typename T> inline void vput_n(T* p, vf v, int32_t n) {
+    T b[VL];
+    vput(b, v);
+    memcpy(p, b, (size_t)n * sizeof(T));
+}
+inline vf vload_n(const float* p, int32_t n) {
+    float b[VL] = {};
+    memcpy(b, p, (size_t)n * sizeof(float));
+    return vload(b);
+}
+inline void vstore_n(float* p, vf v, int32_t n) {
+    float b[VL];
+    vstore(b, v);
+    memcpy(p, b, (size_t)n * sizeof(float));
+}
+
+#else  // 64-byte vectors: AVX-512F only, so n0 runs it too
+
+typedef __m512 vf;
+constexpr int VL = 16;
+constexpr bool kMasked = true;
+
+inline vf vzero() { return _mm512_setzero_ps(); }
+inline vf vset(float x) { return _mm512_set1_ps(x); }
+inline vf vload(const float* p) { return _mm512_loadu_ps(p); }
+inline void vstore(float* p, vf v) { _mm512_storeu_ps(p, v); }
+inline vf vclamp(vf v, float lo, float hi) {
+    return _mm512_min_ps(_mm512_max_ps(v, _mm512_set1_ps(lo)), _mm512_set1_ps(hi));
+}
+inline vf vfma(vf a, vf b, vf c) { return _mm512_fmadd_ps(a, b, c); }
+
+inline __mmask16 lanes(int32_t n) { return (__mmask16)((1u << n) - 1u); }
+
+inline vf vpix(const Zor8u* p) {
+    return _mm512_cvtepi32_ps(_mm512_cvtepu8_epi32(_mm_loadu_si128((const __m128i*)p)));
+}
+inline vf vpix(const Zor16u* p) {
+    return _mm512_cvtepi32_ps(_mm512_cvtepu16_epi32(_mm256_loadu_si256((const __m256i*)p)));
+}
+inline vf vpix(const Zor16s* p) {
+    return _mm512_cvtepi32_ps(
+        _mm512_slli_epi32(_mm512_cvtepi16_epi32(_mm256_loadu_si256((const __m256i*)p)), 16));
+}
+
+inline void vput(Zor8u* p, vf v) {
+    _mm_storeu_si128((__m128i*)p,
+                     _mm512_cvtusepi32_epi8(_mm512_cvtps_epi32(vclamp(v, 0.0f, 255.0f))));
+}
+inline void vput(Zor16u* p, vf v) {
+    _mm256_storeu_si256((__m256i*)p,
+                        _mm512_cvtusepi32_epi16(_mm512_cvtps_epi32(vclamp(v, 0.0f, 65535.0f))));
+}
+inline void vput(Zor16s* p, vf v) {
+    _mm256_storeu_si256(
+        (__m256i*)p, _mm512_cvtsepi32_epi16(_mm512_cvtps_epi32(vclamp(v, -32768.0f, 32767.0f))));
+}
+
+// Byte and word loads under a mask need BW, which n0 lacks: stage them.
+template <typename T> inline vf vpix_n(const T* p, int32_t n) {
+    T b[VL] = {};
+    memcpy(b, p, (size_t)n * sizeof(T));
+    return vpix(b);
+}
+inline void vput_n(Zor8u* p, vf v, int32_t n) {
+    _mm512_mask_cvtusepi32_storeu_epi8(p, lanes(n), _mm512_cvtps_epi32(vclamp(v, 0.0f, 255.0f)));
+}
+inline void vput_n(Zor16u* p, vf v, int32_t n) {
+    _mm512_mask_cvtusepi32_storeu_epi16(p, lanes(n),
+                                        _mm512_cvtps_epi32(vclamp(v, 0.0f, 65535.0f)));
+}
+inline void vput_n(Zor16s* p, vf v, int32_t n) {
+    _mm512_mask_cvtsepi32_storeu_epi16(p, lanes(n),
+                                       _mm512_cvtps_epi32(vclamp(v, -32768.0f, 32767.0f)));
+}
+inline vf vload_n(const float* p, int32_t n) { return _mm512_maskz_loadu_ps(lanes(n), p); }
+inline void vstore_n(float* p, vf v, int32_t n) { _mm512_mask_storeu_ps(p, lanes(n), v); }
+
+#endif
+
+// 16s on l9 and above multiplies pixels standing in the upper half of a
+// lane by the record's table of taps scaled by 2^-16; the product is the
+// same as the plain one, both being exact powers of two apart.
+#if defined(ZOR_LEVEL_e9)
+constexpr bool kScaled16s = false;
+#else
+constexpr bool kScaled16s = true;
+#endif
+
+// Taps in the caller's order, read in place from the record: tap k at
+// base[k * S] (S = -1: the reversed store walked backwards; S = 4: the
+// table of four copies per tap). The stride is fixed per level and type.
+template <int S> struct Walk {
+    const float* base;
+    float operator[](int32_t k) const { return base[(ptrdiff_t)k * S]; }
+    Walk from(int32_t k) const { return Walk{base + (ptrdiff_t)k * S}; }
+};
+typedef Walk<-1> Reversed;
+typedef Walk<4> Table;
+
+inline Reversed reversed_taps(const Spec& s) {
+    return Reversed{s.pTaps + s.kernelWidth * s.kernelHeight - 1};
+}
+inline Table table_taps(const Spec& s) { return Table{s.pBroadcastTaps}; }
+
+template <typename T> struct TapsOf {
+    typedef Reversed type;
+    static type get(const Spec& s) { return reversed_taps(s); }
+};
+template <> struct TapsOf<Zor16s> {
+    typedef Walk<kScaled16s ? 4 : -1> type;
+    static type get(const Spec& s) { return type{kScaled16s ? s.pBroadcastTaps : reversed_taps(s).base}; }
+};
+
+// n0 and k0 take the 32f taps from the record's broadcast table, e9 and
+// l9 from the reversed store.
+typedef Walk<kMasked ? 4 : -1> Taps32f;
+inline Taps32f taps_32f(const Spec& s) {
+    return Taps32f{kMasked ? s.pBroadcastTaps : reversed_taps(s).base};
+}
+
+inline float pix1(Zor8u v) { return (float)v; }
+inline float pix1(Zor16u v) { return (float)v; }
+inline float pix1(Zor16s v) { return kScaled16s ? (float)v * 65536.0f : (float)v; }
+
+template <typename T> inline const T* row_at(const T* p, int32_t step, int32_t y) {
+    return (const T*)((const uint8_t*)p + (ptrdiff_t)y * step);
+}
+template <typename T> inline T* row_at(T* p, int32_t step, int32_t y) {
+    return (T*)((uint8_t*)p + (ptrdiff_t)y * step);
+}
+
+// A loaded vector that feeds several sums stays in its register: without
+// this the compiler folds the load into every multiply-add, which turns
+// one (usually line-splitting) load into several.
+inline void keep(vf& v) { __asm__("" : "+v"(v)); }
+
+constexpr int NB = 8;  // vectors summed side by side in the wide loops
+
+// ---- integer pixels ------------------------------------------------------------
+
+// n pixels into floats; the row's spare lanes up to `len` are zeroed.
+template <typename T> void to_float(const T* p, float* out, int32_t n, int32_t len) {
+    int32_t i = 0;
+    for (; i + VL <= n; i += VL) vstore(out + i, vpix(p + i));
+    for (; i < n; ++i) out[i] = pix1(p[i]);
+    for (; i < len; ++i) out[i] = 0.0f;
+}
+
+// One line of output in the making: the kernel row applied to it next,
+// whether that row is the first (the line starts at zero) and where the
+// line goes when that row is its last (null: keep it as floats).
+template <typename T> struct Line {
+    float* acc;
+    typename TapsOf<T>::type taps;
+    bool first;
+    T* out;
+};
+
+// The float row `in` applied to L lines at once for the vectors
+// [x, x + N * VL): each vector of the row loaded serves every line.
+template <int N, int L, typename T>
+inline void pass_block(const float* in, const Line<T>* ln, int32_t kw, int32_t x, int32_t w) {
+    vf a[L][N];
+#pragma GCC unroll 4
+    for (int l = 0; l < L; ++l)
+#pragma GCC unroll 16
+        for (int k = 0; k < N; ++k)
+            a[l][k] = ln[l].first ? vzero() : vload(ln[l].acc + x + k * VL);
+    for (int32_t i = 0; i < kw; ++i) {
+        vf v[N];
+#pragma GCC unroll 16
+        for (int k = 0; k < N; ++k) {
+            v[k] = vload(in + x + i + k * VL);
+            if (L > 1) keep(v[k]);
+        }
+#pragma GCC unroll 4
+        for (int l = 0; l < L; ++l) {
+            const vf t = vset(ln[l].taps[i]);
+#pragma GCC unroll 16
+            for (int k = 0; k < N; ++k) a[l][k] = vfma(t, v[k], a[l][k]);
+        }
+    }
+#pragma GCC unroll 4
+    for (int l = 0; l < L; ++l)
+#pragma GCC unroll 16
+        for (int k = 0; k < N; ++k) {
+            const int32_t at = x + k * VL;
+            if (!ln[l].out)
+                vstore(ln[l].acc + at, a[l][k]);
+            else if (at + VL <= w)
+                vput(ln[l].out + at, a[l][k]);
+            else if (at < w)
+                vput_n(ln[l].out + at, a[l][k], w - at);
+        }
+}
+
+// Lines and the float row are padded to whole vectors: the last block
+// runs on spare lanes that are never stored to the image.
+template <int L, typename T>
+void pass(const float* in, const Line<T>* ln, int32_t kw, int32_t lw, int32_t w) {
+    constexpr int N = L == 1 ? NB : NB / 2;
+    int32_t x = 0;
+    for (; x + N * VL <= lw; x += N * VL) pass_block<N, L>(in, ln, kw, x, w);
+    for (; x < lw; x += VL) pass_block<1, L>(in, ln, kw, x, w);
+}
+
+// Kernels one tap wide: the taps of a column straight from the pixels.
+template <int N, typename T>
+inline void column_block(const T* src, int32_t srcStep, T* out, typename TapsOf<T>::type c,
+                         int32_t kh,
+                         int32_t x) {
+    vf a[N];
+#pragma GCC unroll 16
+    for (int k = 0; k < N; ++k) a[k] = vzero();
+    for (int32_t j = 0; j < kh; ++j) {
+        const T* p = row_at(src, srcStep, j) + x;
+        const vf t = vset(c[j]);
+    #pragma GCC unroll 16
+        for (int k = 0; k < N; ++k) a[k] = vfma(t, vpix(p + k * VL), a[k]);
+    }
+#pragma GCC unroll 16
+    for (int k = 0; k < N; ++k) vput(out + x + k * VL, a[k]);
+}
+
+template <typename T>
+void column(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
+            typename TapsOf<T>::type c, int32_t kh) {
+    for (int32_t y = 0; y < h; ++y) {
+        const T* in = row_at(src, srcStep, y);
+        T* out = row_at(dst, dstStep, y);
+        int32_t x = 0;
+        for (; x + 4 * VL <= w; x += 4 * VL) column_block<4>(in, srcStep, out, c, kh, x);
+        for (; x + VL <= w; x += VL) column_block<1>(in, srcStep, out, c, kh, x);
+        if (x < w) {
+            vf a = vzero();
+            for (int32_t j = 0; j < kh; ++j)
+                a = vfma(vset(c[j]), vpix_n(row_at(in, srcStep, j) + x, w - x), a);
+            vput_n(out + x, a, w - x);
+        }
+    }
+}
+
+// Rows of kernels at least 2 wide: each source row is converted once per
+// pair of output rows and feeds both (kernel row r for the upper line,
+// r - 1 for the lower one).
+template <typename T>
+void filter_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
+                const Spec& s, float* work) {
+    const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
+    const typename TapsOf<T>::type c = TapsOf<T>::get(s);
+    if (kw == 1) {
+        column(src, srcStep, dst, dstStep, w, h, c, kh);
+        return;
+    }
+    // Work area: two lines of lw floats and the float row of lw + kw - 1,
+    // within the 4 W + 4 kw kh floats that the size query grants.
+    const int32_t lw = (w + VL - 1) & ~(VL - 1);
+    const int32_t inLen = lw + kw - 1;
+    float* l0 = work;
+    float* l1 = work + lw;
+    float* in = work + 2 * lw;
+    const int32_t n = w + kw - 1;
+
+    int32_t y = 0;
+    if (kh > 1) {
+        for (; y + 1 < h; y += 2) {
+            T* out0 = row_at(dst, dstStep, y);
+            T* out1 = row_at(dst, dstStep, y + 1);
+            for (int32_t r = 0; r <= kh; ++r) {
+                to_float(row_at(src, srcStep, y + r), in, n, inLen);
+                const Line<T> up{l0, c.from((r < kh ? r : 0) * kw), r == 0, r == kh - 1 ? out0 : nullptr};
+                const Line<T> down{l1, c.from((r > 0 ? r - 1 : 0) * kw), r == 1,
+                                     r == kh ? out1 : nullptr};
+                if (r == 0) {
+                    pass<1>(in, &up, kw, lw, w);
+                } else if (r == kh) {
+                    pass<1>(in, &down, kw, lw, w);
+                } else {
+                    const Line<T> both[2] = {up, down};
+                    pass<2>(in, both, kw, lw, w);
+                }
+            }
+        }
+    }
+    for (; y < h; ++y) {
+        T* out = row_at(dst, dstStep, y);
+        for (int32_t r = 0; r < kh; ++r) {
+            to_float(row_at(src, srcStep, y + r), in, n, inLen);
+            const Line<T> one{l0, c.from(r * kw), r == 0, r == kh - 1 ? out : nullptr};
+            pass<1>(in, &one, kw, lw, w);
+        }
+    }
+}
+
+// ---- 32f -----------------------------------------------------------------------
+
+// One source row's taps into the R x N sums; kAll: every output row of
+// the block lies over this source row.
+template <int R, int N, bool kAll>
+__attribute__((always_inline)) inline void source_row(const Zor32f* p, vf (&a)[R][N], const bool (&live)[R],
+                       const Taps32f (&rowTaps)[R], int32_t kw) {
+    for (int32_t i = 0; i < kw; ++i) {
+        vf v[N];
+#pragma GCC unroll 16
+        for (int k = 0; k < N; ++k) {
+            v[k] = vload(p + i + k * VL);
+            if (R > 1) keep(v[k]);
+        }
+#pragma GCC unroll 4
+        for (int q = 0; q < R; ++q) {
+            if (!kAll && !live[q]) continue;
+            const vf t = vset(rowTaps[q][i]);
+#pragma GCC unroll 16
+            for (int k = 0; k < N; ++k) a[q][k] = vfma(t, v[k], a[q][k]);
+        }
+    }
+}
+
+// All taps for R output rows by N vectors at x, in registers: every
+// source vector loaded serves each of the R rows it lies under.
+template <int R, int N>
+inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep,
+                      Taps32f c, int32_t kw, int32_t kh, int32_t x) {
+    vf a[R][N];
+#pragma GCC unroll 4
+    for (int q = 0; q < R; ++q)
+#pragma GCC unroll 16
+        for (int k = 0; k < N; ++k) a[q][k] = vzero();
+    for (int32_t r = 0; r < kh + R - 1; ++r) {
+        const Zor32f* p = row_at(src, srcStep, r) + x;
+        // Output row q takes this source row with kernel row r - q.
+        bool live[R];
+        Taps32f rowTaps[R];
+#pragma GCC unroll 4
+        for (int q = 0; q < R; ++q) {
+            live[q] = r - q >= 0 && r - q < kh;
+            rowTaps[q] = c.from(live[q] ? (r - q) * kw : 0);
+        }
+        bool all = true;
+#pragma GCC unroll 4
+        for (int q = 0; q < R; ++q) all = all && live[q];
+        // Rows under every output row of the block take the loop without
+        // tests; only the first and last R - 1 rows take the other.
+        if (all)
+            source_row<R, N, true>(p, a, live, rowTaps, kw);
+        else
+            source_row<R, N, false>(p, a, live, rowTaps, kw);
+    }
+#pragma GCC unroll 4
+    for (int q = 0; q < R; ++q)
+#pragma GCC unroll 16
+        for (int k = 0; k < N; ++k) vstore(row_at(dst, dstStep, q) + x + k * VL, a[q][k]);
+}
+
+// The last n < VL outputs of one row (n0, k0).
+inline void tail_32f(const Zor32f* src, int32_t srcStep, Zor32f* out, Taps32f c,
+                     int32_t kw, int32_t kh, int32_t x, int32_t n) {
+    vf a = vzero();
+    for (int32_t j = 0; j < kh; ++j) {
+        const Zor32f* p = row_at(src, srcStep, j) + x;
+        const Taps32f cj = c.from(j * kw);
+        for (int32_t i = 0; i < kw; ++i) a = vfma(vset(cj[i]), vload_n(p + i, n), a);
+    }
+    vstore_n(out + x, a, n);
+}
+
+// R rows of output.
+template <int R, int N>
+void rows_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
+              Taps32f c, int32_t kw, int32_t kh) {
+    int32_t x = 0;
+    for (; x + N * VL <= w; x += N * VL)
+        block_32f<R, N>(src, srcStep, dst, dstStep, c, kw, kh, x);
+    for (; x + VL <= w; x += VL) block_32f<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, x);
+    if (x == w) return;
+    if (kMasked) {
+        for (int q = 0; q < R; ++q)
+            tail_32f(row_at(src, srcStep, q), srcStep, row_at(dst, dstStep, q), c, kw, kh, x,
+                     w - x);
+    } else {  // w >= VL on e9 and l9: redo the last whole vector
+        block_32f<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, w - VL);
+    }
+}
+
+#if ZOR_VECTOR_BYTES == 64
+constexpr int kRows32f = 4, kCols32f = 4;  // 16 of the 32 registers accumulate
+#else
+constexpr int kRows32f = 2, kCols32f = 4;  // 8 of the 16
+#endif
+
+void filter_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
+                int32_t h, const Spec& s) {
+    const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
+    const Taps32f c = taps_32f(s);
+    int32_t y = 0;
+    for (; y + kRows32f <= h; y += kRows32f)
+        rows_32f<kRows32f, kCols32f>(row_at(src, srcStep, y), srcStep, row_at(dst, dstStep, y),
+                                     dstStep, w, c, kw, kh);
+    for (; y < h; ++y)
+        rows_32f<1, NB>(row_at(src, srcStep, y), srcStep, row_at(dst, dstStep, y), dstStep, w, c,
+                        kw, kh);
+}
+
+}  // namespace
+
+void vec_avx(const Zor8u* src, int32_t srcStep, Zor8u* dst, int32_t dstStep, int32_t w, int32_t h,
+             const Spec& s, float* work) {
+    filter_int(src, srcStep, dst, dstStep, w, h, s, work);
+}
+void vec_avx(const Zor16u* src, int32_t srcStep, Zor16u* dst, int32_t dstStep, int32_t w,
+             int32_t h, const Spec& s, float* work) {
+    filter_int(src, srcStep, dst, dstStep, w, h, s, work);
+}
+void vec_avx(const Zor16s* src, int32_t srcStep, Zor16s* dst, int32_t dstStep, int32_t w,
+             int32_t h, const Spec& s, float* work) {
+    filter_int(src, srcStep, dst, dstStep, w, h, s, work);
+}
+void vec_avx(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
+             int32_t h, const Spec& s, float*) {
+    filter_32f(src, srcStep, dst, dstStep, w, h, s);
+}
+
+}  // namespace filt
+ZOR_END
+
+#endif
