@@ -8,5 +8,6 @@
 #include "zori.h"
 #include "zoriborder.h"
 #include "zorifilter64f.h"
+#include "zorifilter.h"
 
 #endif

@@ -69,10 +69,11 @@ inline void to_float(const Zor16s* p, float* out, int32_t n) {
 
 // ---- line to pixels ------------------------------------------------------------
 
-// TEMPORARY: stand-ins for ZOR_NAME(zorsConvert_32f8u_Sfs) (and the 16u,
-// 16s forms) with rounding mode 1 and scale 0, and for
-// ZOR_NAME(zorsAddC_32f_I), until the vector layer's row functions land;
-// then these call them.
+// TEMPORARY: local stand-ins, so that this file needs nothing that is not
+// on main yet. Once the vector layer's row conversions (32f to 8u, 16u,
+// 16s with mode 1, scale 0) and in-place constant addition land, these
+// become calls of ZOR_NAME(zorsConvert_32f8u_Sfs) and kin and of
+// ZOR_NAME(zorsAddC_32f_I).
 // Saturate in float, then convert in the rounding mode in force (nearest).
 inline __m128i near_i32(const float* p, float lo, float hi) {
     const __m128 v = _mm_min_ps(_mm_max_ps(_mm_loadu_ps(p), _mm_set1_ps(lo)), _mm_set1_ps(hi));
