@@ -9,5 +9,6 @@
 #include "zoriborder.h"
 #include "zorifilter64f.h"
 #include "zorifilter.h"
+#include "zorimorph.h"
 
 #endif

@@ -1,0 +1,485 @@
+// Erosion and dilation with border: the size query, the record that
+// classifies the mask once, the argument checks and the driver. The driver
+// cuts the ROI like the general filter does: thin bands at the edges run
+// over small framed temporaries in the caller's buffer, the centre runs on
+// the caller's image, and a ROI no larger than the mask is framed whole, so
+// that the kernels never test coordinates.
+#include "variant.h"
+
+#include <string.h>
+
+#include "border_type.h"
+#include "morph_internal.h"
+
+ZOR_BEGIN
+namespace morph {
+namespace {
+
+constexpr int32_t kMaxMaskSide = 32767;  // columns are kept in 16 bits
+constexpr int64_t kMaxSize = 0x7fffffff;
+
+inline int64_t round32(int64_t x) { return (x + 31) & ~(int64_t)31; }
+
+template <typename P> inline P* align32(P* p) {
+    return (P*)(((uintptr_t)p + 31) & ~(uintptr_t)31);
+}
+
+// The frame area in elements: the larger band temporary, or the whole
+// framed ROI when the ROI is not larger than the mask.
+int64_t frame_elems(int32_t mw, int32_t mh, int32_t ax, int32_t ay, int64_t W, int64_t H) {
+    const int64_t w = mw, h = mh;
+    if (w < W && h < H) {
+        const int64_t bottom = h - ay - 1, right = w - ax - 1;
+        int64_t a = bottom > 0 ? (w + W - 1) * (2 * h - ay - 2) : 0;
+        if (right > 0) {
+            const int64_t side = (h + H - 1) * (2 * w - ax - 2);
+            if (side > a) a = side;
+        }
+        return a;
+    }
+    return (w + W - 1) * (h + H - 1);
+}
+
+ZorStatus get_size(ZoriSize roi, ZoriSize mask, int32_t e, int32_t* pSpecSize,
+                   int32_t* pBufferSize) {
+    if (!pSpecSize || !pBufferSize) return zorStsNullPtrErr;
+    if (roi.width < 1 || roi.height < 1 || mask.width < 1 || mask.height < 1)
+        return zorStsSizeErr;
+    if (mask.width > kMaxMaskSide || mask.height > kMaxMaskSide) return zorStsMaskSizeErr;
+    const int64_t w = mask.width | 1, h = mask.height | 1;
+    const int64_t spec = h * ((w + 1) * 2 + w) + 136 + (w + 1) * h * 2;
+    const int64_t a =
+        frame_elems((int32_t)w, (int32_t)h, mask.width >> 1, mask.height >> 1, roi.width,
+                    roi.height) *
+        e;
+    const int64_t ring = round32((int64_t)roi.width * e) * h + round32(w * e) + 16 * e;
+    const int64_t buf = round32(a) + ring + 64;
+    if (spec > kMaxSize || buf > kMaxSize) {
+        *pSpecSize = 0;
+        *pBufferSize = 0;
+        return zorStsExceededSizeErr;
+    }
+    *pSpecSize = (int32_t)spec;
+    *pBufferSize = (int32_t)buf;
+    return zorStsNoErr;
+}
+
+inline void wr16(uint8_t* p, ptrdiff_t i, int32_t v) {
+    const uint16_t u = (uint16_t)v;
+    memcpy(p + 2 * i, &u, 2);
+}
+
+// The three fixed shapes, row by row, as half-widths of a centred run.
+const int8_t kShape3[3] = {0, 1, 0};
+const int8_t kShape5[5] = {0, 1, 2, 1, 0};
+const int8_t kShape7[7] = {0, 2, 2, 3, 2, 2, 0};
+
+bool is_shape(const uint8_t* m, int32_t mw, int32_t mh, const int8_t* hw, int32_t n) {
+    if (mw != n || mh != n) return false;
+    const int32_t c = n >> 1;
+    for (int32_t r = 0; r < n; ++r)
+        for (int32_t x = 0; x < n; ++x) {
+            const bool want = x >= c - hw[r] && x <= c + hw[r];
+            if ((m[r * n + x] != 0) != want) return false;
+        }
+    return true;
+}
+
+ZorStatus init(ZoriSize roi, const Zor8u* pMask, ZoriSize mask, ZoriMorphState* pState,
+               const Zor8u* pBuffer) {
+    if (!pMask || !pState || !pBuffer) return zorStsNullPtrErr;
+    if (roi.width < 1 || roi.height < 1 || mask.width < 1 || mask.height < 1)
+        return zorStsSizeErr;
+    if (mask.width > kMaxMaskSide || mask.height > kMaxMaskSide) return zorStsMaskSizeErr;
+
+    const int32_t cw = mask.width, ch = mask.height;
+    const int32_t mw = cw | 1, mh = ch | 1;
+    uint8_t* base = (uint8_t*)pState;
+    uint8_t* m = base + sizeof(Head);
+    uint8_t* lists = m + (ptrdiff_t)mw * mh;
+    uint8_t* runs = lists + (ptrdiff_t)mh * (mw + 1) * 2;
+
+    // Turned by 180 degrees; the padding of an even side lies behind the
+    // caller's last row or column, so at stored index 0.
+    for (int32_t r = 0; r < mh; ++r) {
+        const int32_t cr = mh - 1 - r;
+        for (int32_t c = 0; c < mw; ++c) {
+            const int32_t cc = mw - 1 - c;
+            const bool set = cr < ch && cc < cw && pMask[(ptrdiff_t)cr * cw + cc] != 0;
+            m[(ptrdiff_t)r * mw + c] = set ? 255 : 0;
+        }
+    }
+
+    Head hd;
+    memset(&hd, 0, sizeof hd);
+    hd.pMask = m;
+    hd.maskWidth = mw;
+    hd.maskHeight = mh;
+    hd.anchorX = cw >> 1;
+    hd.anchorY = ch >> 1;
+    hd.pRowLists = lists;
+    hd.pRuns = runs;
+    hd.callerWidth = cw;
+    hd.callerHeight = ch;
+
+    // Row lists, runs, and the row counts the cross test needs.
+    int64_t total = 0;
+    int32_t fullRows = 0, fullRow = -1, crowdedRows = 0;
+    hd.isRowRuns = 1;
+    for (int32_t r = 0; r < mh; ++r) {
+        const uint8_t* row = m + (ptrdiff_t)r * mw;
+        uint8_t* list = lists + (ptrdiff_t)r * (mw + 1) * 2;
+        int32_t n = 0, first = -1, last = -1;
+        for (int32_t c = 0; c < mw; ++c) {
+            if (!row[c]) continue;
+            wr16(list, 1 + n, c);
+            ++n;
+            if (first < 0) first = c;
+            else if (c != last + 1) hd.isRowRuns = 0;
+            last = c;
+        }
+        wr16(list, 0, n);
+        wr16(runs, 2 * r, first);
+        wr16(runs, 2 * r + 1, last);
+        total += n;
+        if (n == mw) {
+            ++fullRows;
+            fullRow = r;
+        } else if (n > 1) {
+            ++crowdedRows;
+        }
+    }
+    int32_t fullCols = 0, fullCol = -1, crowdedCols = 0;
+    for (int32_t c = 0; c < mw; ++c) {
+        int32_t n = 0;
+        for (int32_t r = 0; r < mh; ++r) n += m[(ptrdiff_t)r * mw + c] != 0;
+        if (n == mh) {
+            ++fullCols;
+            fullCol = c;
+        } else if (n > 1) {
+            ++crowdedCols;
+        }
+    }
+    hd.isCross = fullRows == 1 && fullCols == 1 && crowdedRows == 0 && crowdedCols == 0 &&
+                 mw >= 2 && mh >= 2;
+    if (hd.isCross) {
+        wr16(runs, 0, fullRow);
+        wr16(runs, 1, fullCol);
+    }
+
+    uint32_t shape = 0;
+    if (is_shape(m, mw, mh, kShape3, 3)) shape = kFixed;
+    else if (is_shape(m, mw, mh, kShape5, 5)) shape = kFixed5;
+    else if (is_shape(m, mw, mh, kShape7, 7)) shape = kFixed7;
+    hd.isFixedShape = shape != 0;
+
+    uint32_t feature = 0;
+    if (total == (int64_t)mw * mh) feature |= kFull;
+    if (total == 0) feature |= kEmpty;
+    bool outerEmpty = false;
+    for (int32_t side = 0; side < 2 && !outerEmpty; ++side) {
+        const uint8_t* row = m + (ptrdiff_t)(side ? mh - 1 : 0) * mw;
+        bool any = false;
+        for (int32_t c = 0; c < mw; ++c) any |= row[c] != 0;
+        const int32_t col = side ? mw - 1 : 0;
+        bool anyCol = false;
+        for (int32_t r = 0; r < mh; ++r) anyCol |= m[(ptrdiff_t)r * mw + col] != 0;
+        outerEmpty = !any || !anyCol;
+    }
+    if (outerEmpty) feature |= kOuterEmpty;
+    if (hd.isRowRuns) feature |= kRowRuns;
+    if (hd.isCross) feature |= kCross;
+    feature |= shape;
+    hd.maskFeature = feature;
+
+    memcpy(base, &hd, sizeof hd);
+    return zorStsNoErr;
+}
+
+// ---- the driver ---------------------------------------------------------------
+
+// copy(): TEMPORARY, a frame of width 0 (a plain copy) until the image
+// copies zoriCopy_8u/16u/16s/32f_C1R land; then call those.
+template <typename T> struct Frames;
+template <> struct Frames<Zor8u> {
+    static void copy(const Zor8u* s, int32_t ss, Zor8u* d, int32_t ds, ZoriSize r) {
+        ZOR_NAME(zoriCopyConstBorder_8u_C1R)(s, ss, r, d, ds, r, 0, 0, Zor8u());
+    }
+    static void repl(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left) {
+        ZOR_NAME(zoriCopyReplicateBorder_8u_C1R)(s, ss, sr, d, ds, dr, top, left);
+    }
+    static void mirr(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left) {
+        ZOR_NAME(zoriCopyMirrorBorder_8u_C1R)(s, ss, sr, d, ds, dr, top, left);
+    }
+    static void cnst(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left, Zor8u v) {
+        ZOR_NAME(zoriCopyConstBorder_8u_C1R)(s, ss, sr, d, ds, dr, top, left, v);
+    }
+};
+template <> struct Frames<Zor16u> {
+    static void copy(const Zor16u* s, int32_t ss, Zor16u* d, int32_t ds, ZoriSize r) {
+        ZOR_NAME(zoriCopyConstBorder_16u_C1R)(s, ss, r, d, ds, r, 0, 0, Zor16u());
+    }
+    static void repl(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left) {
+        ZOR_NAME(zoriCopyReplicateBorder_16u_C1R)(s, ss, sr, d, ds, dr, top, left);
+    }
+    static void mirr(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left) {
+        ZOR_NAME(zoriCopyMirrorBorder_16u_C1R)(s, ss, sr, d, ds, dr, top, left);
+    }
+    static void cnst(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left, Zor16u v) {
+        ZOR_NAME(zoriCopyConstBorder_16u_C1R)(s, ss, sr, d, ds, dr, top, left, v);
+    }
+};
+template <> struct Frames<Zor16s> {
+    static void copy(const Zor16s* s, int32_t ss, Zor16s* d, int32_t ds, ZoriSize r) {
+        ZOR_NAME(zoriCopyConstBorder_16s_C1R)(s, ss, r, d, ds, r, 0, 0, Zor16s());
+    }
+    static void repl(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left) {
+        ZOR_NAME(zoriCopyReplicateBorder_16s_C1R)(s, ss, sr, d, ds, dr, top, left);
+    }
+    static void mirr(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left) {
+        ZOR_NAME(zoriCopyMirrorBorder_16s_C1R)(s, ss, sr, d, ds, dr, top, left);
+    }
+    static void cnst(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left, Zor16s v) {
+        ZOR_NAME(zoriCopyConstBorder_16s_C1R)(s, ss, sr, d, ds, dr, top, left, v);
+    }
+};
+template <> struct Frames<Zor32f> {
+    static void copy(const Zor32f* s, int32_t ss, Zor32f* d, int32_t ds, ZoriSize r) {
+        ZOR_NAME(zoriCopyConstBorder_32f_C1R)(s, ss, r, d, ds, r, 0, 0, Zor32f());
+    }
+    static void repl(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left) {
+        ZOR_NAME(zoriCopyReplicateBorder_32f_C1R)(s, ss, sr, d, ds, dr, top, left);
+    }
+    static void mirr(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left) {
+        ZOR_NAME(zoriCopyMirrorBorder_32f_C1R)(s, ss, sr, d, ds, dr, top, left);
+    }
+    static void cnst(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds, ZoriSize dr,
+                     int32_t top, int32_t left, Zor32f v) {
+        ZOR_NAME(zoriCopyConstBorder_32f_C1R)(s, ss, sr, d, ds, dr, top, left, v);
+    }
+};
+
+// One framed temporary: the source rectangle at the temporary's (left,
+// top), the rest made up by the border kind (replicate, mirror or const).
+template <typename T>
+void make_frame(int32_t kind, const T* src, int32_t srcStep, int32_t sw, int32_t sh, T* tmp,
+                int32_t tw, int32_t th, int32_t top, int32_t left, T value) {
+    const int32_t ts = tw * (int32_t)sizeof(T);
+    if (kind == zorBorderRepl)
+        Frames<T>::repl(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left);
+    else if (kind == zorBorderMirror)
+        Frames<T>::mirr(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left);
+    else
+        Frames<T>::cnst(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left, value);
+}
+
+template <typename T> inline const T* at(const T* p, int32_t step, int32_t dy, int32_t dx) {
+    return (const T*)((const uint8_t*)p + (ptrdiff_t)dy * step) + dx;
+}
+template <typename T> inline T* at(T* p, int32_t step, int32_t dy, int32_t dx) {
+    return (T*)((uint8_t*)p + (ptrdiff_t)dy * step) + dx;
+}
+
+template <typename T> using Kernel = void (*)(const Job<T>&);
+
+template <typename T, typename Op> struct Pick {
+    static Kernel<T> mask(const Head&) { return offsets<T, Op>; }
+};
+template <typename Op> struct Pick<Zor8u, Op> {
+    static Kernel<Zor8u> mask(const Head& h) {
+        if (h.maskFeature & kFixed) return fixed_8u<Op>;
+        if (h.maskFeature & kCross) return cross_8u<Op>;
+        if (h.maskFeature & kRowRuns) return row_runs_8u<Op>;
+        return general_8u<Op>;
+    }
+};
+
+template <typename T, typename Op>
+Kernel<T> pick(const Head& h) {
+    if (h.maskFeature & kFull)
+        return h.maskWidth == 3 && h.maskHeight == 3 ? rect3x3<T, Op> : rect_separable<T, Op>;
+    return Pick<T, Op>::mask(h);
+}
+
+// borderType arrives checked, with kind 5 already turned into 6 and value
+// set; only the low eight bits are looked at here.
+template <typename T, typename Op>
+void drive(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t W, int32_t H,
+           int32_t borderType, T value, const ZoriMorphState* state, Zor8u* buffer) {
+    Head hd;
+    memcpy(&hd, state, sizeof hd);
+    const int32_t mw = hd.maskWidth, mh = hd.maskHeight;
+    if ((mw == 1 && mh == 1) || (hd.maskFeature & kEmpty)) {
+        Frames<T>::copy(src, srcStep, dst, dstStep, {W, H});
+        return;
+    }
+    const Kernel<T> kernel = pick<T, Op>(hd);
+    const int32_t ax = (mw - 1) >> 1, ay = (mh - 1) >> 1;
+    const int32_t right = mw - ax - 1, bottom = mh - ay - 1;
+    const int32_t kind = zorBorderKind(borderType);
+    const bool small = W <= mw || H <= mh;
+
+    // A side the mask does not reach counts as being in memory.
+    int32_t flags = borderType & zorBorderFlagMask;
+    if (ax == 0) {
+        flags |= zorBorderInMemLeft;
+        if (right == 0) flags |= zorBorderInMemRight;
+    }
+    if (ay == 0) {
+        flags |= zorBorderInMemTop;
+        if (bottom == 0) flags |= zorBorderInMemBottom;
+    }
+
+    T* tmp = align32((T*)buffer);
+    const int64_t frameBytes = round32(frame_elems(mw, mh, ax, ay, W, H) * (int64_t)sizeof(T));
+    Job<T> job;
+    job.head = &hd;
+    job.ring = (uint8_t*)tmp + frameBytes;
+    auto run = [&](const T* s, int32_t ss, T* d, int32_t w, int32_t h) {
+        job.src = s;
+        job.srcStep = ss;
+        job.dst = d;
+        job.dstStep = dstStep;
+        job.width = w;
+        job.height = h;
+        kernel(job);
+    };
+
+    if (flags == zorBorderInMem) {
+        run(at(src, srcStep, -ay, -ax), srcStep, dst, W, H);
+        return;
+    }
+    const bool inT = flags & zorBorderInMemTop, inB = flags & zorBorderInMemBottom;
+    const bool inL = flags & zorBorderInMemLeft, inR = flags & zorBorderInMemRight;
+
+    if (small) {
+        // One frame for the whole ROI; sides in memory enlarge the copied
+        // rectangle instead of being made up.
+        const int32_t tw = W + mw - 1, th = H + mh - 1;
+        const int32_t sw = W + (inL ? ax : 0) + (inR ? right : 0);
+        const int32_t sh = H + (inT ? ay : 0) + (inB ? bottom : 0);
+        make_frame(kind, at(src, srcStep, inT ? -ay : 0, inL ? -ax : 0), srcStep, sw, sh, tmp, tw,
+                   th, inT ? 0 : ay, inL ? 0 : ax, value);
+        run(tmp, tw * (int32_t)sizeof(T), dst, W, H);
+        return;
+    }
+
+    // Top and bottom bands span the full width; their corners come from
+    // memory where the left or right side is there, else from the frame.
+    const int32_t bandX = inL ? -ax : 0;
+    const int32_t bandW = W + (inL ? ax : 0) + (inR ? right : 0);
+    const int32_t bandLeft = inL ? 0 : ax;
+    const int32_t bandTw = W + mw - 1;
+    if (!inT) {
+        make_frame(kind, at(src, srcStep, 0, bandX), srcStep, bandW, mh - 1, tmp, bandTw,
+                   ay + mh - 1, ay, bandLeft, value);
+        run(tmp, bandTw * (int32_t)sizeof(T), dst, W, ay);
+        src = at(src, srcStep, ay, 0);
+        dst = at(dst, dstStep, ay, 0);
+        H -= ay;
+    }
+    if (!inB) {
+        const int32_t rows = mh - 1;
+        make_frame(kind, at(src, srcStep, H - rows, bandX), srcStep, bandW, rows, tmp, bandTw,
+                   rows + bottom, 0, bandLeft, value);
+        run(tmp, bandTw * (int32_t)sizeof(T), at(dst, dstStep, H - bottom, 0), W, bottom);
+        H -= bottom;
+    }
+    // Left and right bands need no vertical frame: the rows above and below
+    // what remains are real, taken off by the bands above or in memory.
+    if (!inL) {
+        const int32_t tw = mw + ax - 1, th = mh + H - 1;
+        make_frame(kind, at(src, srcStep, -ay, 0), srcStep, mw - 1, th, tmp, tw, th, 0, ax, value);
+        run(tmp, tw * (int32_t)sizeof(T), dst, ax, H);
+        src += ax;
+        dst += ax;
+        W -= ax;
+    }
+    if (!inR) {
+        const int32_t cols = mw - 1;
+        const int32_t tw = cols + right, th = mh + H - 1;
+        make_frame(kind, at(src, srcStep, -ay, W - cols), srcStep, cols, th, tmp, tw, th, 0, 0,
+                   value);
+        run(tmp, tw * (int32_t)sizeof(T), dst + (W - right), right, H);
+        W -= right;
+    }
+    run(at(src, srcStep, -ay, -ax), srcStep, dst, W, H);
+}
+
+template <typename T, typename Op>
+ZorStatus entry(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriSize roi,
+                int32_t borderType, T borderValue, const ZoriMorphState* pState,
+                Zor8u* pBuffer) {
+    if (!pSrc || !pDst || !pState || !pBuffer) return zorStsNullPtrErr;
+    if (roi.width < 1 || roi.height < 1) return zorStsSizeErr;
+    const int64_t rowBytes = (int64_t)roi.width * (int64_t)sizeof(T);
+    if (srcStep < rowBytes || dstStep < rowBytes) return zorStsStepErr;
+    if (sizeof(T) > 1 && ((srcStep | dstStep) & (int32_t)(sizeof(T) - 1)))
+        return zorStsNotEvenStepErr;
+    if (zorBorderTypeCheck(borderType,
+                           zorBorderAcceptRepl | zorBorderAcceptMirror | zorBorderAcceptDefault |
+                               zorBorderAcceptConst,
+                           zorBorderLimitMorph) != zorStsNoErr)
+        return zorStsBorderErr;
+    if (sizeof(T) > 1 && (const void*)pSrc == (const void*)pDst)
+        return zorStsInplaceModeNotSupportedErr;
+    // The 8u forms also take the side flags in bits 8 to 11; the others
+    // ignore those bits.
+    int32_t border = sizeof(T) == 1 ? ((borderType & 0xf00) >> 4) | (borderType & 255)
+                                    : borderType & 255;
+    T value = T();
+    if (zorBorderKind(border) == zorBorderDefault) {
+        border = (border & ~zorBorderKindMask) | zorBorderConst;
+        value = Neutral<T, Op>::v;
+    } else if (zorBorderKind(border) == zorBorderConst) {
+        value = borderValue;
+    }
+    drive<T, Op>(pSrc, srcStep, pDst, dstStep, roi.width, roi.height, border, value, pState,
+                 pBuffer);
+    return zorStsNoErr;
+}
+
+}  // namespace
+}  // namespace morph
+ZOR_END
+
+using namespace ZOR_NS::morph;
+
+#define MORPH_SIZE_INIT(t, T, e)                                                               \
+    ZOR_ENTRY ZorStatus ZOR_NAME(zoriMorphologyBorderGetSize_##t##_C1R)(                       \
+        ZoriSize roiSize, ZoriSize maskSize, int32_t * pSpecSize, int32_t * pBufferSize) {     \
+        return get_size(roiSize, maskSize, e, pSpecSize, pBufferSize);                         \
+    }                                                                                          \
+    ZOR_ENTRY ZorStatus ZOR_NAME(zoriMorphologyBorderInit_##t##_C1R)(                          \
+        ZoriSize roiSize, const Zor8u* pMask, ZoriSize maskSize, ZoriMorphState* pMorphSpec,   \
+        Zor8u* pBuffer) {                                                                      \
+        return init(roiSize, pMask, maskSize, pMorphSpec, pBuffer);                            \
+    }                                                                                          \
+    ZOR_ENTRY ZorStatus ZOR_NAME(zoriErodeBorder_##t##_C1R)(                                   \
+        const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriSize roiSize,            \
+        int32_t borderType, T borderValue, const ZoriMorphState* pMorphSpec, Zor8u* pBuffer) { \
+        return entry<T, OpMin>(pSrc, srcStep, pDst, dstStep, roiSize, borderType, borderValue, \
+                               pMorphSpec, pBuffer);                                           \
+    }                                                                                          \
+    ZOR_ENTRY ZorStatus ZOR_NAME(zoriDilateBorder_##t##_C1R)(                                  \
+        const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriSize roiSize,            \
+        int32_t borderType, T borderValue, const ZoriMorphState* pMorphSpec, Zor8u* pBuffer) { \
+        return entry<T, OpMax>(pSrc, srcStep, pDst, dstStep, roiSize, borderType, borderValue, \
+                               pMorphSpec, pBuffer);                                           \
+    }
+
+MORPH_SIZE_INIT(8u, Zor8u, 1)
+MORPH_SIZE_INIT(16u, Zor16u, 2)
+MORPH_SIZE_INIT(16s, Zor16s, 2)
+MORPH_SIZE_INIT(32f, Zor32f, 4)

@@ -1,0 +1,529 @@
+// Erosion and dilation kernels. Each is written once over a vector type V
+// and instantiated twice: with the level's vector for the body of a row and
+// with the element itself for the row's tail, so that both give the same
+// result per pixel (floats: the same comparisons in the same order). The
+// running result is always the first operand.
+#include "variant.h"
+
+#include "morph_internal.h"
+
+ZOR_BEGIN
+namespace morph {
+namespace {
+
+// ---- 3 by 3 rectangle: one pass, two output rows share the middle rows ------
+
+template <typename V, typename Op, typename T>
+MORPH_INLINE void rect3_pair(const T* r0, const T* r1, const T* r2, const T* r3, T* d0, T* d1) {
+    V c0[3], c1[3];
+#pragma GCC unroll 3
+    for (int k = 0; k < 3; ++k) {
+        const V a = ld<V>(r0 + k), b = ld<V>(r1 + k), c = ld<V>(r2 + k), d = ld<V>(r3 + k);
+        const V m = Op::f(b, c);
+        c0[k] = Op::f(a, m);
+        c1[k] = Op::f(m, d);
+    }
+    st(d0, Op::f(Op::f(c0[0], c0[1]), c0[2]));
+    st(d1, Op::f(Op::f(c1[0], c1[1]), c1[2]));
+}
+
+template <typename V, typename Op, typename T>
+MORPH_INLINE void rect3_one(const T* r0, const T* r1, const T* r2, T* d0) {
+    V c0[3];
+#pragma GCC unroll 3
+    for (int k = 0; k < 3; ++k)
+        c0[k] = Op::f(ld<V>(r0 + k), Op::f(ld<V>(r1 + k), ld<V>(r2 + k)));
+    st(d0, Op::f(Op::f(c0[0], c0[1]), c0[2]));
+}
+
+}  // namespace
+
+template <typename T, typename Op> void rect3x3(const Job<T>& j) {
+    const int32_t W = j.width;
+    int32_t y = 0;
+    for (; y + 2 <= j.height; y += 2) {
+        const T* r0 = row_at(j.src, j.srcStep, y);
+        const T* r1 = row_at(j.src, j.srcStep, y + 1);
+        const T* r2 = row_at(j.src, j.srcStep, y + 2);
+        const T* r3 = row_at(j.src, j.srcStep, y + 3);
+        T* d0 = row_at(j.dst, j.dstStep, y);
+        T* d1 = row_at(j.dst, j.dstStep, y + 1);
+        for_row<T>(0, W, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+            typedef typename decltype(tag)::type U;
+            rect3_pair<U, Op>(r0 + x, r1 + x, r2 + x, r3 + x, d0 + x, d1 + x);
+        });
+    }
+    if (y < j.height) {
+        const T* r0 = row_at(j.src, j.srcStep, y);
+        const T* r1 = row_at(j.src, j.srcStep, y + 1);
+        const T* r2 = row_at(j.src, j.srcStep, y + 2);
+        T* d0 = row_at(j.dst, j.dstStep, y);
+        for_row<T>(0, W, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+            typedef typename decltype(tag)::type U;
+            rect3_one<U, Op>(r0 + x, r1 + x, r2 + x, d0 + x);
+        });
+    }
+}
+
+// ---- any other rectangle: rows, then columns over a ring of row results -------
+// Output rows go in pairs, which share all but one ring row; the two new
+// row results are made and stored in the same pass.
+
+namespace {
+
+// MW, MH: the mask's sides when fixed at compile time (3, 5, 7), else 0.
+template <int MW, typename V, typename Op, typename T>
+MORPH_INLINE V row_fold(const T* s, int32_t mw) {
+    if (MW) mw = MW;
+    V acc = ld<V>(s);
+#pragma GCC unroll 8
+    for (int32_t c = 1; c < mw; ++c) acc = Op::f(acc, ld<V>(s + c));
+    return acc;
+}
+
+// The ring rows of one output pair (or single output), found once per row
+// pair: the slot of the window's first row, the slots after it (wrapping
+// around), and the slot the next row result goes to.
+struct RingRows {
+    uint8_t* base;
+    uint8_t* end;
+    ptrdiff_t stride;  // bytes
+    uint8_t* top;      // slot of window row 0
+    uint8_t* next;     // slot of window row 1
+    uint8_t* fresh;    // free slot for window row mh - 1
+};
+
+MORPH_INLINE uint8_t* wrap(uint8_t* p, const RingRows& r) {
+    p += r.stride;
+    return p == r.end ? r.base : p;
+}
+
+// Pair of outputs y, y + 1 (window rows 0 .. mh): the ring holds window
+// rows 0 .. mh - 2, rows mh - 1 and mh are made here.
+template <int MW, int MH, typename V, typename Op, typename T>
+MORPH_INLINE void sep_pair(const T* sA, const T* sB, const RingRows& r, int32_t mw, int32_t mh,
+                           int32_t x, T* d0, T* d1) {
+    if (MH) mh = MH;
+    const ptrdiff_t xb = x * (ptrdiff_t)sizeof(T);
+    const V a = row_fold<MW, V, Op>(sA + x, mw), b = row_fold<MW, V, Op>(sB + x, mw);
+    uint8_t* p = r.next;
+    V mid = ld<V>(p + xb);
+#pragma GCC unroll 8
+    for (int32_t k = 2; k <= mh - 2; ++k) {
+        p = wrap(p, r);
+        mid = Op::f(mid, ld<V>(p + xb));
+    }
+    mid = Op::f(mid, a);
+    const V top = ld<V>(r.top + xb);
+    st(d0 + x, Op::f(top, mid));
+    st(d1 + x, Op::f(mid, b));
+    st(r.fresh + xb, a);
+    st(r.top + xb, b);
+}
+
+// A last single output (window rows 0 .. mh - 1).
+template <int MW, int MH, typename V, typename Op, typename T>
+MORPH_INLINE void sep_one(const T* sA, const RingRows& r, int32_t mw, int32_t mh, int32_t x,
+                          T* d0) {
+    if (MH) mh = MH;
+    const ptrdiff_t xb = x * (ptrdiff_t)sizeof(T);
+    const V a = row_fold<MW, V, Op>(sA + x, mw);
+    uint8_t* p = r.top;
+    V acc = ld<V>(p + xb);
+#pragma GCC unroll 8
+    for (int32_t k = 1; k <= mh - 2; ++k) {
+        p = wrap(p, r);
+        acc = Op::f(acc, ld<V>(p + xb));
+    }
+    st(d0 + x, Op::f(acc, a));
+}
+
+template <int MW, typename V, typename Op, typename T>
+MORPH_INLINE void row_only(const T* s, int32_t mw, int32_t x, T* d) {
+    st(d + x, row_fold<MW, V, Op>(s + x, mw));
+}
+
+template <int MW, int MH, typename T, typename Op> void separable(const Job<T>& j) {
+    const int32_t W = j.width, H = j.height;
+    const int32_t mw = j.head->maskWidth, mh = j.head->maskHeight;
+    if (mh == 1) {
+        for (int32_t y = 0; y < H; ++y) {
+            const T* s = row_at(j.src, j.srcStep, y);
+            T* d = row_at(j.dst, j.dstStep, y);
+            for_row<T>(0, W, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+                typedef typename decltype(tag)::type U;
+                row_only<MW, U, Op>(s, mw, x, d);
+            });
+        }
+        return;
+    }
+    // Window row i of output row y has its row result in slot (y + i) % mh.
+    const ptrdiff_t stride = (W * (ptrdiff_t)sizeof(T) + 31) & ~(ptrdiff_t)31;
+    RingRows r;
+    r.base = j.ring;
+    r.end = j.ring + mh * stride;
+    r.stride = stride;
+    auto slot = [&](int32_t i) { return j.ring + (i % mh) * stride; };
+    for (int32_t i = 0; i < mh - 1; ++i) {
+        const T* s = row_at(j.src, j.srcStep, i);
+        T* d = (T*)slot(i);
+        for_row<T>(0, W, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+            typedef typename decltype(tag)::type U;
+            row_only<MW, U, Op>(s, mw, x, d);
+        });
+    }
+    int32_t y = 0;
+    for (; y + 2 <= H; y += 2) {
+        const T* sA = row_at(j.src, j.srcStep, y + mh - 1);
+        const T* sB = row_at(j.src, j.srcStep, y + mh);
+        T* d0 = row_at(j.dst, j.dstStep, y);
+        T* d1 = row_at(j.dst, j.dstStep, y + 1);
+        r.top = slot(y);
+        r.next = slot(y + 1);
+        r.fresh = slot(y + mh - 1);
+        // The ring is rewritten in place: no pixel may be taken twice.
+        for_row<T>(0, W, false, [&](auto tag, int32_t x) MORPH_LAMBDA {
+            typedef typename decltype(tag)::type U;
+            sep_pair<MW, MH, U, Op>(sA, sB, r, mw, mh, x, d0, d1);
+        });
+    }
+    if (y < H) {
+        const T* sA = row_at(j.src, j.srcStep, y + mh - 1);
+        T* d0 = row_at(j.dst, j.dstStep, y);
+        r.top = slot(y);
+        for_row<T>(0, W, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+            typedef typename decltype(tag)::type U;
+            sep_one<MW, MH, U, Op>(sA, r, mw, mh, x, d0);
+        });
+    }
+}
+
+}  // namespace
+
+template <typename T, typename Op> void rect_separable(const Job<T>& j) {
+    const int32_t mw = j.head->maskWidth, mh = j.head->maskHeight;
+    if (mw == 5 && mh == 5) separable<5, 5, T, Op>(j);
+    else if (mw == 7 && mh == 7) separable<7, 7, T, Op>(j);
+    else separable<0, 0, T, Op>(j);
+}
+
+// ---- 8u fixed shapes: centred runs per mask row --------------------------------
+// Each input row's runs are made once (half-widths growing from the centre)
+// and folded into every output row of the block that uses that row.
+
+namespace {
+
+template <int MH> struct Shape;
+template <> struct Shape<3> {
+    static constexpr int hw[3] = {0, 1, 0};
+    static constexpr int maxHw = 1;
+};
+template <> struct Shape<5> {
+    static constexpr int hw[5] = {0, 1, 2, 1, 0};
+    static constexpr int maxHw = 2;
+};
+template <> struct Shape<7> {
+    static constexpr int hw[7] = {0, 2, 2, 3, 2, 2, 0};
+    static constexpr int maxHw = 3;
+};
+
+constexpr int kBlock = 4;  // output rows per pass of the mask kernels
+
+template <typename V, typename Op, int MH, int R>
+MORPH_INLINE void fixed_block(const Zor8u* const* rows, Zor8u* const* drows, int32_t x) {
+    constexpr int c = (MH - 1) / 2;
+    V acc[R];
+#pragma GCC unroll 16
+    for (int i = 0; i < R + MH - 1; ++i) {
+        const Zor8u* p = rows[i] + x + c;
+        V h[Shape<MH>::maxHw + 1];
+        h[0] = ld<V>(p);
+#pragma GCC unroll 4
+        for (int k = 1; k <= Shape<MH>::maxHw; ++k)
+            h[k] = Op::f(Op::f(h[k - 1], ld<V>(p - k)), ld<V>(p + k));
+#pragma GCC unroll 16
+        for (int o = 0; o < R; ++o) {
+            const int r = i - o;
+            if (r < 0 || r >= MH) continue;
+            const V v = h[Shape<MH>::hw[r]];
+            acc[o] = r == 0 ? v : Op::f(acc[o], v);
+        }
+    }
+#pragma GCC unroll 16
+    for (int o = 0; o < R; ++o) st(drows[o] + x, acc[o]);
+}
+
+template <typename Op, int MH, int R>
+MORPH_INLINE void fixed_rows(const Job<Zor8u>& j, int32_t y) {
+    const Zor8u* rows[R + MH - 1];
+    Zor8u* drows[R];
+    for (int i = 0; i < R + MH - 1; ++i) rows[i] = row_at(j.src, j.srcStep, y + i);
+    for (int o = 0; o < R; ++o) drows[o] = row_at(j.dst, j.dstStep, y + o);
+    for_row<Zor8u>(0, j.width, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+        typedef typename decltype(tag)::type U;
+        fixed_block<U, Op, MH, R>(rows, drows, x);
+    });
+}
+
+template <typename Op, int MH> void fixed_shape(const Job<Zor8u>& j) {
+    int32_t y = 0;
+    for (; y + kBlock <= j.height; y += kBlock) fixed_rows<Op, MH, kBlock>(j, y);
+    for (; y < j.height; ++y) fixed_rows<Op, MH, 1>(j, y);
+}
+
+}  // namespace
+
+template <typename Op> void fixed_8u(const Job<Zor8u>& j) {
+    const uint32_t f = j.head->maskFeature;
+    if ((f & kFixed7) == kFixed7) fixed_shape<Op, 7>(j);
+    else if ((f & kFixed5) == kFixed5) fixed_shape<Op, 5>(j);
+    else fixed_shape<Op, 3>(j);
+}
+
+// ---- 8u mask kernels with per-row data from the record -------------------------
+// Blocks of kBlock output rows (then single rows) keep their results in
+// registers while the mask is walked. 8u starts from the neutral value,
+// which changes nothing for integers.
+
+namespace {
+
+template <typename Op> constexpr Zor8u neutral8() { return Neutral<Zor8u, Op>::v; }
+
+// Row pointers of a block come from the source step: the window's rows
+// y .. y + R + mh - 2, walked by index (no array as long as the mask).
+struct RowSet {
+    const Zor8u* base;
+    ptrdiff_t step;
+    MORPH_INLINE const Zor8u* operator[](int32_t i) const { return base + i * step; }
+};
+
+// The cross: the full row's segment and the full column's segment.
+template <typename V, typename Op, int R>
+MORPH_INLINE void cross_block(const RowSet& rows, Zor8u* const* drows, int32_t x, int32_t mw,
+                        int32_t mh, int32_t fr, int32_t fc) {
+    V col[R];
+#pragma GCC unroll 16
+    for (int o = 0; o < R; ++o) col[o] = V{} + neutral8<Op>();
+    for (int32_t i = 0; i < R + mh - 1; ++i) {
+        const V v = ld<V>(rows[i] + x + fc);
+#pragma GCC unroll 16
+        for (int o = 0; o < R; ++o)
+            if (i >= o && i - o < mh) col[o] = Op::f(col[o], v);
+    }
+#pragma GCC unroll 16
+    for (int o = 0; o < R; ++o) {
+        const Zor8u* p = rows[o + fr] + x;
+        V acc = col[o];
+        for (int32_t c = 0; c < mw; ++c) acc = Op::f(acc, ld<V>(p + c));
+        st(drows[o] + x, acc);
+    }
+}
+
+// The same for the usual square crosses, with every loop unrolled.
+template <typename V, typename Op, int R, int S>
+MORPH_INLINE void cross_block_sq(const RowSet& rows, Zor8u* const* drows, int32_t x, int32_t fr,
+                                 int32_t fc) {
+    V col[R];
+#pragma GCC unroll 16
+    for (int i = 0; i < R + S - 1; ++i) {
+        const V v = ld<V>(rows[i] + x + fc);
+#pragma GCC unroll 16
+        for (int o = 0; o < R; ++o) {
+            if (i < o || i - o >= S) continue;
+            col[o] = i == o ? v : Op::f(col[o], v);
+        }
+    }
+#pragma GCC unroll 16
+    for (int o = 0; o < R; ++o) {
+        const Zor8u* p = rows[o + fr] + x;
+        V acc = col[o];
+#pragma GCC unroll 16
+        for (int c = 0; c < S; ++c) acc = Op::f(acc, ld<V>(p + c));
+        st(drows[o] + x, acc);
+    }
+}
+
+template <typename V, typename Op, int R>
+MORPH_INLINE void runs_block(const RowSet& rows, Zor8u* const* drows, int32_t x, int32_t mh,
+                       const uint8_t* runs) {
+    V acc[R];
+#pragma GCC unroll 16
+    for (int o = 0; o < R; ++o) acc[o] = V{} + neutral8<Op>();
+    for (int32_t r = 0; r < mh; ++r) {
+        const int32_t first = rd16s(runs, 2 * r);
+        if (first < 0) continue;
+        const int32_t last = rd16s(runs, 2 * r + 1);
+#pragma GCC unroll 16
+        for (int o = 0; o < R; ++o) {
+            const Zor8u* p = rows[o + r] + x;
+            V a = acc[o];
+            for (int32_t c = first; c <= last; ++c) a = Op::f(a, ld<V>(p + c));
+            acc[o] = a;
+        }
+    }
+#pragma GCC unroll 16
+    for (int o = 0; o < R; ++o) st(drows[o] + x, acc[o]);
+}
+
+template <typename V, typename Op, int R>
+MORPH_INLINE void list_block(const RowSet& rows, Zor8u* const* drows, int32_t x, int32_t mw,
+                       int32_t mh, const uint8_t* lists) {
+    V acc[R];
+#pragma GCC unroll 16
+    for (int o = 0; o < R; ++o) acc[o] = V{} + neutral8<Op>();
+    for (int32_t r = 0; r < mh; ++r) {
+        const uint8_t* list = lists + (ptrdiff_t)r * (mw + 1) * 2;
+        const int32_t n = rd16u(list, 0);
+        for (int32_t k = 1; k <= n; ++k) {
+            const int32_t c = rd16u(list, k);
+#pragma GCC unroll 16
+            for (int o = 0; o < R; ++o) acc[o] = Op::f(acc[o], ld<V>(rows[o + r] + x + c));
+        }
+    }
+#pragma GCC unroll 16
+    for (int o = 0; o < R; ++o) st(drows[o] + x, acc[o]);
+}
+
+enum MaskKind { kindCross, kindCross5, kindCross7, kindRuns, kindList };
+
+template <typename V, typename Op, int R, MaskKind K>
+MORPH_INLINE void mask_block(const Job<Zor8u>& j, const RowSet& rows, Zor8u* const* drows,
+                       int32_t x) {
+    const Head& h = *j.head;
+    if (K == kindCross5)
+        cross_block_sq<V, Op, R, 5>(rows, drows, x, rd16s(h.pRuns, 0), rd16s(h.pRuns, 1));
+    else if (K == kindCross7)
+        cross_block_sq<V, Op, R, 7>(rows, drows, x, rd16s(h.pRuns, 0), rd16s(h.pRuns, 1));
+    else if (K == kindCross)
+        cross_block<V, Op, R>(rows, drows, x, h.maskWidth, h.maskHeight, rd16s(h.pRuns, 0),
+                              rd16s(h.pRuns, 1));
+    else if (K == kindRuns)
+        runs_block<V, Op, R>(rows, drows, x, h.maskHeight, h.pRuns);
+    else
+        list_block<V, Op, R>(rows, drows, x, h.maskWidth, h.maskHeight, h.pRowLists);
+}
+
+template <typename Op, int R, MaskKind K>
+MORPH_INLINE void mask_rows(const Job<Zor8u>& j, int32_t y) {
+    const RowSet rows = {row_at(j.src, j.srcStep, y), j.srcStep};
+    Zor8u* drows[R];
+    for (int o = 0; o < R; ++o) drows[o] = row_at(j.dst, j.dstStep, y + o);
+    for_row<Zor8u>(0, j.width, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+        typedef typename decltype(tag)::type U;
+        mask_block<U, Op, R, K>(j, rows, drows, x);
+    });
+}
+
+template <typename Op, MaskKind K> void mask_8u(const Job<Zor8u>& j) {
+    int32_t y = 0;
+    for (; y + kBlock <= j.height; y += kBlock) mask_rows<Op, kBlock, K>(j, y);
+    for (; y < j.height; ++y) mask_rows<Op, 1, K>(j, y);
+}
+
+}  // namespace
+
+template <typename Op> void cross_8u(const Job<Zor8u>& j) {
+    const int32_t mw = j.head->maskWidth, mh = j.head->maskHeight;
+    if (mw == 5 && mh == 5) mask_8u<Op, kindCross5>(j);
+    else if (mw == 7 && mh == 7) mask_8u<Op, kindCross7>(j);
+    else mask_8u<Op, kindCross>(j);
+}
+template <typename Op> void row_runs_8u(const Job<Zor8u>& j) { mask_8u<Op, kindRuns>(j); }
+template <typename Op> void general_8u(const Job<Zor8u>& j) { mask_8u<Op, kindList>(j); }
+
+// ---- 16u, 16s, 32f: byte offsets in batches ------------------------------------
+// The set cells become byte offsets from the window's corner, at most
+// kBatch at a time. The first batch starts from the neutral value, later
+// ones from what the destination holds, so that any number of cells folds
+// in list order without a buffer. Four vectors go side by side to hide the
+// latency of the float comparisons.
+
+namespace {
+
+constexpr int kBatch = 128;
+
+template <typename V, typename Op, int U, typename T>
+MORPH_INLINE void batch_step(const T* s, T* d, const ptrdiff_t* off, int32_t n, bool first) {
+    V acc[U];
+#pragma GCC unroll 4
+    for (int u = 0; u < U; ++u)
+        acc[u] = first ? V{} + Neutral<T, Op>::v : ld<V>(d + u * (int)(sizeof(V) / sizeof(T)));
+    for (int32_t k = 0; k < n; ++k) {
+        const T* p = (const T*)((const uint8_t*)s + off[k]);
+#pragma GCC unroll 4
+        for (int u = 0; u < U; ++u)
+            acc[u] = Op::f(acc[u], ld<V>(p + u * (int)(sizeof(V) / sizeof(T))));
+    }
+#pragma GCC unroll 4
+    for (int u = 0; u < U; ++u) st(d + u * (int)(sizeof(V) / sizeof(T)), acc[u]);
+}
+
+template <typename T, typename Op>
+void run_batch(const Job<T>& j, const ptrdiff_t* off, int32_t n, bool first) {
+    typedef typename VecOf<T>::type V;
+    constexpr int N = lanes<T>();
+    for (int32_t y = 0; y < j.height; ++y) {
+        const T* s = row_at(j.src, j.srcStep, y);
+        T* d = row_at(j.dst, j.dstStep, y);
+        int32_t x = 0;
+        for (; x + 4 * N <= j.width; x += 4 * N) batch_step<V, Op, 4>(s + x, d + x, off, n, first);
+        // A later batch folds into the destination: no pixel twice.
+        for_row<T>(x, j.width, first, [&](auto tag, int32_t x) MORPH_LAMBDA {
+            typedef typename decltype(tag)::type U;
+            batch_step<U, Op, 1>(s + x, d + x, off, n, first);
+        });
+    }
+}
+
+}  // namespace
+
+template <typename T, typename Op> void offsets(const Job<T>& j) {
+    const Head& h = *j.head;
+    ptrdiff_t off[kBatch];
+    int32_t n = 0;
+    bool first = true;
+    for (int32_t r = 0; r < h.maskHeight; ++r) {
+        const uint8_t* list = h.pRowLists + (ptrdiff_t)r * (h.maskWidth + 1) * 2;
+        const int32_t count = rd16u(list, 0);
+        for (int32_t k = 1; k <= count; ++k) {
+            off[n++] = r * j.srcStep + rd16u(list, k) * (ptrdiff_t)sizeof(T);
+            if (n == kBatch) {
+                run_batch<T, Op>(j, off, n, first);
+                first = false;
+                n = 0;
+            }
+        }
+    }
+    if (n > 0) run_batch<T, Op>(j, off, n, first);
+}
+
+// ---- instances -------------------------------------------------------------------
+
+#define MORPH_RECT(T)                                        \
+    template void rect3x3<T, OpMin>(const Job<T>&);          \
+    template void rect3x3<T, OpMax>(const Job<T>&);          \
+    template void rect_separable<T, OpMin>(const Job<T>&);   \
+    template void rect_separable<T, OpMax>(const Job<T>&);
+MORPH_RECT(Zor8u)
+MORPH_RECT(Zor16u)
+MORPH_RECT(Zor16s)
+MORPH_RECT(Zor32f)
+#undef MORPH_RECT
+
+template void fixed_8u<OpMin>(const Job<Zor8u>&);
+template void fixed_8u<OpMax>(const Job<Zor8u>&);
+template void cross_8u<OpMin>(const Job<Zor8u>&);
+template void cross_8u<OpMax>(const Job<Zor8u>&);
+template void row_runs_8u<OpMin>(const Job<Zor8u>&);
+template void row_runs_8u<OpMax>(const Job<Zor8u>&);
+template void general_8u<OpMin>(const Job<Zor8u>&);
+template void general_8u<OpMax>(const Job<Zor8u>&);
+template void offsets<Zor16u, OpMin>(const Job<Zor16u>&);
+template void offsets<Zor16u, OpMax>(const Job<Zor16u>&);
+template void offsets<Zor16s, OpMin>(const Job<Zor16s>&);
+template void offsets<Zor16s, OpMax>(const Job<Zor16s>&);
+template void offsets<Zor32f, OpMin>(const Job<Zor32f>&);
+template void offsets<Zor32f, OpMax>(const Job<Zor32f>&);
+
+}  // namespace morph
+ZOR_END
