@@ -115,6 +115,56 @@ static void demo_vectors(void) {
     zorsFree(d.b);
 }
 
+typedef struct {
+    Zor32f* a;
+    Zor32f* b;
+    Zor32f* d;
+    int32_t len;
+    ZorStatus status;
+} ElementDemo;
+
+/* A chain of element-wise operations; the bit-level checksum of the result
+ * is the same on every level. */
+static void vector_elementwise(void* p) {
+    ElementDemo* e = (ElementDemo*)p;
+    e->status = zorsAdd_32f(e->a, e->b, e->d, e->len);
+    zorsMulC_32f_I(e->d, e->len, 0.75f);
+    zorsMaxEvery_32f(e->d, e->a, e->d, (uint32_t)e->len);
+    zorsFlip_32f(e->d, e->d, e->len);
+    zorsMove_32f(e->d, e->d + 3, e->len - 3);
+}
+
+static void vector_elementwise_report(void* p, const char* level) {
+    ElementDemo* e = (ElementDemo*)p;
+    uint32_t h = 2166136261u;
+    (void)level;
+    for (int32_t i = 0; i < e->len; ++i) {
+        uint32_t u;
+        memcpy(&u, &e->d[i], 4);
+        h = (h ^ u) * 16777619u;
+    }
+    printf("checksum 0x%08x  %s", h, zorGetStatusString(e->status));
+}
+
+static void demo_elementwise(void) {
+    ElementDemo e;
+    e.len = 1 << 20;
+    e.a = zorsMalloc_32f(e.len);
+    e.b = zorsMalloc_32f(e.len);
+    e.d = zorsMalloc_32f(e.len);
+    if (e.a && e.b && e.d) {
+        for (int32_t i = 0; i < e.len; ++i) {
+            e.a[i] = (Zor32f)((i % 997) * 0.01 - 3);
+            e.b[i] = (Zor32f)(1.0 / (1 + i % 13));
+        }
+        on_every_level("add, multiply by a constant, maximum, flip and move of 2^20 floats:",
+                       vector_elementwise, vector_elementwise_report, &e);
+    }
+    zorsFree(e.a);
+    zorsFree(e.b);
+    zorsFree(e.d);
+}
+
 static void print_features(const char* title, uint64_t word) {
     printf("%-18s 0x%012llx ", title, (unsigned long long)word);
     for (size_t i = 0; i < sizeof feature_names / sizeof feature_names[0]; ++i)
@@ -172,5 +222,6 @@ int main(void) {
     printf("threads            %d\n", threads);
 
     demo_vectors();
+    demo_elementwise();
     return 0;
 }

@@ -7,6 +7,7 @@
 #include "zors.h"
 #include "zori.h"
 #include "zoriborder.h"
+#include "zorimedian.h"
 #include "zorifilter64f.h"
 #include "zorifilter.h"
 #include "zorimorph.h"

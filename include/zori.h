@@ -70,8 +70,9 @@ ZorStatus zoriAddProduct_32f_C1IMR(const Zor32f* pSrc1, int32_t src1Step, const 
 
 /* ---- Scaled integer arithmetic -------------------------------------------- */
 
-/* dst = saturate(round(src1 * src2 * 2^-scaleFactor)), ties to even. No
- * step test; every scale factor accepted. */
+/* dst = saturate(round(src1 * src2 * 2^-scaleFactor)), ties to even, from
+ * the exact product. No step test; every scale factor accepted. 16u at a
+ * scale factor of exactly 32 gives the product's top bit (1 from 2^31). */
 ZorStatus zoriMul_8u_C1RSfs(const Zor8u* pSrc1, int32_t src1Step, const Zor8u* pSrc2,
                             int32_t src2Step, Zor8u* pDst, int32_t dstStep, ZoriSize roiSize,
                             int32_t scaleFactor);
@@ -81,9 +82,14 @@ ZorStatus zoriMul_16u_C1RSfs(const Zor16u* pSrc1, int32_t src1Step, const Zor16u
 ZorStatus zoriMul_16s_C1RSfs(const Zor16s* pSrc1, int32_t src1Step, const Zor16s* pSrc2,
                              int32_t src2Step, Zor16s* pDst, int32_t dstStep, ZoriSize roiSize,
                              int32_t scaleFactor);
-/* dst = saturate(round(src2 * 2^-scaleFactor / src1)) in single precision.
- * A zero divisor gives the largest value (n > 0), 0 (n == 0) or, in 16s,
- * -32768 (n < 0), and status 2. 8u and 16s: steps >= 1. */
+/* dst = saturate(round(src2 * 2^-scaleFactor / src1)): the single-precision
+ * quotient of the exactly scaled src2 by src1, rounded to nearest (ties to
+ * even), the same on every level. Real division for scale factors from -15
+ * to 8 (8u), -30 to 15 (16s), -31 to 16 (16u); below that range a non-zero
+ * src2 saturates by the signs, above it the result is 0. A zero divisor
+ * gives the largest value (n > 0), 0 (n == 0) or, in 16s, -32768 (n < 0),
+ * at any scale factor, and status 2; every row is computed all the same.
+ * 8u and 16s: steps >= 1; 16u: no step test. */
 ZorStatus zoriDiv_8u_C1RSfs(const Zor8u* pSrc1, int32_t src1Step, const Zor8u* pSrc2,
                             int32_t src2Step, Zor8u* pDst, int32_t dstStep, ZoriSize roiSize,
                             int32_t scaleFactor);
@@ -122,19 +128,29 @@ ZorStatus zoriThreshold_LTVal_32f_C1R(const Zor32f* pSrc, int32_t srcStep, Zor32
                                       int32_t dstStep, ZoriSize roiSize, Zor32f threshold,
                                       Zor32f value);
 /* Least and greatest pixel, starting from +-FLT_MAX (so an all +inf image
- * reports FLT_MAX as minimum). No step test. */
+ * reports FLT_MAX as minimum). No step test. NaN pixels are not skipped:
+ * pixel x of each row goes to running lane x mod 16, which keeps
+ * min(lane, pixel) by the processor's rule (a NaN pixel replaces the lane
+ * until that lane's next pixel); a row's last partial group of 16 brings
+ * +-FLT_MAX into the lanes it does not reach; lanes 0..15 are folded in
+ * order at the end. */
 ZorStatus zoriMinMax_32f_C1R(const Zor32f* pSrc, int32_t srcStep, ZoriSize roiSize, Zor32f* pMin,
                              Zor32f* pMax);
 /* dst = ~src. Checks: pointers, steps >= 1 (-16), then ROI (-6). */
 ZorStatus zoriNot_8u_C1R(const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst, int32_t dstStep,
                          ZoriSize roiSize);
-/* No step test. */
+/* Stores the value's bits (NaN payloads, -0) in every pixel. No step test:
+ * a zero step fills the one row again. */
 ZorStatus zoriSet_32f_C1R(Zor32f value, Zor32f* pDst, int32_t dstStep, ZoriSize roiSize);
+/* Bit copies. No step tests (negative steps work). */
 ZorStatus zoriCopy_16u_C1R(const Zor16u* pSrc, int32_t srcStep, Zor16u* pDst, int32_t dstStep,
                            ZoriSize roiSize);
 ZorStatus zoriCopy_32f_C1R(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst, int32_t dstStep,
                            ZoriSize roiSize);
-/* Copies the pixels whose mask byte is non-zero; others are not written. */
+/* Copies the pixels whose mask byte is non-zero; others are not written,
+ * and a group of 16 pixels (counted from where the destination row is
+ * 16-byte aligned) whose mask bytes are all 0 is not read either. No step
+ * tests. */
 ZorStatus zoriCopy_32f_C1MR(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst, int32_t dstStep,
                             ZoriSize roiSize, const Zor8u* pMask, int32_t maskStep);
 

@@ -5,6 +5,7 @@
 #ifndef ZOR_SIMD_H
 #define ZOR_SIMD_H
 
+#include <immintrin.h>
 #include <stdint.h>
 #include <string.h>
 
@@ -40,9 +41,27 @@ template <typename V> inline void store(void* p, V v) {
     memcpy(p, &v, sizeof v);
 }
 
+// Lane by lane rather than V{} + x: an addition to zero would turn -0 into
+// +0 and quiet a signalling NaN.
 template <typename V> inline V broadcast(typename Lanes<V>::Element x) {
-    return V{} + x;
+    V v = V{};
+    for (int i = 0; i < Lanes<V>::count; ++i) v[i] = x;
+    return v;
 }
+
+// Store past the caches (p vector aligned); a store_fence() orders such
+// stores before any later ones.
+template <typename V> inline void stream(void* p, V v) {
+#if ZOR_VECTOR_BYTES == 16
+    _mm_stream_si128((__m128i*)p, (__m128i)v);
+#elif ZOR_VECTOR_BYTES == 32
+    _mm256_stream_si256((__m256i*)p, (__m256i)v);
+#else
+    _mm512_stream_si512((__m512i*)p, (__m512i)v);
+#endif
+}
+
+inline void store_fence() { _mm_sfence(); }
 
 }  // namespace simd
 }  // namespace ZOR_NS

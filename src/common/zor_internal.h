@@ -5,6 +5,8 @@
 #ifndef ZOR_INTERNAL_H
 #define ZOR_INTERNAL_H
 
+#include <stddef.h>
+
 #include "zortypes.h"
 
 #ifdef __cplusplus
@@ -62,6 +64,28 @@ double zorsCeilOne(double x);
 double zorsSqrtOne(double x);
 double zorsSinOne(double x);
 double zorsCosOne(double x);
+
+/* Memory kernels behind the copies and clears, one per way of moving the
+ * bytes; each works for any length and alignment (copies: no overlap). The
+ * operations choose among them by length and cache size, so these names
+ * let tests reach every way directly. */
+void ownsCopy_8u_E9(const Zor8u* pSrc, Zor8u* pDst, size_t len);    /* vector loop */
+void ownsCopy_8u_repE9(const Zor8u* pSrc, Zor8u* pDst, size_t len); /* string move */
+void ownsCopy_8u_nt(const Zor8u* pSrc, Zor8u* pDst, size_t len);    /* non-temporal blocks */
+void ownsCopy_8u_inv(const Zor8u* pSrc, Zor8u* pDst, size_t len);   /* blocks from the end */
+void ownsCopy_8u_ra(const Zor8u* pSrc, Zor8u* pDst, size_t len);    /* read-ahead chunks */
+/* The level's whole copy choice for a given largest cache size in bytes
+ * (negative: unknown). */
+void ownsCopy_8u_cache(const Zor8u* pSrc, Zor8u* pDst, size_t len, int64_t cacheBytes);
+void ownsZero_8u_E9(Zor8u* pDst, size_t len);
+void ownsZero_8u_repE9(Zor8u* pDst, size_t len);
+void ownsZero_8u_nt(Zor8u* pDst, size_t len);
+void ownsZero_8u_cache(Zor8u* pDst, size_t len, int64_t cacheBytes);
+/* Copy that allows any overlap. */
+void ownsMove_8u(const Zor8u* pSrc, Zor8u* pDst, size_t len);
+/* Largest cache named by a CPUID leaf 2 answer, from the copy's own
+ * descriptor table; -1 when none. */
+int32_t ownsCopyCacheSize(const uint32_t regs[4]);
 
 #ifdef __cplusplus
 }

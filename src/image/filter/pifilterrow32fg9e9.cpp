@@ -473,7 +473,16 @@ void rows_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, 
     int32_t x = 0;
     for (; x + N * VL <= w; x += N * VL)
         block_32f<R, N>(src, srcStep, dst, dstStep, c, kw, kh, x);
-    for (; x + VL <= w; x += VL) block_32f<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, x);
+    // The whole vectors left over in one block, so that each source vector
+    // loaded still serves all R rows.
+    switch ((w - x) / VL) {
+    case 3: block_32f<R, 3>(src, srcStep, dst, dstStep, c, kw, kh, x); break;
+    case 2: block_32f<R, 2>(src, srcStep, dst, dstStep, c, kw, kh, x); break;
+    case 1: block_32f<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, x); break;
+    default:
+        for (; x + VL <= w; x += VL) block_32f<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, x);
+    }
+    x += (w - x) / VL * VL;
     if (x == w) return;
     if (kMasked) {
         for (int q = 0; q < R; ++q)

@@ -48,7 +48,7 @@ template <typename T, typename Op> void rect3x3(const Job<T>& j) {
         const T* r3 = row_at(j.src, j.srcStep, y + 3);
         T* d0 = row_at(j.dst, j.dstStep, y);
         T* d1 = row_at(j.dst, j.dstStep, y + 1);
-        for_row<T>(0, W, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+        for_row<T>(0, W, true, d0, [&](auto tag, int32_t x) MORPH_LAMBDA {
             typedef typename decltype(tag)::type U;
             rect3_pair<U, Op>(r0 + x, r1 + x, r2 + x, r3 + x, d0 + x, d1 + x);
         });
@@ -58,7 +58,7 @@ template <typename T, typename Op> void rect3x3(const Job<T>& j) {
         const T* r1 = row_at(j.src, j.srcStep, y + 1);
         const T* r2 = row_at(j.src, j.srcStep, y + 2);
         T* d0 = row_at(j.dst, j.dstStep, y);
-        for_row<T>(0, W, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+        for_row<T>(0, W, true, d0, [&](auto tag, int32_t x) MORPH_LAMBDA {
             typedef typename decltype(tag)::type U;
             rect3_one<U, Op>(r0 + x, r1 + x, r2 + x, d0 + x);
         });
@@ -150,7 +150,7 @@ template <int MW, int MH, typename T, typename Op> void separable(const Job<T>& 
         for (int32_t y = 0; y < H; ++y) {
             const T* s = row_at(j.src, j.srcStep, y);
             T* d = row_at(j.dst, j.dstStep, y);
-            for_row<T>(0, W, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+            for_row<T>(0, W, true, d, [&](auto tag, int32_t x) MORPH_LAMBDA {
                 typedef typename decltype(tag)::type U;
                 row_only<MW, U, Op>(s, mw, x, d);
             });
@@ -167,7 +167,7 @@ template <int MW, int MH, typename T, typename Op> void separable(const Job<T>& 
     for (int32_t i = 0; i < mh - 1; ++i) {
         const T* s = row_at(j.src, j.srcStep, i);
         T* d = (T*)slot(i);
-        for_row<T>(0, W, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+        for_row<T>(0, W, true, d, [&](auto tag, int32_t x) MORPH_LAMBDA {
             typedef typename decltype(tag)::type U;
             row_only<MW, U, Op>(s, mw, x, d);
         });
@@ -182,7 +182,7 @@ template <int MW, int MH, typename T, typename Op> void separable(const Job<T>& 
         r.next = slot(y + 1);
         r.fresh = slot(y + mh - 1);
         // The ring is rewritten in place: no pixel may be taken twice.
-        for_row<T>(0, W, false, [&](auto tag, int32_t x) MORPH_LAMBDA {
+        for_row<T>(0, W, false, d0, [&](auto tag, int32_t x) MORPH_LAMBDA {
             typedef typename decltype(tag)::type U;
             sep_pair<MW, MH, U, Op>(sA, sB, r, mw, mh, x, d0, d1);
         });
@@ -191,7 +191,7 @@ template <int MW, int MH, typename T, typename Op> void separable(const Job<T>& 
         const T* sA = row_at(j.src, j.srcStep, y + mh - 1);
         T* d0 = row_at(j.dst, j.dstStep, y);
         r.top = slot(y);
-        for_row<T>(0, W, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+        for_row<T>(0, W, true, d0, [&](auto tag, int32_t x) MORPH_LAMBDA {
             typedef typename decltype(tag)::type U;
             sep_one<MW, MH, U, Op>(sA, r, mw, mh, x, d0);
         });
@@ -259,7 +259,7 @@ MORPH_INLINE void fixed_rows(const Job<Zor8u>& j, int32_t y) {
     Zor8u* drows[R];
     for (int i = 0; i < R + MH - 1; ++i) rows[i] = row_at(j.src, j.srcStep, y + i);
     for (int o = 0; o < R; ++o) drows[o] = row_at(j.dst, j.dstStep, y + o);
-    for_row<Zor8u>(0, j.width, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+    for_row<Zor8u>(0, j.width, true, drows[0], [&](auto tag, int32_t x) MORPH_LAMBDA {
         typedef typename decltype(tag)::type U;
         fixed_block<U, Op, MH, R>(rows, drows, x);
     });
@@ -408,7 +408,7 @@ MORPH_INLINE void mask_rows(const Job<Zor8u>& j, int32_t y) {
     const RowSet rows = {row_at(j.src, j.srcStep, y), j.srcStep};
     Zor8u* drows[R];
     for (int o = 0; o < R; ++o) drows[o] = row_at(j.dst, j.dstStep, y + o);
-    for_row<Zor8u>(0, j.width, true, [&](auto tag, int32_t x) MORPH_LAMBDA {
+    for_row<Zor8u>(0, j.width, true, drows[0], [&](auto tag, int32_t x) MORPH_LAMBDA {
         typedef typename decltype(tag)::type U;
         mask_block<U, Op, R, K>(j, rows, drows, x);
     });
@@ -465,13 +465,23 @@ void run_batch(const Job<T>& j, const ptrdiff_t* off, int32_t n, bool first) {
     for (int32_t y = 0; y < j.height; ++y) {
         const T* s = row_at(j.src, j.srcStep, y);
         T* d = row_at(j.dst, j.dstStep, y);
-        int32_t x = 0;
-        for (; x + 4 * N <= j.width; x += 4 * N) batch_step<V, Op, 4>(s + x, d + x, off, n, first);
         // A later batch folds into the destination: no pixel twice.
-        for_row<T>(x, j.width, first, [&](auto tag, int32_t x) MORPH_LAMBDA {
+        auto one = [&](auto tag, int32_t x) MORPH_LAMBDA {
             typedef typename decltype(tag)::type U;
             batch_step<U, Op, 1>(s + x, d + x, off, n, first);
-        });
+        };
+        int32_t x = 0;
+        if (j.width >= 8 * N && ((uintptr_t)d % sizeof(T)) == 0) {
+            // Stores on vector boundaries from here on (see for_row).
+            const int32_t a = (int32_t)(((0 - (uintptr_t)d) & (sizeof(V) - 1)) / sizeof(T));
+            if (a) {
+                if (first) one(Tag<V>(), 0);
+                else for_part<T>(0, a, one);
+                x = a;
+            }
+        }
+        for (; x + 4 * N <= j.width; x += 4 * N) batch_step<V, Op, 4>(s + x, d + x, off, n, first);
+        for_row<T>(x, j.width, first, d, one);
     }
 }
 

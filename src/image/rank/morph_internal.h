@@ -101,44 +101,60 @@ template <typename V> struct Tag {
     typedef V type;
 };
 
-// Runs f(Tag<V>, x) over x = from .. W - 1 in vectors of the level's width,
-// then finishes the row. Where f has no state (overlap true) one more full
-// vector ending at W recomputes a few pixels and gives them the same
-// values; otherwise halves of the vector, down to 8 bytes, then single
-// elements. Every pixel sees the same operations in the same order
-// whichever width takes it.
+// Runs f(Tag<V>, x) over the elements from .. end - 1 that are fewer than
+// one vector: halves of the vector down to 8 bytes, then single elements.
 template <typename T, typename F>
-MORPH_INLINE void for_row(int32_t from, int32_t W, bool overlap, F f) {
+MORPH_INLINE void for_part(int32_t x, int32_t end, F& f) {
+    constexpr int B = (int)sizeof(typename VecOf<T>::type), E = (int)sizeof(T);
+    if constexpr (B > 32) {
+        if (x + 32 / E <= end) {
+            f(Tag<typename VecN<T, 32>::type>(), x);
+            x += 32 / E;
+        }
+    }
+    if constexpr (B > 16) {
+        if (x + 16 / E <= end) {
+            f(Tag<typename VecN<T, 16>::type>(), x);
+            x += 16 / E;
+        }
+    }
+    if constexpr (E < 4) {
+        if (x + 8 / E <= end) {
+            f(Tag<typename VecN<T, 8>::type>(), x);
+            x += 8 / E;
+        }
+    }
+    for (; x < end; ++x) f(Tag<T>(), x);
+}
+
+// Runs f(Tag<V>, x) over x = from .. W - 1 in vectors of the level's width.
+// The full vectors are placed so that their stores into `aligned` (the
+// row f writes, at x = 0) fall on vector boundaries: whole cache lines
+// written at once need not be read first. The ends go through for_part,
+// or, where f has no state (overlap true), through one more full vector
+// that recomputes a few pixels and gives them the same values. Every pixel
+// sees the same operations in the same order whichever width takes it.
+template <typename T, typename F>
+MORPH_INLINE void for_row(int32_t from, int32_t W, bool overlap, const T* aligned, F f) {
     typedef typename VecOf<T>::type V;
     constexpr int B = (int)sizeof(V), E = (int)sizeof(T), N = B / E;
     int32_t x = from;
+    if (W - x >= 2 * N && ((uintptr_t)aligned % E) == 0) {
+        const int32_t a = (int32_t)(((0 - (uintptr_t)(aligned + x)) & (B - 1)) / E);
+        if (a) {
+            if (overlap) f(Tag<V>(), x);
+            else for_part<T>(x, x + a, f);
+            x += a;
+        }
+    }
     for (; x + N <= W; x += N) f(Tag<V>(), x);
     if (x == W) return;
     if (overlap && W - from >= N) {
         f(Tag<V>(), W - N);
         return;
     }
-    if constexpr (B > 32) {
-        if (x + 32 / E <= W) {
-            f(Tag<typename VecN<T, 32>::type>(), x);
-            x += 32 / E;
-        }
-    }
-    if constexpr (B > 16) {
-        if (x + 16 / E <= W) {
-            f(Tag<typename VecN<T, 16>::type>(), x);
-            x += 16 / E;
-        }
-    }
-    if constexpr (E < 4) {
-        if (x + 8 / E <= W) {
-            f(Tag<typename VecN<T, 8>::type>(), x);
-            x += 8 / E;
-        }
-    }
-    for (; x < W; ++x) f(Tag<T>(), x);
+    for_part<T>(x, W, f);
 }
-
 
 // The operations, for scalars and vectors alike, the running result first:
 // for floats exactly what minps/maxps do with it as first operand, so a

@@ -86,14 +86,6 @@ void scatter_last(const u32_any* src, u32_any* dst, int32_t len, u32_any* pos) {
     }
 }
 
-// TEMPORARY until the level's zero and copy bodies exist.
-void zero_words(u32_any* p, int n) {
-    for (int i = 0; i < n; ++i) p[i] = 0;
-}
-void copy_words(const u32_any* s, u32_any* d, int32_t n) {
-    for (int32_t i = 0; i < n; ++i) d[i] = s[i];
-}
-
 }  // namespace
 ZOR_END
 
@@ -128,7 +120,7 @@ ZOR_INTERNAL ZorStatus ZOR_NAME(zorsSortRadixAscend_32f_I)(Zor32f* pSrcDst, int3
     u32_any* copy = c2 + kCounters2;
     u32_any* data = (u32_any*)pSrcDst;
 
-    zero_words(c0, kCounters);
+    ZOR_NAME(zorsZero_32s)((Zor32s*)pBuffer, kCounters);
     keys_and_counts(data, len, c0, c1, c2);
     running_positions(c0, kCounters0);
     running_positions(c1, kCounters1);
@@ -136,6 +128,6 @@ ZOR_INTERNAL ZorStatus ZOR_NAME(zorsSortRadixAscend_32f_I)(Zor32f* pSrcDst, int3
     scatter<0, 0x7FF>(data, copy, len, c0);
     scatter<11, 0x7FF>(copy, data, len, c1);
     scatter_last(data, copy, len, c2);
-    copy_words(copy, data, len);
+    ZOR_NAME(zorsCopy_32f)((const Zor32f*)copy, pSrcDst, len);
     return zorStsNoErr;
 }

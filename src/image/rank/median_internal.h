@@ -1,0 +1,117 @@
+// Median filter, shared by the driver and the kernel sources of one level:
+// the job a kernel gets, the kernel table and the vector helpers of the
+// min/max networks. Include after variant.h.
+#ifndef ZOR_MEDIAN_INTERNAL_H
+#define ZOR_MEDIAN_INTERNAL_H
+
+#include <stddef.h>
+#include <stdint.h>
+#include <string.h>
+
+#include "simd.h"
+
+ZOR_BEGIN
+namespace median {
+
+// A kernel reads every neighbour from memory without testing coordinates:
+// src is the source pixel under output (0, 0), and rows -kh/2 .. height-1+kh/2
+// and columns -kw/2 .. width-1+kw/2 around it must be readable. dst never
+// overlaps the source. scratch is the mask class's share of the caller's
+// buffer (4-byte aligned where the caller's buffer is).
+template <typename T>
+struct Job {
+    const T* src;
+    ptrdiff_t srcStep;  // bytes
+    T* dst;
+    ptrdiff_t dstStep;  // bytes
+    int32_t width, height;
+    int32_t kw, kh;
+    uint8_t* scratch;
+};
+
+template <typename T>
+using Kernel = void (*)(const Job<T>&);
+
+template <typename T>
+inline const T* row_at(const T* p, ptrdiff_t step, ptrdiff_t y) {
+    return (const T*)((const uint8_t*)p + y * step);
+}
+template <typename T>
+inline T* row_at(T* p, ptrdiff_t step, ptrdiff_t y) {
+    return (T*)((uint8_t*)p + y * step);
+}
+
+// Fixed masks (pimedianfixed.cpp): 1x3, 1x5, 3x1, 5x1, 3x3, 5x5 for every
+// type; the 16s 7-tap lines.
+template <typename T> void fixed_1x3(const Job<T>& j);
+template <typename T> void fixed_1x5(const Job<T>& j);
+template <typename T> void fixed_3x1(const Job<T>& j);
+template <typename T> void fixed_5x1(const Job<T>& j);
+template <typename T> void fixed_3x3(const Job<T>& j);
+template <typename T> void fixed_5x5(const Job<T>& j);
+void fixed_1x7_16s(const Job<Zor16s>& j);
+void fixed_7x1_16s(const Job<Zor16s>& j);
+
+// Any other mask (pimedianhist.cpp, pimedian32f.cpp).
+void general_8u(const Job<Zor8u>& j);
+void general_16u(const Job<Zor16u>& j);
+void general_16s(const Job<Zor16s>& j);
+void general_32f(const Job<Zor32f>& j);
+
+// ---- vectors of the networks ----------------------------------------------
+// n0 has no byte or word operations in 512-bit form: its integer networks
+// run at AVX2 width.
+#if defined(ZOR_LEVEL_n0)
+constexpr int kIntVectorBytes = 32;
+#else
+constexpr int kIntVectorBytes = ZOR_VECTOR_BYTES;
+#endif
+
+template <typename T> struct VecOf;
+template <> struct VecOf<Zor8u> {
+    typedef Zor8u type __attribute__((vector_size(kIntVectorBytes)));
+};
+template <> struct VecOf<Zor16u> {
+    typedef Zor16u type __attribute__((vector_size(kIntVectorBytes)));
+};
+template <> struct VecOf<Zor16s> {
+    typedef Zor16s type __attribute__((vector_size(kIntVectorBytes)));
+};
+template <> struct VecOf<Zor32f> {
+    typedef Zor32f type __attribute__((vector_size(ZOR_VECTOR_BYTES)));
+};
+
+template <typename T>
+constexpr int lanes() {
+    return (int)(sizeof(typename VecOf<T>::type) / sizeof(T));
+}
+
+// One definition of min and max for scalars and vectors alike, so that a
+// row's tail gives exactly what the vector body gives (NaN included: the
+// second operand wins an unordered comparison, as minps/maxps do).
+template <typename V> inline V vmin(V a, V b) { return a < b ? a : b; }
+template <typename V> inline V vmax(V a, V b) { return a > b ? a : b; }
+template <typename V> inline void cex(V& a, V& b) {
+    const V lo = vmin(a, b);
+    b = vmax(a, b);
+    a = lo;
+}
+template <typename V> inline V med3(V a, V b, V c) {
+    return vmax(vmin(a, b), vmin(vmax(a, b), c));
+}
+
+// Counters of the histogram kernels start at zero.
+inline void zero_counters(int32_t* p, int32_t n) { memset(p, 0, (size_t)n * sizeof *p); }
+
+// Loads of one vector or one element from a byte address.
+template <typename V> inline V ld(const void* p) {
+    V v;
+    memcpy(&v, p, sizeof v);
+    return v;
+}
+template <typename V> inline void st(void* p, V v) { memcpy(p, &v, sizeof v); }
+
+}  // namespace median
+ZOR_END
+
+#endif

@@ -1,0 +1,445 @@
+// Median filter with border: the buffer size query, the argument checks and
+// the driver. The driver cuts the ROI into thin bands at the sides that need
+// a frame and a centre read straight from the caller's image, so that no
+// kernel ever tests a coordinate; band results wait in the buffer and reach
+// the destination last, which is what lets the source and destination be
+// one image.
+#include "variant.h"
+
+#include "border_type.h"
+#include "median_internal.h"
+
+ZOR_BEGIN
+namespace {
+
+using namespace median;
+
+inline int64_t align32(int64_t x) { return (x + 31) & ~(int64_t)31; }
+
+int32_t elem_size(int32_t dataType) {
+    switch (dataType) {
+        case zor8u: return 1;
+        case zor16u:
+        case zor16s: return 2;
+        default: return 4;
+    }
+}
+
+// Scratch of the kernels of one mask class.
+int64_t scratch_bytes(int64_t kw, int64_t kh, int32_t dataType) {
+    if (kw < 6 && kh < 6 && (kw == 1 || kh == 1 || kw == kh)) return 0;
+    const int64_t n = kw * kh;
+    const int64_t e = elem_size(dataType);
+    int64_t s;
+    if (dataType == zor32f) {
+        if (kw == 1 || kh == 1) {
+            s = n * 4;
+        } else if (n < 625) {
+            const int64_t side = kw > kh ? kw : kh;
+            s = ((side + 15) & ~15) * 4 + ((n + 15) & ~15) * 12;
+            if (n >= 51) s += 4 * n + 20480;  // the radix sort's own buffer
+        } else {
+            s = ((n + 15) >> 4) * 128 + 28672;
+        }
+    } else {
+        s = n * 4 * e;
+    }
+    return align32(s);
+}
+
+// Ring of the in-place centre: two blocks of kh rows.
+int64_t ring_bytes(int64_t W, int64_t kh, int64_t e) { return kh * 2 * align32(W * e); }
+
+int64_t frame_bytes(int64_t W, int64_t H, int64_t kw, int64_t kh, int64_t e) {
+    if (kw < W && kh < H) {
+        const int64_t top = (W + kw - 1) * (kh + (kh >> 1)) * e;
+        const int64_t side = (kw + (kw >> 1)) * (H + kh - 1) * e;
+        return 2 * (align32(W * (kh >> 1) * e) + align32(H * (kw >> 1) * e)) +
+               align32(top > side ? top : side);
+    }
+    return align32((W + kw - 1) * (H + kh - 1) * e);
+}
+
+int64_t one_channel_bytes(int64_t W, int64_t H, int64_t kw, int64_t kh, int32_t dataType) {
+    const int64_t e = elem_size(dataType);
+    int64_t total = scratch_bytes(kw, kh, dataType) + frame_bytes(W, H, kw, kh, e);
+    if (kw < W && kh < H) total += ring_bytes(W, kh, e);
+    return total;
+}
+
+int64_t multi_channel_bytes(int64_t W, int64_t H, int64_t kw, int64_t kh, int32_t dataType,
+                            int64_t c) {
+    int64_t a;
+    if (kw < W && kh < H) {
+        const int64_t top = (W + kw - 1) * (kh + (kh >> 1) - 1);
+        const int64_t side = (kw + (kw >> 1) - 1) * (H + kh - 1);
+        a = top > side ? top : side;
+    } else {
+        a = (W + kw - 1) * (H + kh - 1);
+    }
+    if (dataType == zor8u) return align32(c * a);
+    int64_t s = align32(2 * c * a);
+    if (!(kw < 6 && kh < 6 && kw + kh != 8)) s += kw * kh * 8;
+    return s;
+}
+
+// ---- the driver -------------------------------------------------------------
+
+// Per element type: the kernel table and the copies that frame a band.
+template <typename T> struct Ops;
+
+template <> struct Ops<Zor8u> {
+    static Kernel<Zor8u> general() { return general_8u; }
+    static ZorStatus copy(const Zor8u* s, int32_t ss, Zor8u* d, int32_t ds, ZoriSize r) {
+        return ZOR_NAME(zoriCopy_8u_C1R)(s, ss, d, ds, r);
+    }
+    static ZorStatus repl(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds,
+                          ZoriSize dr, int32_t t, int32_t l) {
+        return ZOR_NAME(zoriCopyReplicateBorder_8u_C1R)(s, ss, sr, d, ds, dr, t, l);
+    }
+    static ZorStatus cnst(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds,
+                          ZoriSize dr, int32_t t, int32_t l, Zor8u v) {
+        return ZOR_NAME(zoriCopyConstBorder_8u_C1R)(s, ss, sr, d, ds, dr, t, l, v);
+    }
+};
+
+template <> struct Ops<Zor16u> {
+    static Kernel<Zor16u> general() { return general_16u; }
+    static ZorStatus copy(const Zor16u* s, int32_t ss, Zor16u* d, int32_t ds, ZoriSize r) {
+        return ZOR_NAME(zoriCopy_16u_C1R)(s, ss, d, ds, r);
+    }
+    static ZorStatus repl(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds,
+                          ZoriSize dr, int32_t t, int32_t l) {
+        return ZOR_NAME(zoriCopyReplicateBorder_16u_C1R)(s, ss, sr, d, ds, dr, t, l);
+    }
+    static ZorStatus cnst(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds,
+                          ZoriSize dr, int32_t t, int32_t l, Zor16u v) {
+        return ZOR_NAME(zoriCopyConstBorder_16u_C1R)(s, ss, sr, d, ds, dr, t, l, v);
+    }
+};
+
+template <> struct Ops<Zor16s> {
+    static Kernel<Zor16s> general() { return general_16s; }
+    static ZorStatus copy(const Zor16s* s, int32_t ss, Zor16s* d, int32_t ds, ZoriSize r) {
+        return ZOR_NAME(zoriCopy_16s_C1R)(s, ss, d, ds, r);
+    }
+    static ZorStatus repl(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds,
+                          ZoriSize dr, int32_t t, int32_t l) {
+        return ZOR_NAME(zoriCopyReplicateBorder_16s_C1R)(s, ss, sr, d, ds, dr, t, l);
+    }
+    static ZorStatus cnst(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds,
+                          ZoriSize dr, int32_t t, int32_t l, Zor16s v) {
+        return ZOR_NAME(zoriCopyConstBorder_16s_C1R)(s, ss, sr, d, ds, dr, t, l, v);
+    }
+};
+
+template <> struct Ops<Zor32f> {
+    static Kernel<Zor32f> general() { return general_32f; }
+    static ZorStatus copy(const Zor32f* s, int32_t ss, Zor32f* d, int32_t ds, ZoriSize r) {
+        return ZOR_NAME(zoriCopy_32f_C1R)(s, ss, d, ds, r);
+    }
+    static ZorStatus repl(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds,
+                          ZoriSize dr, int32_t t, int32_t l) {
+        return ZOR_NAME(zoriCopyReplicateBorder_32f_C1R)(s, ss, sr, d, ds, dr, t, l);
+    }
+    static ZorStatus cnst(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds,
+                          ZoriSize dr, int32_t t, int32_t l, Zor32f v) {
+        return ZOR_NAME(zoriCopyConstBorder_32f_C1R)(s, ss, sr, d, ds, dr, t, l, v);
+    }
+};
+
+// The seven mask classes; the 16s general class tries its 7-tap lines first.
+template <typename T>
+Kernel<T> class_kernel(int32_t kw, int32_t kh) {
+    if (kw == 1 && kh == 3) return fixed_1x3<T>;
+    if (kw == 1 && kh == 5) return fixed_1x5<T>;
+    if (kw == 3 && kh == 1) return fixed_3x1<T>;
+    if (kw == 5 && kh == 1) return fixed_5x1<T>;
+    if (kw == 3 && kh == 3) return fixed_3x3<T>;
+    if (kw == 5 && kh == 5) return fixed_5x5<T>;
+    return Ops<T>::general();
+}
+
+template <>
+Kernel<Zor16s> class_kernel<Zor16s>(int32_t kw, int32_t kh) {
+    if (kw == 1 && kh == 3) return fixed_1x3<Zor16s>;
+    if (kw == 1 && kh == 5) return fixed_1x5<Zor16s>;
+    if (kw == 3 && kh == 1) return fixed_3x1<Zor16s>;
+    if (kw == 5 && kh == 1) return fixed_5x1<Zor16s>;
+    if (kw == 3 && kh == 3) return fixed_3x3<Zor16s>;
+    if (kw == 5 && kh == 5) return fixed_5x5<Zor16s>;
+    if (kw == 1 && kh == 7) return fixed_1x7_16s;
+    if (kw == 7 && kh == 1) return fixed_7x1_16s;
+    return general_16s;
+}
+
+template <typename T>
+void copy_rows(const T* src, ptrdiff_t srcStep, T* dst, ptrdiff_t dstStep, int32_t width,
+               int32_t height) {
+    for (int32_t y = 0; y < height; ++y)
+        memcpy(row_at(dst, dstStep, y), row_at(src, srcStep, y), (size_t)width * sizeof(T));
+}
+
+// The kernel over a region whose neighbours are all in memory. In place,
+// results go through a ring of two blocks of kh/2 rows: block k is written
+// back only after block k+1, the last one to read its rows, has run.
+template <typename T>
+void run_in_memory(Kernel<T> kernel, Job<T> job, uint8_t* ring) {
+    if ((const void*)job.src != (const void*)job.dst) {
+        kernel(job);
+        return;
+    }
+    T* const image = job.dst;
+    const ptrdiff_t imageStep = job.dstStep;
+    const int32_t rows = job.kh >> 1 > 0 ? job.kh >> 1 : 1;
+    const ptrdiff_t ringStep = (ptrdiff_t)job.width * (ptrdiff_t)sizeof(T);
+    T* const block[2] = {(T*)ring, (T*)(ring + ringStep * rows)};
+    const int32_t height = job.height;
+    int32_t pending = -1, pendingRows = 0;
+    for (int32_t y = 0, k = 0; y < height; y += rows, ++k) {
+        Job<T> part = job;
+        part.src = row_at(job.src, job.srcStep, y);
+        part.height = height - y < rows ? height - y : rows;
+        part.dst = block[k & 1];
+        part.dstStep = ringStep;
+        kernel(part);
+        if (pending >= 0)
+            copy_rows(block[(k - 1) & 1], ringStep, row_at(image, imageStep, pending), imageStep,
+                      job.width, pendingRows);
+        pending = y;
+        pendingRows = part.height;
+    }
+    copy_rows(block[((height + rows - 1) / rows - 1) & 1], ringStep,
+              row_at(image, imageStep, pending), imageStep, job.width, pendingRows);
+}
+
+template <typename T>
+struct Border {
+    int32_t kind;
+    T value;
+};
+
+// Frames `srcSize` source pixels at `src` into `frame` (rows of
+// frameSize.width pixels) with `top` rows and `left` columns before them.
+template <typename T>
+ZorStatus make_frame(const Border<T>& b, const T* src, int32_t srcStep, ZoriSize srcSize, T* frame,
+                     ZoriSize frameSize, int32_t top, int32_t left) {
+    const int32_t frameStep = frameSize.width * (int32_t)sizeof(T);
+    if (b.kind == zorBorderConst)
+        return Ops<T>::cnst(src, srcStep, srcSize, frame, frameStep, frameSize, top, left, b.value);
+    return Ops<T>::repl(src, srcStep, srcSize, frame, frameStep, frameSize, top, left);
+}
+
+template <typename T>
+ZorStatus median_filter(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriSize roi,
+                        ZoriSize mask, int32_t borderType, T borderValue, Zor8u* pBuffer,
+                        int32_t dataType) {
+    if (pSrc == nullptr || pDst == nullptr || pBuffer == nullptr) return zorStsNullPtrErr;
+    if (roi.width < 1 || roi.height < 1) return zorStsSizeErr;
+    if (sizeof(T) > 1 && ((srcStep | dstStep) & (int32_t)(sizeof(T) - 1)))
+        return zorStsNotEvenStepErr;
+    if (mask.width < 1 || mask.height < 1 || !(mask.width & 1) || !(mask.height & 1))
+        return zorStsMaskSizeErr;
+    if (zorBorderTypeCheck(borderType, zorBorderAcceptRepl | zorBorderAcceptConst,
+                           zorBorderLimit) != zorStsNoErr)
+        return zorStsBorderErr;
+
+    const int32_t kw = mask.width, kh = mask.height, W = roi.width, H = roi.height;
+    if (kw == 1 && kh == 1) {
+        if ((const void*)pSrc == (const void*)pDst) return zorStsNoErr;
+        return Ops<T>::copy(pSrc, srcStep, pDst, dstStep, roi);
+    }
+
+    int32_t flags = borderType == zorBorderInMem ? (int32_t)zorBorderInMem : borderType & 0xF0;
+    // A median is the same upside down: a negative source step is turned
+    // into a positive one, so that the frame copies can read the rows.
+    if (srcStep < 0) {
+        pSrc = row_at(pSrc, srcStep, H - 1);
+        pDst = row_at(pDst, dstStep, H - 1);
+        srcStep = -srcStep;
+        dstStep = -dstStep;
+        flags = (flags & ~(zorBorderInMemTop | zorBorderInMemBottom)) |
+                (flags & zorBorderInMemTop ? zorBorderInMemBottom : 0) |
+                (flags & zorBorderInMemBottom ? zorBorderInMemTop : 0);
+    }
+    if (kw == 1) flags |= zorBorderInMemLeft | zorBorderInMemRight;
+    if (kh == 1) flags |= zorBorderInMemTop | zorBorderInMemBottom;
+    const bool inTop = flags & zorBorderInMemTop, inBottom = flags & zorBorderInMemBottom;
+    const bool inLeft = flags & zorBorderInMemLeft, inRight = flags & zorBorderInMemRight;
+
+    const Kernel<T> kernel = class_kernel<T>(kw, kh);
+    const int32_t rx = kw >> 1, ry = kh >> 1;
+    const int32_t e = (int32_t)sizeof(T);
+    const bool large = kw < W && kh < H;
+    const int64_t scratch = scratch_bytes(kw, kh, dataType);
+    const Border<T> border = {borderType & 0x0F, borderValue};
+
+    Job<T> job = {pSrc, srcStep, pDst, dstStep, W, H, kw, kh, nullptr};
+
+    if (!large) {
+        const ZoriSize frameSize = {W + kw - 1, H + kh - 1};
+        uint8_t* const frameBytes = pBuffer;
+        job.scratch = pBuffer + align32((int64_t)frameSize.width * frameSize.height * e);
+        if (inTop && inBottom && inLeft && inRight) {
+            run_in_memory(kernel, job, frameBytes);  // the ring uses the frame's place
+            return zorStsNoErr;
+        }
+        // Sides in memory enlarge the copied rectangle instead of being framed.
+        const T* src = pSrc;
+        ZoriSize srcSize = roi;
+        if (inTop) src = row_at(src, srcStep, -ry), srcSize.height += ry;
+        if (inBottom) srcSize.height += ry;
+        if (inLeft) src -= rx, srcSize.width += rx;
+        if (inRight) srcSize.width += rx;
+        T* const frame = (T*)frameBytes;
+        const ZorStatus status = make_frame(border, src, srcStep, srcSize, frame, frameSize,
+                                            inTop ? 0 : ry, inLeft ? 0 : rx);
+        if (status != zorStsNoErr) return status;
+        job.src = row_at(frame, (ptrdiff_t)frameSize.width * e, ry) + rx;
+        job.srcStep = (ptrdiff_t)frameSize.width * e;
+        kernel(job);
+        return zorStsNoErr;
+    }
+
+    // Scratch, ring, the four result bands, then the band frames.
+    uint8_t* p = pBuffer;
+    job.scratch = p;
+    p += scratch;
+    uint8_t* const ring = p;
+    p += ring_bytes(W, kh, e);
+    T* const topBand = (T*)p;
+    p += align32((int64_t)W * ry * e);
+    T* const bottomBand = (T*)p;
+    p += align32((int64_t)W * ry * e);
+    T* const leftBand = (T*)p;
+    p += align32((int64_t)H * rx * e);
+    T* const rightBand = (T*)p;
+    p += align32((int64_t)H * rx * e);
+    T* const frame = (T*)p;
+
+    int32_t y0 = 0, rows = H, x0 = 0, cols = W;
+    // Top band: ry output rows from the first kh - 1 source rows, with ry
+    // framed rows above; its corners are real where the sides are in memory.
+    auto horizontal_band = [&](int32_t firstRow, int32_t top, int32_t bottom, T* band) -> ZorStatus {
+        const ZoriSize srcSize = {W + (inLeft ? rx : 0) + (inRight ? rx : 0), kh - 1};
+        const ZoriSize frameSize = {W + kw - 1, kh - 1 + top + bottom};
+        const T* src = row_at(pSrc, srcStep, firstRow) - (inLeft ? rx : 0);
+        const ZorStatus status =
+            make_frame(border, src, srcStep, srcSize, frame, frameSize, top, inLeft ? 0 : rx);
+        if (status != zorStsNoErr) return status;
+        Job<T> band_job = job;
+        band_job.srcStep = (ptrdiff_t)frameSize.width * e;
+        band_job.src = row_at(frame, band_job.srcStep, ry) + rx;
+        band_job.dst = band;
+        band_job.dstStep = (ptrdiff_t)W * e;
+        band_job.width = W;
+        band_job.height = ry;
+        kernel(band_job);
+        return zorStsNoErr;
+    };
+    if (!inTop) {
+        const ZorStatus status = horizontal_band(0, ry, 0, topBand);
+        if (status != zorStsNoErr) return status;
+        y0 = ry;
+        rows -= ry;
+    }
+    if (!inBottom) {
+        const ZorStatus status = horizontal_band(H - kh + 1, 0, ry, bottomBand);
+        if (status != zorStsNoErr) return status;
+        rows -= ry;
+    }
+    // Left and right bands: rx output columns of the remaining rows; the
+    // rows above and below them are real (taken off by the top and bottom
+    // bands, or in memory).
+    auto vertical_band = [&](int32_t firstCol, int32_t left, int32_t right, T* band) -> ZorStatus {
+        const ZoriSize srcSize = {kw - 1, rows + kh - 1};
+        const ZoriSize frameSize = {kw - 1 + left + right, rows + kh - 1};
+        const T* src = row_at(pSrc, srcStep, y0 - ry) + firstCol;
+        const ZorStatus status =
+            make_frame(border, src, srcStep, srcSize, frame, frameSize, 0, left);
+        if (status != zorStsNoErr) return status;
+        Job<T> band_job = job;
+        band_job.srcStep = (ptrdiff_t)frameSize.width * e;
+        band_job.src = row_at(frame, band_job.srcStep, ry) + rx;
+        band_job.dst = band;
+        band_job.dstStep = (ptrdiff_t)rx * e;
+        band_job.width = rx;
+        band_job.height = rows;
+        kernel(band_job);
+        return zorStsNoErr;
+    };
+    if (!inLeft) {
+        const ZorStatus status = vertical_band(0, rx, 0, leftBand);
+        if (status != zorStsNoErr) return status;
+        x0 = rx;
+        cols -= rx;
+    }
+    if (!inRight) {
+        const ZorStatus status = vertical_band(W - kw + 1, 0, rx, rightBand);
+        if (status != zorStsNoErr) return status;
+        cols -= rx;
+    }
+
+    // Centre, straight on the caller's image.
+    Job<T> centre = job;
+    centre.src = row_at(pSrc, srcStep, y0) + x0;
+    centre.dst = row_at(pDst, dstStep, y0) + x0;
+    centre.width = cols;
+    centre.height = rows;
+    run_in_memory(kernel, centre, ring);
+
+    // Bands last: every source pixel has been read by now.
+    if (!inTop) copy_rows(topBand, (ptrdiff_t)W * e, pDst, dstStep, W, ry);
+    if (!inBottom)
+        copy_rows(bottomBand, (ptrdiff_t)W * e, row_at(pDst, dstStep, H - ry), dstStep, W, ry);
+    if (!inLeft) copy_rows(leftBand, (ptrdiff_t)rx * e, row_at(pDst, dstStep, y0), dstStep, rx, rows);
+    if (!inRight)
+        copy_rows(rightBand, (ptrdiff_t)rx * e, row_at(pDst, dstStep, y0) + (W - rx), dstStep, rx,
+                  rows);
+    return zorStsNoErr;
+}
+
+}  // namespace
+ZOR_END
+
+ZOR_ENTRY ZorStatus ZOR_NAME(zoriFilterMedianBorderGetBufferSize)(ZoriSize dstRoiSize,
+                                                                  ZoriSize maskSize,
+                                                                  ZorDataType dataType,
+                                                                  int32_t numChannels,
+                                                                  int32_t* pBufferSize) {
+    using namespace ZOR_NS;
+    if (pBufferSize == nullptr) return zorStsNullPtrErr;
+    if (dstRoiSize.width < 1 || dstRoiSize.height < 1) return zorStsSizeErr;
+    if (maskSize.width < 1 || maskSize.height < 1 || !(maskSize.width & 1) ||
+        !(maskSize.height & 1))
+        return zorStsMaskSizeErr;
+    if (numChannels != 1 && numChannels != 3 && numChannels != 4) return zorStsNumChannelsErr;
+    const int32_t type = (int32_t)dataType;
+    const bool integer = type == zor8u || type == zor16u || type == zor16s;
+    if (!(integer || (numChannels == 1 && type == zor32f))) return zorStsDataTypeErr;
+
+    const int64_t W = dstRoiSize.width, H = dstRoiSize.height;
+    const int64_t kw = maskSize.width, kh = maskSize.height;
+    const int64_t total = numChannels == 1
+                              ? one_channel_bytes(W, H, kw, kh, type)
+                              : multi_channel_bytes(W, H, kw, kh, type, numChannels);
+    if (total >= 0x80000000LL) {
+        *pBufferSize = 0;
+        return zorStsExceededSizeErr;
+    }
+    *pBufferSize = (int32_t)total;
+    return zorStsNoErr;
+}
+
+#define MEDIAN_ENTRY(T, suffix, type)                                                            \
+    ZOR_ENTRY ZorStatus ZOR_NAME(zoriFilterMedianBorder_##suffix##_C1R)(                         \
+        const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriSize dstRoiSize,           \
+        ZoriSize maskSize, ZoriBorderType borderType, T borderValue, Zor8u* pBuffer) {           \
+        return ZOR_NS::median_filter<T>(pSrc, srcStep, pDst, dstStep, dstRoiSize, maskSize,      \
+                                        (int32_t)borderType, borderValue, pBuffer, type);        \
+    }
+
+MEDIAN_ENTRY(Zor8u, 8u, zor8u)
+MEDIAN_ENTRY(Zor16u, 16u, zor16u)
+MEDIAN_ENTRY(Zor16s, 16s, zor16s)
+MEDIAN_ENTRY(Zor32f, 32f, zor32f)

@@ -1,0 +1,306 @@
+// The median kernels of the fixed masks: branch-free min/max networks over
+// whole vectors of pixels. A row is swept in vectors, the last one placed
+// to end at the row's end (overlapping its neighbour: the results are the
+// same pixels), and a row shorter than one vector takes the same network
+// on single elements.
+#include "variant.h"
+
+#include "median_internal.h"
+
+ZOR_BEGIN
+namespace median {
+namespace {
+
+// Calls step(i, V()) for vectors starting at 0, L, 2L, ... and count - L,
+// or step(i, T()) for each element when count is below one vector.
+template <typename T, typename Step>
+inline void sweep(int32_t count, Step step) {
+    typedef typename VecOf<T>::type V;
+    constexpr int32_t L = lanes<T>();
+    if (count >= L) {
+        int32_t i = 0;
+        for (; i + L <= count; i += L) step(i, V());
+        if (i < count) step(count - L, V());
+    } else {
+        for (int32_t i = 0; i < count; ++i) step(i, T());
+    }
+}
+
+template <typename X> inline X med5(X p0, X p1, X p2, X p3, X p4) {
+    cex(p0, p1);
+    cex(p3, p4);
+    p3 = vmax(p0, p3);
+    p1 = vmin(p1, p4);
+    cex(p1, p2);
+    p2 = vmin(p2, p3);
+    return vmax(p1, p2);
+}
+
+template <typename X> inline X med7(X p0, X p1, X p2, X p3, X p4, X p5, X p6) {
+    cex(p0, p5);
+    cex(p0, p3);
+    cex(p1, p6);
+    cex(p2, p4);
+    p1 = vmax(p0, p1);
+    cex(p3, p5);
+    cex(p2, p6);
+    p3 = vmax(p2, p3);
+    p3 = vmin(p3, p6);
+    p4 = vmin(p4, p5);
+    cex(p1, p4);
+    p3 = vmax(p1, p3);
+    return vmin(p3, p4);
+}
+
+// One output per position from neighbours at fixed offsets; `Net` gives
+// the value at a byte address with the pixel step (row step or element
+// size) between the taps.
+template <typename T, typename Net>
+void run_taps(const Job<T>& j, ptrdiff_t tap) {
+    for (int32_t y = 0; y < j.height; ++y) {
+        const uint8_t* s = (const uint8_t*)row_at(j.src, j.srcStep, y);
+        uint8_t* d = (uint8_t*)row_at(j.dst, j.dstStep, y);
+        sweep<T>(j.width, [&](int32_t x, auto tag) {
+            typedef decltype(tag) X;
+            st<X>(d + x * sizeof(T), Net::template at<X>(s + x * sizeof(T), tap));
+        });
+    }
+}
+
+struct Net3 {
+    template <typename X> static X at(const uint8_t* p, ptrdiff_t t) {
+        return med3(ld<X>(p - t), ld<X>(p), ld<X>(p + t));
+    }
+};
+struct Net5 {
+    template <typename X> static X at(const uint8_t* p, ptrdiff_t t) {
+        return med5(ld<X>(p - 2 * t), ld<X>(p - t), ld<X>(p), ld<X>(p + t), ld<X>(p + 2 * t));
+    }
+};
+struct Net7 {
+    template <typename X> static X at(const uint8_t* p, ptrdiff_t t) {
+        return med7(ld<X>(p - 3 * t), ld<X>(p - 2 * t), ld<X>(p - t), ld<X>(p), ld<X>(p + t),
+                    ld<X>(p + 2 * t), ld<X>(p + 3 * t));
+    }
+};
+
+// Output columns per pass of the sorted-column kernels.
+constexpr int32_t kChunk = 256;
+
+// 3x3: every column of three is sorted once into low, middle and high
+// rows; an output is the median of the greatest low, the median middle and
+// the least high of its three columns.
+template <typename T>
+void square3(const Job<T>& j) {
+    constexpr int32_t L = lanes<T>();
+    T lo[kChunk + 2 + L], mid[kChunk + 2 + L], hi[kChunk + 2 + L];
+    for (int32_t y = 0; y < j.height; ++y) {
+        const uint8_t* r1 = (const uint8_t*)row_at(j.src, j.srcStep, y);
+        const uint8_t* r0 = r1 - j.srcStep;
+        const uint8_t* r2 = r1 + j.srcStep;
+        uint8_t* d = (uint8_t*)row_at(j.dst, j.dstStep, y);
+        for (int32_t x0 = 0; x0 < j.width; x0 += kChunk) {
+            const int32_t n = j.width - x0 < kChunk ? j.width - x0 : kChunk;
+            const ptrdiff_t at = (ptrdiff_t)(x0 - 1) * (ptrdiff_t)sizeof(T);
+            sweep<T>(n + 2, [&](int32_t i, auto tag) {
+                typedef decltype(tag) X;
+                const ptrdiff_t o = at + (ptrdiff_t)i * (ptrdiff_t)sizeof(T);
+                // The row the next output row adds, and that row's output,
+                // on their way in while this row is worked on.
+                __builtin_prefetch(r2 + j.srcStep + o);
+                __builtin_prefetch(d + j.dstStep + o, 1);
+                const X a = ld<X>(r0 + o), b = ld<X>(r1 + o), c = ld<X>(r2 + o);
+                const X ab = vmin(a, b), ba = vmax(a, b);
+                st<X>(lo + i, vmin(ab, c));
+                st<X>(hi + i, vmax(ba, c));
+                st<X>(mid + i, vmax(ab, vmin(ba, c)));
+            });
+            sweep<T>(n, [&](int32_t i, auto tag) {
+                typedef decltype(tag) X;
+                const X l = vmax(vmax(ld<X>(lo + i), ld<X>(lo + i + 1)), ld<X>(lo + i + 2));
+                const X h = vmin(vmin(ld<X>(hi + i), ld<X>(hi + i + 1)), ld<X>(hi + i + 2));
+                const X m = med3(ld<X>(mid + i), ld<X>(mid + i + 1), ld<X>(mid + i + 2));
+                st<X>(d + (ptrdiff_t)(x0 + i) * (ptrdiff_t)sizeof(T), med3(l, m, h));
+            });
+        }
+    }
+}
+
+// Element 12 of 25 from five sorted columns of five: the first four
+// columns merged pairwise, then together, keeping the six ranks (7 to 12)
+// that can still be the median, merged with the fifth column; every
+// min/max that does not lead to the result is left out.
+template <typename X>
+inline X select25(const X* c0, const X* c1, const X* c2, const X* c3, const X* c4) {
+    const X w1 = vmin<X>(c0[0], c1[0]);
+    const X w2 = vmax<X>(c0[0], c1[0]);
+    const X w3 = vmin<X>(c0[4], c1[4]);
+    const X w4 = vmax<X>(c0[4], c1[4]);
+    const X w5 = vmin<X>(w3, w2);
+    const X w6 = vmax<X>(w3, w2);
+    const X w7 = vmin<X>(c0[2], c1[2]);
+    const X w8 = vmax<X>(c0[2], c1[2]);
+    const X w9 = vmin<X>(w7, w5);
+    const X w10 = vmax<X>(w7, w5);
+    const X w11 = vmin<X>(w8, w6);
+    const X w12 = vmax<X>(w8, w6);
+    const X w13 = vmin<X>(c0[1], c1[1]);
+    const X w14 = vmax<X>(c0[1], c1[1]);
+    const X w15 = vmin<X>(c0[3], c1[3]);
+    const X w16 = vmax<X>(c0[3], c1[3]);
+    const X w17 = vmin<X>(w15, w14);
+    const X w18 = vmax<X>(w15, w14);
+    const X w19 = vmin<X>(w13, w9);
+    const X w20 = vmax<X>(w13, w9);
+    const X w21 = vmin<X>(w17, w10);
+    const X w22 = vmax<X>(w17, w10);
+    const X w23 = vmin<X>(w18, w11);
+    const X w24 = vmax<X>(w18, w11);
+    const X w25 = vmin<X>(w16, w12);
+    const X w26 = vmax<X>(w16, w12);
+    const X w27 = vmin<X>(c2[0], c3[0]);
+    const X w28 = vmax<X>(c2[0], c3[0]);
+    const X w29 = vmin<X>(c2[4], c3[4]);
+    const X w30 = vmax<X>(c2[4], c3[4]);
+    const X w31 = vmin<X>(w29, w28);
+    const X w32 = vmax<X>(w29, w28);
+    const X w33 = vmin<X>(c2[2], c3[2]);
+    const X w34 = vmax<X>(c2[2], c3[2]);
+    const X w35 = vmin<X>(w33, w31);
+    const X w36 = vmax<X>(w33, w31);
+    const X w37 = vmin<X>(w34, w32);
+    const X w38 = vmax<X>(w34, w32);
+    const X w39 = vmin<X>(c2[1], c3[1]);
+    const X w40 = vmax<X>(c2[1], c3[1]);
+    const X w41 = vmin<X>(c2[3], c3[3]);
+    const X w42 = vmax<X>(c2[3], c3[3]);
+    const X w43 = vmin<X>(w41, w40);
+    const X w44 = vmax<X>(w41, w40);
+    const X w45 = vmin<X>(w39, w35);
+    const X w46 = vmax<X>(w39, w35);
+    const X w47 = vmin<X>(w43, w36);
+    const X w48 = vmax<X>(w43, w36);
+    const X w49 = vmin<X>(w44, w37);
+    const X w50 = vmax<X>(w44, w37);
+    const X w51 = vmin<X>(w42, w38);
+    const X w52 = vmax<X>(w42, w38);
+    const X w54 = vmax<X>(w1, w27);
+    const X w55 = vmin<X>(w26, w52);
+    const X w57 = vmin<X>(w55, w54);
+    const X w58 = vmax<X>(w55, w54);
+    const X w59 = vmin<X>(w22, w48);
+    const X w60 = vmax<X>(w22, w48);
+    const X w62 = vmax<X>(w59, w57);
+    const X w63 = vmin<X>(w60, w58);
+    const X w66 = vmax<X>(w20, w46);
+    const X w67 = vmin<X>(w24, w50);
+    const X w69 = vmin<X>(w67, w66);
+    const X w70 = vmax<X>(w67, w66);
+    const X w74 = vmax<X>(w69, w62);
+    const X w75 = vmin<X>(w70, w63);
+    const X w76 = vmax<X>(w70, w63);
+    const X w80 = vmax<X>(w19, w45);
+    const X w81 = vmin<X>(w4, w30);
+    const X w83 = vmin<X>(w81, w80);
+    const X w84 = vmax<X>(w81, w80);
+    const X w85 = vmin<X>(w23, w49);
+    const X w86 = vmax<X>(w23, w49);
+    const X w88 = vmax<X>(w85, w83);
+    const X w89 = vmin<X>(w86, w84);
+    const X w92 = vmax<X>(w21, w47);
+    const X w93 = vmin<X>(w25, w51);
+    const X w95 = vmin<X>(w93, w92);
+    const X w96 = vmax<X>(w93, w92);
+    const X w99 = vmin<X>(w95, w88);
+    const X w100 = vmax<X>(w95, w88);
+    const X w101 = vmin<X>(w96, w89);
+    const X w111 = vmin<X>(w99, w74);
+    const X w112 = vmax<X>(w99, w74);
+    const X w113 = vmin<X>(w100, w75);
+    const X w114 = vmax<X>(w100, w75);
+    const X w115 = vmin<X>(w101, w76);
+    const X w116 = vmax<X>(w101, w76);
+    const X w124 = vmax<X>(w111, c4[0]);
+    const X w125 = vmin<X>(w115, c4[4]);
+    const X w128 = vmax<X>(w125, w124);
+    const X w130 = vmax<X>(w113, c4[2]);
+    const X w133 = vmin<X>(w130, w128);
+    const X w136 = vmax<X>(w112, c4[1]);
+    const X w137 = vmin<X>(w116, w136);
+    const X w139 = vmin<X>(w114, c4[3]);
+    const X w142 = vmax<X>(w139, w137);
+    const X w149 = vmin<X>(w142, w133);
+    return w149;
+}
+
+template <typename T>
+void square5(const Job<T>& j) {
+    constexpr int32_t L = lanes<T>();
+    T col[5][kChunk + 4 + L];
+    for (int32_t y = 0; y < j.height; ++y) {
+        const uint8_t* r[5];
+        for (int k = 0; k < 5; ++k)
+            r[k] = (const uint8_t*)row_at(j.src, j.srcStep, (ptrdiff_t)y + k - 2);
+        uint8_t* d = (uint8_t*)row_at(j.dst, j.dstStep, y);
+        for (int32_t x0 = 0; x0 < j.width; x0 += kChunk) {
+            const int32_t n = j.width - x0 < kChunk ? j.width - x0 : kChunk;
+            const ptrdiff_t at = (ptrdiff_t)(x0 - 2) * (ptrdiff_t)sizeof(T);
+            // Sort each column of five (nine compare-exchanges).
+            sweep<T>(n + 4, [&](int32_t i, auto tag) {
+                typedef decltype(tag) X;
+                const ptrdiff_t o = at + (ptrdiff_t)i * (ptrdiff_t)sizeof(T);
+                X p0 = ld<X>(r[0] + o), p1 = ld<X>(r[1] + o), p2 = ld<X>(r[2] + o),
+                  p3 = ld<X>(r[3] + o), p4 = ld<X>(r[4] + o);
+                cex(p0, p1);
+                cex(p3, p4);
+                cex(p2, p4);
+                cex(p2, p3);
+                cex(p0, p3);
+                cex(p0, p2);
+                cex(p1, p4);
+                cex(p1, p3);
+                cex(p1, p2);
+                st<X>(col[0] + i, p0);
+                st<X>(col[1] + i, p1);
+                st<X>(col[2] + i, p2);
+                st<X>(col[3] + i, p3);
+                st<X>(col[4] + i, p4);
+            });
+            sweep<T>(n, [&](int32_t i, auto tag) {
+                typedef decltype(tag) X;
+                X c[5][5];
+                for (int k = 0; k < 5; ++k)
+                    for (int r = 0; r < 5; ++r) c[k][r] = ld<X>(col[r] + i + k);
+                st<X>(d + (ptrdiff_t)(x0 + i) * (ptrdiff_t)sizeof(T),
+                      select25<X>(c[0], c[1], c[2], c[3], c[4]));
+            });
+        }
+    }
+}
+
+}  // namespace
+
+template <typename T> void fixed_1x3(const Job<T>& j) { run_taps<T, Net3>(j, j.srcStep); }
+template <typename T> void fixed_1x5(const Job<T>& j) { run_taps<T, Net5>(j, j.srcStep); }
+template <typename T> void fixed_3x1(const Job<T>& j) { run_taps<T, Net3>(j, sizeof(T)); }
+template <typename T> void fixed_5x1(const Job<T>& j) { run_taps<T, Net5>(j, sizeof(T)); }
+template <typename T> void fixed_3x3(const Job<T>& j) { square3<T>(j); }
+template <typename T> void fixed_5x5(const Job<T>& j) { square5<T>(j); }
+
+void fixed_1x7_16s(const Job<Zor16s>& j) { run_taps<Zor16s, Net7>(j, j.srcStep); }
+void fixed_7x1_16s(const Job<Zor16s>& j) { run_taps<Zor16s, Net7>(j, sizeof(Zor16s)); }
+
+#define MEDIAN_FIXED(T)                               \
+    template void fixed_1x3<T>(const Job<T>&);        \
+    template void fixed_1x5<T>(const Job<T>&);        \
+    template void fixed_3x1<T>(const Job<T>&);        \
+    template void fixed_5x1<T>(const Job<T>&);        \
+    template void fixed_3x3<T>(const Job<T>&);        \
+    template void fixed_5x5<T>(const Job<T>&);
+MEDIAN_FIXED(Zor8u)
+MEDIAN_FIXED(Zor16u)
+MEDIAN_FIXED(Zor16s)
+MEDIAN_FIXED(Zor32f)
+
+}  // namespace median
+ZOR_END

@@ -1,0 +1,272 @@
+// Median kernels of the general masks of the integer types: a histogram
+// that slides along each output row (256 counters for 8u; for 16-bit keys
+// a coarse table on the high byte and fine tables on the low byte of the
+// median's coarse bin), and for 8u columns a partial bubble sort.
+#include "variant.h"
+
+#include "median_internal.h"
+
+ZOR_BEGIN
+namespace median {
+namespace {
+
+// Mask one pixel wide: gather the column as 32-bit values and bubble the
+// smallest to the front, pass after pass from the bottom, until the middle
+// element is in place.
+void column_bubble_8u(const Job<Zor8u>& j) {
+    const int32_t n = j.kh, t = n >> 1, ry = j.kh >> 1;
+    uint32_t* a = (uint32_t*)j.scratch;
+    for (int32_t y = 0; y < j.height; ++y) {
+        const Zor8u* top = row_at(j.src, j.srcStep, (ptrdiff_t)y - ry);
+        Zor8u* d = row_at(j.dst, j.dstStep, y);
+        for (int32_t x = 0; x < j.width; ++x) {
+            for (int32_t k = 0; k < n; ++k) a[k] = row_at(top, j.srcStep, k)[x];
+            for (int32_t pass = 0; pass <= t; ++pass) {
+                for (int32_t k = n - 1; k > pass; --k) {
+                    const uint32_t lo = a[k] < a[k - 1] ? a[k] : a[k - 1];
+                    const uint32_t hi = a[k] < a[k - 1] ? a[k - 1] : a[k];
+                    a[k - 1] = lo;
+                    a[k] = hi;
+                }
+            }
+            d[x] = (Zor8u)a[t];
+        }
+    }
+}
+
+// 256 counters for one output row at a time. `below` counts the window's
+// pixels under the median bin, so that each step only moves the bin by as
+// far as the median moved.
+void sliding_8u(const Job<Zor8u>& j, int32_t firstRow) {
+    const int32_t kw = j.kw, kh = j.kh, rx = kw >> 1, ry = kh >> 1;
+    const int32_t t = (kw * kh) >> 1;
+    const ptrdiff_t step = j.srcStep;
+    int32_t hist[256];
+    for (int32_t y = firstRow; y < j.height; ++y) {
+        const Zor8u* top = row_at(j.src, step, (ptrdiff_t)y - ry);
+        Zor8u* d = row_at(j.dst, j.dstStep, y);
+        zero_counters(hist, 256);
+        for (int32_t k = 0; k < kh; ++k) {
+            const Zor8u* r = row_at(top, step, k);
+            for (int32_t dx = -rx; dx <= rx; ++dx) ++hist[r[dx]];
+        }
+        int32_t med = 0, below = 0;
+        while (below + hist[med] <= t) below += hist[med++];
+        d[0] = (Zor8u)med;
+        for (int32_t x = 1; x < j.width; ++x) {
+            const Zor8u* r = top + x;
+            for (int32_t k = 0; k < kh; ++k, r += step) {
+                const int32_t out = r[-rx - 1], in = r[rx];
+                --hist[out];
+                ++hist[in];
+                below += (in < med) - (out < med);
+            }
+            while (below > t) below -= hist[--med];
+            while (below + hist[med] <= t) below += hist[med++];
+            d[x] = (Zor8u)med;
+        }
+    }
+}
+
+// Two output rows at a time: their windows share kh - 1 rows, whose
+// counters are kept once; each row adds its own window row. The two kept
+// sums travel in one 64-bit word (row a in the low half, row b in the
+// high one), and a table tells for each bin whether it lies below either
+// median, so that a pixel updates both sums with one addition.
+void sliding_8u_pairs(const Job<Zor8u>& j, int32_t y) {
+    const int32_t kw = j.kw, kh = j.kh, rx = kw >> 1, ry = kh >> 1;
+    const int32_t t = (kw * kh) >> 1;
+    const ptrdiff_t step = j.srcStep;
+    int32_t shared[256], own[2][256];
+    uint64_t below[256];  // bit 0: bin under median a; bit 32: under median b
+    const Zor8u* rowA = row_at(j.src, step, (ptrdiff_t)y - ry);
+    const Zor8u* first = row_at(rowA, step, 1);
+    const Zor8u* rowB = row_at(rowA, step, kh);
+    Zor8u* dA = row_at(j.dst, j.dstStep, y);
+    Zor8u* dB = row_at(j.dst, j.dstStep, (ptrdiff_t)y + 1);
+    zero_counters(shared, 256);
+    zero_counters(own[0], 256);
+    zero_counters(own[1], 256);
+    for (int32_t k = 0; k < kh - 1; ++k) {
+        const Zor8u* r = row_at(first, step, k);
+        for (int32_t dx = -rx; dx <= rx; ++dx) ++shared[r[dx]];
+    }
+    for (int32_t dx = -rx; dx <= rx; ++dx) {
+        ++own[0][rowA[dx]];
+        ++own[1][rowB[dx]];
+    }
+    int32_t med[2], sum[2];
+    for (int h = 0; h < 2; ++h) {
+        med[h] = 0;
+        sum[h] = 0;
+        while (sum[h] + shared[med[h]] + own[h][med[h]] <= t)
+            sum[h] += shared[med[h]] + own[h][med[h]], ++med[h];
+    }
+    for (int32_t b = 0; b < 256; ++b)
+        below[b] = (uint64_t)(b < med[0]) | (uint64_t)(b < med[1]) << 32;
+    dA[0] = (Zor8u)med[0];
+    dB[0] = (Zor8u)med[1];
+    for (int32_t x = 1; x < j.width; ++x) {
+        uint64_t kept = (uint64_t)sum[0] + ((uint64_t)sum[1] << 32);
+        const Zor8u* r = first + x;
+#pragma GCC unroll 4
+        for (int32_t k = 0; k < kh - 1; ++k, r += step) {
+            const int32_t out = r[-rx - 1], in = r[rx];
+            --shared[out];
+            ++shared[in];
+            kept += below[in] - below[out];
+        }
+        {
+            const int32_t out = rowA[x - rx - 1], in = rowA[x + rx];
+            --own[0][out];
+            ++own[0][in];
+            kept += (below[in] & 1) - (below[out] & 1);
+        }
+        {
+            const int32_t out = rowB[x - rx - 1], in = rowB[x + rx];
+            --own[1][out];
+            ++own[1][in];
+            kept += (below[in] & (1ull << 32)) - (below[out] & (1ull << 32));
+        }
+        // Each half is a count from 0 to n again, so the word splits cleanly.
+        sum[0] = (int32_t)(uint32_t)kept;
+        sum[1] = (int32_t)(kept >> 32);
+        for (int h = 0; h < 2; ++h) {
+            const uint64_t bit = 1ull << (32 * h);
+            int32_t m = med[h], s = sum[h];
+            while (s > t) {
+                --m;
+                s -= shared[m] + own[h][m];
+                below[m] &= ~bit;
+            }
+            while (s + shared[m] + own[h][m] <= t) {
+                s += shared[m] + own[h][m];
+                below[m] |= bit;
+                ++m;
+            }
+            med[h] = m;
+            sum[h] = s;
+        }
+        dA[x] = (Zor8u)med[0];
+        dB[x] = (Zor8u)med[1];
+    }
+}
+
+// ---- 16-bit keys --------------------------------------------------------------
+
+// 16u pixels are their own keys; 16s pixels are biased by 32768.
+template <typename T> inline uint32_t key_of(T v);
+template <> inline uint32_t key_of<Zor16u>(Zor16u v) { return v; }
+template <> inline uint32_t key_of<Zor16s>(Zor16s v) { return (uint32_t)((Zor16u)v ^ 0x8000u); }
+template <typename T> inline T value_of(uint32_t key);
+template <> inline Zor16u value_of<Zor16u>(uint32_t key) { return (Zor16u)key; }
+template <> inline Zor16s value_of<Zor16s>(uint32_t key) { return (Zor16s)(Zor16u)(key ^ 0x8000u); }
+
+struct Hist16 {
+    int32_t coarse[256];  // key >> 8
+    int32_t fine[256];    // key & 255, keys of the median's coarse bin only
+    int32_t group[16];    // (key & 255) >> 4, the same keys
+    int32_t cm, belowC;   // median's coarse bin, keys under it
+    int32_t fm, belowF;   // median's fine bin, keys of bin cm under it
+};
+
+// Rebuilds the fine tables of coarse bin cm from the window at column x
+// and finds the median's fine bin for rank t afresh.
+template <typename T>
+void refine(Hist16& h, const T* top, ptrdiff_t step, int32_t x, int32_t kw, int32_t kh,
+            int32_t t) {
+    const int32_t rx = kw >> 1;
+    zero_counters(h.fine, 256);
+    zero_counters(h.group, 16);
+    for (int32_t k = 0; k < kh; ++k) {
+        const T* r = row_at(top, step, k) + x;
+        for (int32_t dx = -rx; dx <= rx; ++dx) {
+            const uint32_t key = key_of<T>(r[dx]);
+            if ((int32_t)(key >> 8) == h.cm) {
+                ++h.fine[key & 255];
+                ++h.group[(key & 255) >> 4];
+            }
+        }
+    }
+    const int32_t rank = t - h.belowC;
+    int32_t g = 0, acc = 0;
+    while (acc + h.group[g] <= rank) acc += h.group[g++];
+    int32_t f = g << 4;
+    while (acc + h.fine[f] <= rank) acc += h.fine[f++];
+    h.fm = f;
+    h.belowF = acc;
+}
+
+template <typename T>
+inline void count16(Hist16& h, uint32_t key, int32_t delta) {
+    const int32_t c = (int32_t)(key >> 8);
+    h.coarse[c] += delta;
+    if (c < h.cm) {
+        h.belowC += delta;
+    } else if (c == h.cm) {
+        const int32_t f = (int32_t)(key & 255);
+        h.fine[f] += delta;
+        h.group[f >> 4] += delta;
+        if (f < h.fm) h.belowF += delta;
+    }
+}
+
+template <typename T>
+void sliding_16(const Job<T>& j) {
+    const int32_t kw = j.kw, kh = j.kh, rx = kw >> 1, ry = kh >> 1;
+    const int32_t t = (kw * kh) >> 1;
+    const ptrdiff_t step = j.srcStep;
+    Hist16 h;
+    for (int32_t y = 0; y < j.height; ++y) {
+        const T* top = row_at(j.src, step, (ptrdiff_t)y - ry);
+        T* d = row_at(j.dst, j.dstStep, y);
+        zero_counters(h.coarse, 256);
+        for (int32_t k = 0; k < kh; ++k) {
+            const T* r = row_at(top, step, k);
+            for (int32_t dx = -rx; dx <= rx; ++dx) ++h.coarse[key_of<T>(r[dx]) >> 8];
+        }
+        h.cm = 0;
+        h.belowC = 0;
+        while (h.belowC + h.coarse[h.cm] <= t) h.belowC += h.coarse[h.cm++];
+        refine(h, top, step, 0, kw, kh, t);
+        d[0] = value_of<T>((uint32_t)(h.cm << 8 | h.fm));
+        for (int32_t x = 1; x < j.width; ++x) {
+            const T* r = top + x;
+            for (int32_t k = 0; k < kh; ++k, r = row_at(r, step, 1)) {
+                count16<T>(h, key_of<T>(r[-rx - 1]), -1);
+                count16<T>(h, key_of<T>(r[rx]), +1);
+            }
+            if (h.belowC > t || h.belowC + h.coarse[h.cm] <= t) {
+                // Another coarse bin: its fine tables are made anew.
+                while (h.belowC > t) h.belowC -= h.coarse[--h.cm];
+                while (h.belowC + h.coarse[h.cm] <= t) h.belowC += h.coarse[h.cm++];
+                refine(h, top, step, x, kw, kh, t);
+            } else {
+                const int32_t rank = t - h.belowC;
+                while (h.belowF > rank) h.belowF -= h.fine[--h.fm];
+                while (h.belowF + h.fine[h.fm] <= rank) h.belowF += h.fine[h.fm++];
+            }
+            d[x] = value_of<T>((uint32_t)(h.cm << 8 | h.fm));
+        }
+    }
+}
+
+}  // namespace
+
+void general_8u(const Job<Zor8u>& j) {
+    if (j.kw == 1) {
+        column_bubble_8u(j);
+        return;
+    }
+    // A mask one row high shares nothing between rows.
+    int32_t y = 0;
+    if (j.kh > 1)
+        for (; y + 1 < j.height; y += 2) sliding_8u_pairs(j, y);
+    sliding_8u(j, y);
+}
+
+void general_16u(const Job<Zor16u>& j) { sliding_16<Zor16u>(j); }
+void general_16s(const Job<Zor16s>& j) { sliding_16<Zor16s>(j); }
+
+}  // namespace median
+ZOR_END

@@ -1,0 +1,379 @@
+// Scaled integer products and quotients through the public stubs on every
+// level: all 8u pairs at every scale factor that matters and beyond,
+// sampled 16-bit pairs, guarded geometries, statuses and check order.
+#include <limits.h>
+#include <math.h>
+
+#include <map>
+#include <string>
+#include <typeinfo>
+
+#include "arith_harness.h"
+#include "zortest.h"
+
+namespace {
+
+using namespace arithtest;
+
+// ---- models ----------------------------------------------------------------------
+
+template <typename T>
+int64_t saturate(int64_t v) {
+    const int64_t lo = std::numeric_limits<T>::min(), hi = std::numeric_limits<T>::max();
+    return v < lo ? lo : v > hi ? hi : v;
+}
+
+// p * 2^-s rounded to nearest, ties to the even neighbour, saturated to T;
+// the 16u scale of 32 is the product's top bit.
+template <typename T>
+int64_t mul_model(int64_t a, int64_t b, int s) {
+    const int64_t p = a * b;
+    if (sizeof(T) == 2 && !std::numeric_limits<T>::is_signed && s == 32) return (uint64_t)p >> 31;
+    if (s <= 0) {
+        if (p == 0) return 0;
+        if (s < -23) return saturate<T>(p > 0 ? INT64_MAX : INT64_MIN);
+        return saturate<T>(p * ((int64_t)1 << -s));
+    }
+    if (s > 40) return 0;
+    int64_t q = p >> s;  // floor
+    const int64_t r = p - q * ((int64_t)1 << s), half = (int64_t)1 << (s - 1);
+    if (r > half || (r == half && (q & 1))) ++q;
+    return saturate<T>(q);
+}
+
+struct DivRange {
+    int lo, hi;
+};
+template <typename T>
+DivRange div_range() {
+    if (sizeof(T) == 1) return {-15, 8};
+    return std::numeric_limits<T>::is_signed ? DivRange{-30, 15} : DivRange{-31, 16};
+}
+
+// n / d (d from the first source, n from the second): the single-precision
+// quotient of n * 2^-s by d, rounded to nearest even and saturated, inside
+// the type's range of s; known values outside it; zero divisors by their
+// own rule.
+template <typename T>
+int64_t div_model(int64_t d, int64_t n, int s) {
+    const int64_t hi = std::numeric_limits<T>::max(), lo = std::numeric_limits<T>::min();
+    if (d == 0) return n > 0 ? hi : n < 0 ? lo : 0;
+    if (n == 0) return 0;
+    const DivRange range = div_range<T>();
+    if (s < range.lo) return (n > 0) == (d > 0) ? hi : lo;
+    if (s > range.hi) return 0;
+    const float q = ((float)n * ldexpf(1.0f, -s)) / (float)d;
+    const float r = nearbyintf(q);
+    return r >= (float)hi ? hi : r <= (float)lo ? lo : (int64_t)r;
+}
+
+template <typename T>
+using SfsFn = ZorStatus (*)(const T*, int32_t, const T*, int32_t, T*, int32_t, ZoriSize, int32_t);
+
+// ---- all pairs of a list, laid out row after row --------------------------------
+
+// Runs fn on the pairs (a[k], b[k]) laid out in rows of width w and
+// compares each result with model. Returns the status.
+// The model's results for the pairs at scale s, computed once per process
+// (every level compares with the same table).
+template <typename T, typename Model>
+const std::vector<int64_t>& expected(const std::vector<T>& a, const std::vector<T>& b, int s,
+                                     Model model, const char* what) {
+    static std::map<std::pair<std::string, int>, std::vector<int64_t>> tables;
+    std::vector<int64_t>& t = tables[{std::string(what) + typeid(T).name(), s}];
+    if (t.size() != a.size()) {
+        t.resize(a.size());
+        for (size_t k = 0; k < a.size(); ++k) t[k] = model(a[k], b[k], s);
+    }
+    return t;
+}
+
+template <typename T, typename Model>
+ZorStatus run_pairs(SfsFn<T> fn, const std::vector<T>& a, const std::vector<T>& b, int32_t w,
+                    int s, Model model, const char* what) {
+    const std::vector<int64_t>& want = expected(a, b, s, model, what);
+    const int32_t h = (int32_t)((a.size() + (size_t)w - 1) / (size_t)w);
+    std::vector<T> A((size_t)w * h, 0), B((size_t)w * h, 0), D((size_t)w * h, 0);
+    std::copy(a.begin(), a.end(), A.begin());
+    std::copy(b.begin(), b.end(), B.begin());
+    const int32_t step = w * (int32_t)sizeof(T);
+    const ZorStatus st = fn(A.data(), step, B.data(), step, D.data(), step, {w, h}, s);
+    for (size_t k = 0; k < a.size(); ++k) {
+        if (D[k] != want[k]) {
+            ADD_FAILURE() << what << " " << (int64_t)A[k] << ", " << (int64_t)B[k] << " scale "
+                          << s << " width " << w << ": got " << (int64_t)D[k] << ", expected "
+                          << want[k];
+            break;
+        }
+    }
+    return st;
+}
+
+std::vector<int> scales(int from, int to) {
+    std::vector<int> s;
+    for (int i = from; i <= to; ++i) s.push_back(i);
+    for (int i : {INT_MIN, -1000, 1000, INT_MAX}) s.push_back(i);
+    return s;
+}
+
+void all_8u_pairs(std::vector<Zor8u>& a, std::vector<Zor8u>& b) {
+    for (int k = 0; k < 65536; ++k) {
+        a.push_back((Zor8u)(k & 255));
+        b.push_back((Zor8u)(k >> 8));
+    }
+}
+
+// Edge values of a 16-bit type crossed with each other, then random pairs.
+template <typename T>
+void sampled_pairs(std::vector<T>& a, std::vector<T>& b, uint64_t seed) {
+    std::vector<int64_t> edges = {0, 1, 2, 3, 5, 127, 128, 181, 182, 255, 256, 257, 4095, 4096,
+                                  32767};
+    if (std::numeric_limits<T>::is_signed) {
+        for (int64_t v : {-1, -2, -3, -181, -182, -256, -32767, -32768}) edges.push_back(v);
+    } else {
+        for (int64_t v : {32768, 46340, 46341, 65534, 65535}) edges.push_back(v);
+    }
+    for (int64_t x : edges)
+        for (int64_t y : edges) {
+            a.push_back((T)x);
+            b.push_back((T)y);
+        }
+    Rng r(seed);
+    for (int k = 0; k < 6000; ++k) {
+        // Small magnitudes as often as large ones, so quotients are not all 0.
+        const uint32_t m1 = r.below(3) == 0 ? 0xff : 0xffff, m2 = r.below(3) == 0 ? 0xff : 0xffff;
+        a.push_back((T)(r.next() & m1));
+        b.push_back((T)(r.next() & m2));
+    }
+}
+
+using Sfs = zortest::LevelTest;
+
+TEST_P(Sfs, Mul8uEveryPairAtEveryScale) {
+    std::vector<Zor8u> a, b;
+    all_8u_pairs(a, b);
+    for (int s : scales(-10, 20))
+        for (int32_t w : {256, 7})
+            ASSERT_EQ(run_pairs<Zor8u>(zoriMul_8u_C1RSfs, a, b, w, s, mul_model<Zor8u>, "mul"),
+                      zorStsNoErr);
+}
+
+TEST_P(Sfs, Div8uEveryPairAtEveryScale) {
+    std::vector<Zor8u> a, b;
+    all_8u_pairs(a, b);
+    for (int s : scales(-18, 11))
+        for (int32_t w : {256, 7}) {
+            // Column 0 of the divisors is zero: status 2 from every call.
+            ASSERT_EQ(run_pairs<Zor8u>(zoriDiv_8u_C1RSfs, a, b, w, s, div_model<Zor8u>, "div"),
+                      zorStsDivByZero);
+        }
+}
+
+TEST_P(Sfs, Mul16bitSampledPairs) {
+    std::vector<Zor16u> ua, ub;
+    sampled_pairs(ua, ub, 11);
+    for (int s : scales(-20, 36))
+        for (int32_t w : {64, 5})
+            ASSERT_EQ(run_pairs<Zor16u>(zoriMul_16u_C1RSfs, ua, ub, w, s, mul_model<Zor16u>, "mul"),
+                      zorStsNoErr);
+    std::vector<Zor16s> sa, sb;
+    sampled_pairs(sa, sb, 12);
+    for (int s : scales(-20, 34))
+        for (int32_t w : {64, 5})
+            ASSERT_EQ(run_pairs<Zor16s>(zoriMul_16s_C1RSfs, sa, sb, w, s, mul_model<Zor16s>, "mul"),
+                      zorStsNoErr);
+}
+
+TEST_P(Sfs, Div16bitSampledPairs) {
+    std::vector<Zor16u> ua, ub;
+    sampled_pairs(ua, ub, 13);
+    for (int s : scales(-35, 20))
+        for (int32_t w : {64, 5})
+            ASSERT_EQ(run_pairs<Zor16u>(zoriDiv_16u_C1RSfs, ua, ub, w, s, div_model<Zor16u>, "div"),
+                      zorStsDivByZero);
+    std::vector<Zor16s> sa, sb;
+    sampled_pairs(sa, sb, 14);
+    for (int s : scales(-34, 19))
+        for (int32_t w : {64, 5})
+            ASSERT_EQ(run_pairs<Zor16s>(zoriDiv_16s_C1RSfs, sa, sb, w, s, div_model<Zor16s>, "div"),
+                      zorStsDivByZero);
+}
+
+// Worked values: ties, saturation, the fills and the bounds.
+TEST_P(Sfs, WorkedValues) {
+    struct Case {
+        int kind;  // 0 mul 8u, 1 mul 16s, 2 mul 16u, 3 div 8u, 4 div 16s, 5 div 16u
+        int64_t a, b;
+        int s;
+        int64_t want;
+        ZorStatus status;
+    } cases[] = {
+        {0, 3, 5, 1, 8, 0},       {0, 1, 1, 1, 0, 0},         {0, 1, 3, 1, 2, 0},
+        {0, 255, 255, 0, 255, 0}, {0, 255, 255, 16, 1, 0},    {0, 255, 255, 17, 0, 0},
+        {0, 1, 1, -8, 255, 0},    {0, 0, 200, -8, 0, 0},      {0, 1, 1, -7, 128, 0},
+        {0, 181, 181, 16, 0, 0},  {0, 182, 182, 16, 1, 0},    // 32761 and 33124 over 65536
+        {1, -3, 1, 1, -2, 0},     {1, -1, 1, 1, 0, 0},        {1, 300, -300, -15, -32768, 0},
+        {1, -32768, -32768, 30, 1, 0}, {1, -32768, -32768, 31, 0, 0}, {1, 2, 3, -15, 32767, 0},
+        {1, 0, -3, -15, 0, 0},    {2, 46341, 46341, 32, 1, 0}, {2, 46340, 46340, 32, 0, 0},
+        {2, 65535, 65535, 33, 0, 0}, {2, 1, 1, -16, 65535, 0}, {2, 3, 3, -13, 65535, 0},
+        {3, 0, 5, 0, 255, 2},     {3, 0, 0, 0, 0, 2},         {3, 3, 7, 0, 2, 0},
+        {3, 2, 5, 0, 2, 0},       {3, 2, 7, 0, 4, 0},         {3, 1, 255, 9, 0, 0},
+        {3, 0, 255, 9, 255, 2},   {3, 5, 1, -16, 255, 0},     {3, 1, 1, -7, 128, 0},
+        {4, 0, -5, 0, -32768, 2}, {4, 0, 5, 40, 32767, 2},    {4, -2, 5, 0, -2, 0},
+        {4, -2, 7, 0, -4, 0},     {4, 3, -32768, -31, -32768, 0}, {4, -3, -1, -31, 32767, 0},
+        {5, 0, 7, 0, 65535, 2},   {5, 2, 65535, -1, 65535, 0}, {5, 65535, 65535, 16, 0, 0},
+    };
+    for (const Case& c : cases) {
+        int64_t got = 0;
+        ZorStatus st = 0;
+        const ZoriSize one = {1, 1};
+        if (c.kind == 0 || c.kind == 3) {
+            const Zor8u a = (Zor8u)c.a, b = (Zor8u)c.b;
+            Zor8u d = 77;
+            st = (c.kind == 0 ? zoriMul_8u_C1RSfs : zoriDiv_8u_C1RSfs)(&a, 1, &b, 1, &d, 1, one, c.s);
+            got = d;
+        } else if (c.kind == 1 || c.kind == 4) {
+            const Zor16s a = (Zor16s)c.a, b = (Zor16s)c.b;
+            Zor16s d = 77;
+            st = (c.kind == 1 ? zoriMul_16s_C1RSfs : zoriDiv_16s_C1RSfs)(&a, 2, &b, 2, &d, 2, one,
+                                                                         c.s);
+            got = d;
+        } else {
+            const Zor16u a = (Zor16u)c.a, b = (Zor16u)c.b;
+            Zor16u d = 77;
+            st = (c.kind == 2 ? zoriMul_16u_C1RSfs : zoriDiv_16u_C1RSfs)(&a, 2, &b, 2, &d, 2, one,
+                                                                         c.s);
+            got = d;
+        }
+        EXPECT_EQ(got, c.want) << "kind " << c.kind << ": " << c.a << ", " << c.b << " scale " << c.s;
+        EXPECT_EQ(st, c.status) << "kind " << c.kind << ": " << c.a << ", " << c.b << " scale "
+                                << c.s;
+    }
+}
+
+// ---- guarded geometries -----------------------------------------------------------
+
+template <typename T, typename Model>
+void check_geometries(SfsFn<T> fn, Model model, bool division, const std::vector<int>& ss,
+                      bool negative, uint64_t seed) {
+    Rng r(seed);
+    size_t turn = 0;
+    for (const Geometry& g : geometries()) {
+        const std::vector<int32_t> steps =
+            steps_for(g.w * (int32_t)sizeof(T), sizeof(T), negative, true);
+        const std::vector<size_t> ms = misaligns(sizeof(T), false);
+        for (size_t k = 0; k < steps.size(); ++k, ++turn) {
+            const int s = ss[turn % ss.size()];
+            const int32_t st1 = steps[k], st2 = steps[(k + 1) % steps.size()];
+            const int32_t dstep = k % 2 ? steps[k] : steps[(k + 2) % steps.size()];
+            Plane a(g.w, g.h, sizeof(T), st1, ms[k % ms.size()], r);
+            Plane b(g.w, g.h, sizeof(T), st2, ms[(k + 1) % ms.size()], r);
+            Plane d(g.w, g.h, sizeof(T), dstep, ms[(k + 2) % ms.size()], r);
+            // Small values now and then, so that every rule sees both.
+            const bool small = turn % 3 == 0;
+            for (int32_t y = 0; y < g.h; ++y)
+                for (int32_t x = 0; x < g.w; ++x) {
+                    a.put<T>(x, y, (T)(small ? r.below(4) : r.next()));
+                    b.put<T>(x, y, (T)(small ? r.below(40) : r.next()));
+                }
+            Plane want = d;
+            bool zero = false;
+            for (int32_t y = 0; y < g.h; ++y)
+                for (int32_t x = 0; x < g.w; ++x) {
+                    want.put<T>(x, y, (T)model(a.get<T>(x, y), b.get<T>(x, y), s));
+                    zero |= a.get<T>(x, y) == 0;
+                }
+            const ZorStatus st =
+                fn(a.ptr<T>(), st1, b.ptr<T>(), st2, d.ptr<T>(), dstep, {g.w, g.h}, s);
+            ASSERT_TRUE(same_bytes(d.mem, want.mem, d)) << "scale " << s;
+            ASSERT_EQ(st, division && zero ? zorStsDivByZero : zorStsNoErr)
+                << where(d) << " scale " << s;
+        }
+    }
+}
+
+TEST_P(Sfs, GuardedGeometries) {
+    const std::vector<int> mul8 = {0, 1, 2, 5, 8, 15, 16, 17, -1, -7, -8};
+    check_geometries<Zor8u>(zoriMul_8u_C1RSfs, mul_model<Zor8u>, false, mul8, true, 21);
+    const std::vector<int> mul16u = {0, 1, 2, 16, 17, 31, 32, 33, -1, -15, -16};
+    check_geometries<Zor16u>(zoriMul_16u_C1RSfs, mul_model<Zor16u>, false, mul16u, true, 22);
+    const std::vector<int> mul16s = {0, 1, 2, 15, 30, 31, -1, -14, -15};
+    check_geometries<Zor16s>(zoriMul_16s_C1RSfs, mul_model<Zor16s>, false, mul16s, true, 23);
+    const std::vector<int> div8 = {0, 1, 3, 8, 9, -1, -15, -16};
+    check_geometries<Zor8u>(zoriDiv_8u_C1RSfs, div_model<Zor8u>, true, div8, false, 24);
+    const std::vector<int> div16u = {0, 1, 16, 17, -1, -31, -32};
+    check_geometries<Zor16u>(zoriDiv_16u_C1RSfs, div_model<Zor16u>, true, div16u, true, 25);
+    const std::vector<int> div16s = {0, 2, 15, 16, -1, -30, -31};
+    check_geometries<Zor16s>(zoriDiv_16s_C1RSfs, div_model<Zor16s>, true, div16s, false, 26);
+}
+
+// Every row is computed whichever row meets a zero divisor.
+TEST_P(Sfs, DivisionStatusAndLaterRows) {
+    for (int32_t zeroRow : {0, 2}) {
+        Zor8u a[3][20], b[3][20], d[3][20];
+        for (int y = 0; y < 3; ++y)
+            for (int x = 0; x < 20; ++x) {
+                a[y][x] = (Zor8u)(1 + x);
+                b[y][x] = (Zor8u)(10 * y + x);
+            }
+        a[zeroRow][19] = 0;
+        memset(d, 0, sizeof d);
+        ASSERT_EQ(zoriDiv_8u_C1RSfs(&a[0][0], 20, &b[0][0], 20, &d[0][0], 20, {20, 3}, 0),
+                  zorStsDivByZero);
+        for (int y = 0; y < 3; ++y)
+            for (int x = 0; x < 20; ++x)
+                ASSERT_EQ(d[y][x], div_model<Zor8u>(a[y][x], b[y][x], 0)) << y << "," << x;
+    }
+    const Zor16s a[2] = {-3, 1}, b[2] = {7, -7};
+    Zor16s d[2];
+    EXPECT_EQ(zoriDiv_16s_C1RSfs(a, 4, b, 4, d, 4, {2, 1}, 0), zorStsNoErr);
+    EXPECT_EQ(d[0], -2);
+    EXPECT_EQ(d[1], -7);
+}
+
+// Pointers, ROI, then steps where the operation tests them; nothing written
+// on an error.
+TEST_P(Sfs, ChecksInOrder) {
+    struct Fn {
+        SfsFn<Zor8u> f8;
+        SfsFn<Zor16u> f16u;
+        SfsFn<Zor16s> f16s;
+    };
+    Zor16u src[16];
+    for (Zor16u& v : src) v = 0x0101;  // non-zero divisors in every width
+    for (int k = 0; k < 6; ++k) {
+        const bool stepTest = k == 3 || k == 5;  // Div 8u and Div 16s
+        auto call = [&](bool n1, bool n2, bool nd, ZoriSize roi, int32_t s1, int32_t s2,
+                        int32_t sd, Zor16u* dst) -> ZorStatus {
+            const void* p1 = n1 ? nullptr : src;
+            const void* p2 = n2 ? nullptr : src;
+            void* pd = nd ? nullptr : dst;
+            switch (k) {
+            case 0: return zoriMul_8u_C1RSfs((const Zor8u*)p1, s1, (const Zor8u*)p2, s2, (Zor8u*)pd, sd, roi, 1);
+            case 1: return zoriMul_16u_C1RSfs((const Zor16u*)p1, s1, (const Zor16u*)p2, s2, (Zor16u*)pd, sd, roi, 1);
+            case 2: return zoriMul_16s_C1RSfs((const Zor16s*)p1, s1, (const Zor16s*)p2, s2, (Zor16s*)pd, sd, roi, 1);
+            case 3: return zoriDiv_8u_C1RSfs((const Zor8u*)p1, s1, (const Zor8u*)p2, s2, (Zor8u*)pd, sd, roi, 1);
+            case 4: return zoriDiv_16u_C1RSfs((const Zor16u*)p1, s1, (const Zor16u*)p2, s2, (Zor16u*)pd, sd, roi, 1);
+            default: return zoriDiv_16s_C1RSfs((const Zor16s*)p1, s1, (const Zor16s*)p2, s2, (Zor16s*)pd, sd, roi, 1);
+            }
+        };
+        Zor16u dst[4] = {7, 7, 7, 7};
+        auto untouched = [&] { return dst[0] == 7 && dst[1] == 7 && dst[2] == 7 && dst[3] == 7; };
+        EXPECT_EQ(call(true, false, false, {0, 0}, 0, 0, 0, dst), zorStsNullPtrErr) << k;
+        EXPECT_EQ(call(false, true, false, {1, 1}, 8, 8, 8, dst), zorStsNullPtrErr) << k;
+        EXPECT_EQ(call(false, false, true, {1, 1}, 8, 8, 8, dst), zorStsNullPtrErr) << k;
+        EXPECT_EQ(call(false, false, false, {0, 1}, 0, 0, 0, dst), zorStsSizeErr) << k;
+        EXPECT_EQ(call(false, false, false, {1, -1}, 8, 8, 8, dst), zorStsSizeErr) << k;
+        EXPECT_TRUE(untouched()) << k;
+        const ZorStatus zeroStep = call(false, false, false, {1, 2}, 8, 0, 0, dst);
+        EXPECT_EQ(zeroStep, stepTest ? zorStsStepErr : zorStsNoErr) << k;
+        EXPECT_EQ(call(false, false, false, {1, 1}, 8, 8, -8, dst),
+                  stepTest ? zorStsStepErr : zorStsNoErr)
+            << k;
+        if (stepTest) EXPECT_TRUE(untouched()) << k;
+    }
+}
+
+ZOR_INSTANTIATE_LEVELS(Sfs);
+
+}  // namespace

@@ -1,0 +1,247 @@
+// Level-private element-wise operations on every level: absolute value,
+// square, the in-place constant forms and their short cuts, in-place
+// reversal, clears and the integer copies, and the conversions to
+// integers in all three rounding modes.
+#include <gtest/gtest.h>
+
+#include <xmmintrin.h>
+
+#include <cmath>
+#include <cstdint>
+#include <algorithm>
+#include <cstring>
+#include <limits>
+#include <vector>
+
+#include "vector_support.h"
+#include "zorinternal.h"
+
+namespace {
+
+using vt::Region;
+
+using Elementwise = zortest::LevelTest;
+using Clear = zortest::LevelTest;
+using Convert = zortest::LevelTest;
+
+TEST_P(Elementwise, AbsSquareAndConstantForms) {
+    const std::vector<std::vector<float>> f(1, vt::values<float>(8200, 3));
+    const std::vector<std::vector<double>> d(1, vt::values<double>(8200, 4));
+    // The sign bit cleared, NaN payloads kept: exact.
+    const auto abs = ZOR_BODY(zorsAbs_32f);
+    vt::sweep<float>(f, false, 1, true, [&](const float* const* s, float* o, int32_t n) { return abs(s[0], o, n); },
+                     [&](size_t i) { return vt::f32(vt::bits(f[0][i]) & 0x7fffffffu); });
+    const auto sqr = ZOR_BODY(zorsSqr_32f);
+    vt::sweep<float>(f, false, 1, false, [&](const float* const* s, float* o, int32_t n) { return sqr(s[0], o, n); },
+                     [&](size_t i) { return f[0][i] * f[0][i]; });
+    const auto addc = ZOR_BODY(zorsAddC_32f_I);
+    for (float v : {1.5f, -3e-39f, std::numeric_limits<float>::quiet_NaN()})
+        vt::sweep<float>(f, true, 1, false, [&](const float* const*, float* o, int32_t n) { return addc(o, n, v); },
+                         [&](size_t i) { return f[0][i] + v; });
+    const auto mulc = ZOR_BODY(zorsMulC_64f_I);
+    for (double v : {0.75, -1e300, std::numeric_limits<double>::infinity()})
+        vt::sweep<double>(d, true, 1, false, [&](const double* const*, double* o, int32_t n) { return mulc(o, n, v); },
+                          [&](size_t i) { return d[0][i] * v; });
+}
+
+TEST_P(Elementwise, ShortCutsOfTheInPlaceConstantForms) {
+    const auto addc = ZOR_BODY(zorsAddC_32f_I);
+    const auto mulc = ZOR_BODY(zorsMulC_64f_I);
+    // Adding +-0 and multiplying by 1 touch nothing, signalling NaNs included.
+    std::vector<uint32_t> f(37);
+    for (size_t i = 0; i < f.size(); ++i) f[i] = i % 2 ? 0x7f800001u + (uint32_t)i : 0x80000000u;
+    const auto f0 = f;
+    for (float zero : {0.0f, -0.0f}) {
+        ASSERT_EQ(addc((float*)f.data(), 37, zero), zorStsNoErr);
+        EXPECT_EQ(f, f0);
+    }
+    std::vector<uint64_t> d(37);
+    for (size_t i = 0; i < d.size(); ++i) d[i] = i % 2 ? 0x7ff0000000000001ull + i : 0xfff8000000000000ull;
+    const auto d0 = d;
+    ASSERT_EQ(mulc((double*)d.data(), 37, 1.0), zorStsNoErr);
+    EXPECT_EQ(d, d0);
+    // Multiplying by +-0 clears, whatever the element.
+    for (double zero : {0.0, -0.0}) {
+        d = d0;
+        ASSERT_EQ(mulc((double*)d.data(), 37, zero), zorStsNoErr);
+        EXPECT_EQ(d, std::vector<uint64_t>(37, 0));
+    }
+    // Checks: pointer, then length; nothing changes on refusal.
+    EXPECT_EQ(addc(nullptr, 0, 1.0f), zorStsNullPtrErr);
+    EXPECT_EQ(addc((float*)f.data(), 0, 0.0f), zorStsSizeErr);
+    EXPECT_EQ(mulc(nullptr, -1, 1.0), zorStsNullPtrErr);
+    EXPECT_EQ(mulc((double*)d.data(), 0, 0.0), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsAbs_32f)(nullptr, (float*)f.data(), 0), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsSqr_32f)((float*)f.data(), (float*)f.data(), -4), zorStsSizeErr);
+    EXPECT_EQ(f, f0);
+}
+
+// The public flips reach these through equal pointers at every length;
+// here the checks and one length per shape of the loop.
+TEST_P(Elementwise, InPlaceReversal) {
+    auto check = [](auto body, size_t size) {
+        for (int len : {1, 2, 3, 17, 64, 1001}) {
+            Region r(len * size, 4);
+            auto want = r.raw;
+            for (int i = 0; i < len; ++i) std::memcpy(r.in(want) + i * size, r.data() + (len - 1 - i) * size, size);
+            ASSERT_EQ(body(r.data(), len), zorStsNoErr);
+            ASSERT_IMAGE(r, want) << "size " << size << " len " << len;
+        }
+        EXPECT_EQ(body(nullptr, 0), zorStsNullPtrErr);
+        Zor64fc one{};
+        EXPECT_EQ(body(&one, 0), zorStsSizeErr);
+    };
+    const auto f32 = ZOR_BODY(zorsFlip_32f_I);
+    const auto f32c = ZOR_BODY(zorsFlip_32fc_I);
+    const auto f64 = ZOR_BODY(zorsFlip_64f_I);
+    const auto f64c = ZOR_BODY(zorsFlip_64fc_I);
+    check([&](void* p, int32_t n) { return f32((Zor32f*)p, n); }, 4);
+    check([&](void* p, int32_t n) { return f32c((Zor32fc*)p, n); }, 8);
+    check([&](void* p, int32_t n) { return f64((Zor64f*)p, n); }, 8);
+    check([&](void* p, int32_t n) { return f64c((Zor64fc*)p, n); }, 16);
+}
+
+// ---- clears and integer copies ------------------------------------------------
+
+// Every clear and integer copy is a byte kernel behind a typed entry: the
+// entries at every small length and placement, the kernel around the
+// thresholds (large lengths once per type family).
+template <typename T> void clear_case(ZorStatus (*fn)(T*, int32_t), long elements, size_t off) {
+    Region r(elements * sizeof(T), off);
+    auto want = r.raw;
+    std::memset(r.in(want), 0, elements * sizeof(T));
+    ASSERT_EQ(fn(r.as<T>(), (int32_t)elements), elements ? zorStsNoErr : zorStsSizeErr);
+    ASSERT_IMAGE(r, want) << "size " << sizeof(T) << " elements " << elements << " at " << off;
+}
+
+template <typename T> void clear_all(ZorStatus (*fn)(T*, int32_t), bool large) {
+    for (long n = 0; n <= 70; ++n)
+        for (size_t off = 0; off < 40; ++off) clear_case(fn, n, off);
+    if (large)
+        for (long th : {0x8000L, 0x80000L})
+            for (long d : {-16L, -1L, 0L, 1L, 16L})
+                for (size_t off : {0, 7, 33}) clear_case(fn, (th + d) / (long)sizeof(T), off);
+    EXPECT_EQ(fn(nullptr, 0), zorStsNullPtrErr);
+    T one{};
+    EXPECT_EQ(fn(&one, -1), zorStsSizeErr);
+}
+
+TEST_P(Clear, EveryTypeEveryPlace) {
+    clear_all(ZOR_BODY(zorsZero_8u), true);
+    clear_all(ZOR_BODY(zorsZero_32s), false);
+    clear_all(ZOR_BODY(zorsZero_32f), false);
+    clear_all(ZOR_BODY(zorsZero_64f), false);
+    clear_all(ZOR_BODY(zorsZero_32fc), false);
+    clear_all(ZOR_BODY(zorsZero_64fc), true);
+}
+
+template <typename T> void copy_all(ZorStatus (*fn)(const T*, T*, int32_t)) {
+    std::vector<std::vector<uint8_t>> d(1, std::vector<uint8_t>(8200 * sizeof(T)));
+    for (size_t i = 0; i < d[0].size(); ++i) d[0][i] = (uint8_t)(i * 13 + 5);
+    vt::sweep<uint8_t>(d, false, sizeof(T), true,
+                       [&](const uint8_t* const* s, uint8_t* o, int32_t n) { return fn((const T*)s[0], (T*)o, n); },
+                       [&](size_t i) { return d[0][i]; });
+    EXPECT_EQ(fn(nullptr, nullptr, 0), zorStsNullPtrErr);
+}
+
+TEST_P(Clear, IntegerCopies) {
+    copy_all(ZOR_BODY(zorsCopy_8u));
+    copy_all(ZOR_BODY(zorsCopy_16s));
+    copy_all(ZOR_BODY(zorsCopy_32s));
+}
+
+// ---- conversion ---------------------------------------------------------------
+
+// Exact: long double holds every float times any power of two used here.
+long convert_model(float x, int mode, int sf, long lo, long hi) {
+    if (std::isnan(x)) return lo;
+    if (std::isinf(x)) return x > 0 ? hi : lo;
+    // (The exponent negated in 64 bits: -INT32_MIN does not fit in 32.)
+    const long e = std::max(-10000L, std::min(10000L, -(long)sf));
+    const long double y = (long double)x * std::ldexp(1.0L, (int)e);
+    long double r = std::trunc(y);
+    if (mode == 1) {
+        const long double f = y - r;
+        const bool odd = std::fmod(r, 2.0L) != 0;
+        if (f > 0.5L || (f == 0.5L && odd)) r += 1;
+        if (f < -0.5L || (f == -0.5L && odd)) r -= 1;
+    }
+    return r < lo ? lo : r > hi ? hi : (long)r;
+}
+
+std::vector<float> convert_inputs() {
+    std::vector<float> v = {0.0f, -0.0f, 0.5f, 1.5f, 2.5f, -0.5f, -1.5f, -2.5f, 0.49999997f, 0.50000006f,
+                            254.5f, 255.5f, 256.0f, 65534.5f, 65535.5f, 65536.0f, 32766.5f, 32767.5f,
+                            -32767.5f, -32768.5f, -32769.0f, 1e10f, -1e10f, 3e38f, -3e38f, 1e-40f, -1e-45f,
+                            std::numeric_limits<float>::infinity(), -std::numeric_limits<float>::infinity(),
+                            std::numeric_limits<float>::quiet_NaN(), vt::f32(0xff812345u), 7.75f, -7.75f};
+    std::mt19937 gen(5);
+    std::uniform_real_distribution<float> d(-70000.0f, 70000.0f);
+    while (v.size() < 200) {
+        float x = d(gen);
+        if (v.size() % 3 == 0) x = std::round(x * 2) / 2;  // ties
+        v.push_back(x);
+    }
+    return v;
+}
+
+template <typename D>
+void convert_all(ZorStatus (*fn)(const Zor32f*, D*, int32_t, int32_t, int32_t), long lo, long hi) {
+    const auto src = convert_inputs();
+    const int n = (int)src.size();
+    const int scales[] = {0, 1, -1, 3, -3, 8, -8, 20, -20, 126, 127, 128, -126, -127, -128,
+                          149, 150, -149, -150, 200, -200, 1000, -1000, INT32_MAX, INT32_MIN};
+    for (int mode : {0, 1, 2, -1, 99})
+        for (int sf : scales)
+            for (int start : {0, 1, 5}) {
+                std::vector<D> dst(n + 1, (D)0x5a5a);
+                ASSERT_EQ(fn(src.data() + start, dst.data(), n - start, mode, sf), zorStsNoErr);
+                for (int i = 0; i < n - start; ++i)
+                    ASSERT_EQ((long)dst[i], convert_model(src[start + i], mode == 1 ? 1 : 0, sf, lo, hi))
+                        << "x " << src[start + i] << " mode " << mode << " scale " << sf;
+                ASSERT_EQ(dst[n - start], (D)0x5a5a);
+            }
+}
+
+TEST_P(Convert, EveryModeAndScaleSaturated) {
+    convert_all<Zor8u>(ZOR_BODY(zorsConvert_32f8u_Sfs), 0, 255);
+    convert_all<Zor16u>(ZOR_BODY(zorsConvert_32f16u_Sfs), 0, 65535);
+    convert_all<Zor16s>(ZOR_BODY(zorsConvert_32f16s_Sfs), -32768, 32767);
+}
+
+// The rounding control is the caller's again afterwards, and no mode's
+// result depends on it.
+TEST_P(Convert, CallersRoundingControlKeptAndIrrelevant) {
+    const float src[9] = {0.5f, 1.5f, -2.5f, 2.7f, -2.7f, 3.5f, 100.25f, -0.5f, 4.5f};
+    const unsigned base = _mm_getcsr();
+    for (unsigned rc : {0x0000u, 0x2000u, 0x4000u, 0x6000u}) {
+        for (int mode : {0, 1, 2}) {
+            Zor16s dst[9];
+            _mm_setcsr((base & ~0x6000u) | rc);
+            const ZorStatus st = ZOR_BODY(zorsConvert_32f16s_Sfs)(src, dst, 9, mode, 0);
+            const unsigned after = _mm_getcsr();
+            _mm_setcsr(base);
+            ASSERT_EQ(st, zorStsNoErr);
+            EXPECT_EQ(after & ~0x3fu, ((base & ~0x6000u) | rc) & ~0x3fu) << "control " << rc << " mode " << mode;
+            for (int i = 0; i < 9; ++i)
+                EXPECT_EQ(dst[i], convert_model(src[i], mode == 1, 0, -32768, 32767))
+                    << "control " << rc << " mode " << mode << " x " << src[i];
+        }
+    }
+}
+
+TEST_P(Convert, Checks) {
+    float f = 1.0f;
+    Zor8u b = 7;
+    EXPECT_EQ(ZOR_BODY(zorsConvert_32f8u_Sfs)(nullptr, &b, 0, 1, 0), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsConvert_32f16u_Sfs)(&f, nullptr, 1, 1, 0), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsConvert_32f8u_Sfs)(&f, &b, 0, 1, 0), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsConvert_32f8u_Sfs)(&f, &b, -1, 5, 0), zorStsSizeErr);
+    EXPECT_EQ(b, 7);
+}
+
+ZOR_INSTANTIATE_LEVELS(Elementwise);
+ZOR_INSTANTIATE_LEVELS(Clear);
+ZOR_INSTANTIATE_LEVELS(Convert);
+
+}  // namespace

@@ -1,0 +1,286 @@
+// Element-wise float arithmetic, maximum and reversal on every level,
+// against scalar models at every length and placement (vt::sweep), with
+// special values, the short cuts for special constants and the checks in
+// their order.
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+#include <limits>
+#include <vector>
+
+#include "vector_support.h"
+#include "zors.h"
+#include "zortest.h"
+
+namespace {
+
+using vt::Region;
+using vt::sweep;
+using Arith = zortest::LevelTest;
+using MaxEvery = zortest::LevelTest;
+using Flip = zortest::LevelTest;
+using Checks = zortest::LevelTest;
+
+template <typename T> std::vector<std::vector<T>> sources(int count) {
+    std::vector<std::vector<T>> v;
+    for (int k = 0; k < count; ++k) v.push_back(vt::values<T>(16400, 7 + k));
+    return v;
+}
+
+// Two sources (or one and the destination) through fn against op.
+template <typename T, typename Fn, typename Op> void binary(Fn fn, Op op, bool inplace) {
+    const auto d = sources<T>(2);
+    sweep<T>(d, inplace, 1, false,
+             [&](const T* const* s, T* dst, int32_t n) {
+                 if constexpr (std::is_invocable_v<Fn, const T*, const T*, T*, int32_t>)
+                     return fn(s[0], s[1], dst, n);
+                 else
+                     return fn(s[1], dst, n);  // srcDst = srcDst op src
+             },
+             [&](size_t i) { return op(d[0][i], d[1][i]); });
+}
+
+const auto add = [](auto x, auto y) { return x + y; };
+const auto mul = [](auto x, auto y) { return x * y; };
+
+TEST_P(Arith, SumsAndProducts) {
+    binary<float>(zorsAdd_32f, add, false);
+    binary<double>(zorsAdd_64f, add, false);
+    binary<float>(zorsMul_32f, mul, false);
+    binary<float>(zorsAdd_32f_I, add, true);
+    binary<double>(zorsAdd_64f_I, add, true);
+    binary<float>(zorsMul_32f_I, mul, true);
+}
+
+// The complex sums are the real ones over both parts of each element.
+TEST_P(Arith, ComplexSums) {
+    const auto f = sources<float>(2);
+    const auto d = sources<double>(2);
+    auto f_sum = [&](size_t i) { return f[0][i] + f[1][i]; };
+    auto d_sum = [&](size_t i) { return d[0][i] + d[1][i]; };
+    sweep<float>(f, false, 2, false, [](const float* const* s, float* o, int32_t n) {
+        return zorsAdd_32fc((const Zor32fc*)s[0], (const Zor32fc*)s[1], (Zor32fc*)o, n); }, f_sum);
+    sweep<double>(d, false, 2, false, [](const double* const* s, double* o, int32_t n) {
+        return zorsAdd_64fc((const Zor64fc*)s[0], (const Zor64fc*)s[1], (Zor64fc*)o, n); }, d_sum);
+    sweep<float>(f, true, 2, false, [](const float* const* s, float* o, int32_t n) {
+        return zorsAdd_32fc_I((const Zor32fc*)s[1], (Zor32fc*)o, n); }, f_sum);
+    sweep<double>(d, true, 2, false, [](const double* const* s, double* o, int32_t n) {
+        return zorsAdd_64fc_I((const Zor64fc*)s[1], (Zor64fc*)o, n); }, d_sum);
+}
+
+// Values that take no short cut, the square, and complex products (where
+// 1 and 0 take none either).
+TEST_P(Arith, ConstantForms) {
+    const auto f = sources<float>(1);
+    const auto d = sources<double>(1);
+    for (float v : {2.5f, 1e30f, vt::f32(0x80000123u), std::numeric_limits<float>::quiet_NaN()}) {
+        auto times = [&](size_t i) { return f[0][i] * v; };
+        sweep<float>(f, false, 1, false, [v](const float* const* s, float* o, int32_t n) {
+            return zorsMulC_32f(s[0], o, n, v); }, times);
+        sweep<float>(f, true, 1, false, [v](const float* const*, float* o, int32_t n) {
+            return zorsMulC_32f_I(o, n, v); }, times);
+        sweep<float>(f, false, 1, false, [v](const float* const* s, float* o, int32_t n) {
+            return zorsSubC_32f(s[0], o, n, v); }, [&](size_t i) { return f[0][i] - v; });
+        sweep<double>(d, false, 1, false, [v](const double* const* s, double* o, int32_t n) {
+            return zorsMulC_64f(s[0], o, n, v); }, [&](size_t i) { return d[0][i] * (double)v; });
+    }
+    sweep<float>(f, true, 1, false, [](const float* const*, float* o, int32_t n) { return zorsSqr_32f_I(o, n); },
+                 [&](size_t i) { return f[0][i] * f[0][i]; });
+    const float cases[][2] = {{1.5f, -2.25f}, {1, 0}, {0, 0}, {-0.0f, 3}, {1e-40f, 7e30f}};
+    for (const auto& c : cases) {
+        auto model = [](const auto& v, auto re, auto im) {
+            return [&v, re, im](size_t i) {
+                const auto x = v[i & ~(size_t)1], y = v[i | 1];
+                return i % 2 ? y * re + x * im : x * re - y * im;
+            };
+        };
+        sweep<float>(f, false, 2, false, [&](const float* const* s, float* o, int32_t n) {
+            return zorsMulC_32fc((const Zor32fc*)s[0], (Zor32fc*)o, n, Zor32fc{c[0], c[1]}); }, model(f[0], c[0], c[1]));
+        sweep<double>(d, false, 2, false, [&](const double* const* s, double* o, int32_t n) {
+            return zorsMulC_64fc((const Zor64fc*)s[0], (Zor64fc*)o, n, Zor64fc{c[0], c[1]}); },
+                      model(d[0], (double)c[0], (double)c[1]));
+    }
+}
+
+// By 1 a copy and by +-0 a clear, bit for bit whatever the elements hold
+// (signalling NaNs too); subtracting +-0 a copy; in place by 1 nothing.
+TEST_P(Arith, ShortCutsForOneAndZero) {
+    const int n = 67;
+    std::vector<uint32_t> p(n);
+    for (int i = 0; i < n; ++i) p[i] = i % 3 ? 0x7f800001u + i : 0xffc00000u - i;
+    std::vector<uint64_t> q(n);
+    for (int i = 0; i < n; ++i) q[i] = i % 2 ? 0x7ff0000000000001ull + i : 0xfff8000000000000ull - i;
+    for (size_t off : {0, 4, 1}) {
+        auto check = [&](const void* pattern, size_t size, auto call, bool copies) {
+            Region rs(n * size, 0), rd(n * size, off, 2);
+            std::memcpy(rs.data(), pattern, n * size);
+            auto want = rd.raw;
+            if (copies) std::memcpy(rd.in(want), pattern, n * size);
+            else std::memset(rd.in(want), 0, n * size);
+            ASSERT_EQ(call(rs.data(), rd.data()), zorStsNoErr);
+            EXPECT_IMAGE(rd, want);
+        };
+        check(p.data(), 4, [](void* s, void* d) { return zorsMulC_32f((float*)s, (float*)d, n, 1.0f); }, true);
+        check(q.data(), 8, [](void* s, void* d) { return zorsMulC_64f((double*)s, (double*)d, n, 1.0); }, true);
+        for (float zero : {0.0f, -0.0f}) {
+            check(p.data(), 4, [&](void* s, void* d) { return zorsMulC_32f((float*)s, (float*)d, n, zero); }, false);
+            check(q.data(), 8, [&](void* s, void* d) { return zorsMulC_64f((double*)s, (double*)d, n, zero); }, false);
+            check(p.data(), 4, [&](void* s, void* d) { return zorsSubC_32f((float*)s, (float*)d, n, zero); }, true);
+            check(p.data(), 4, [&](void*, void* d) { return zorsMulC_32f_I((float*)d, n, zero); }, false);
+        }
+        Region r(n * 4, off);
+        std::memcpy(r.data(), p.data(), n * 4);
+        const auto before = r.raw;
+        ASSERT_EQ(zorsMulC_32f_I(r.as<float>(), n, 1.0f), zorStsNoErr);
+        EXPECT_IMAGE(r, before);
+    }
+}
+
+// ---- maximum --------------------------------------------------------------------
+
+template <typename T> T larger(T a, T b) { return a > b ? a : b; }
+
+template <typename T> std::vector<std::vector<T>> max_sources() {
+    if constexpr (std::is_floating_point_v<T>) return sources<T>(2);
+    std::vector<std::vector<T>> v(2, std::vector<T>(16400));
+    std::mt19937 gen(3);
+    for (auto& s : v)
+        for (auto& x : s) x = (T)gen();
+    return v;
+}
+
+// No tolerance: the rule picks one operand, bits and all.
+template <typename T> void max_sweep(ZorStatus (*fn)(const T*, const T*, T*, uint32_t)) {
+    const auto d = max_sources<T>();
+    sweep<T>(d, false, 1, true, [fn](const T* const* s, T* o, int32_t n) { return fn(s[0], s[1], o, n); },
+             [&](size_t i) { return larger(d[0][i], d[1][i]); });
+}
+
+// Overlap of destination and either source: the result is that of an
+// element by element walk from the first.
+template <typename T> void overlap_walk(ZorStatus (*fn)(const T*, const T*, T*, uint32_t)) {
+    const auto v = max_sources<T>();
+    for (int shift = -20; shift <= 20; ++shift)
+        for (int len : {7, 8, 9, 31, 64, 100})
+            for (int which = 0; which < 2; ++which) {
+                std::vector<T> buf(v[0].begin(), v[0].begin() + 200), model = buf;
+                const T* other = v[1].data() + 60;
+                const int d = 60 + shift;
+                for (int i = 0; i < len; ++i)
+                    model[d + i] = which ? larger(other[i], model[60 + i]) : larger(model[60 + i], other[i]);
+                ASSERT_EQ(which ? fn(other, &buf[60], &buf[d], len) : fn(&buf[60], other, &buf[d], len), zorStsNoErr);
+                ASSERT_EQ(std::memcmp(buf.data(), model.data(), 200 * sizeof(T)), 0)
+                    << "shift " << shift << " len " << len << " source " << which + 1;
+            }
+}
+
+TEST_P(MaxEvery, EveryTypeEveryLengthAndOverlap) {
+    max_sweep<Zor8u>(zorsMaxEvery_8u);
+    max_sweep<Zor16u>(zorsMaxEvery_16u);
+    max_sweep<Zor32f>(zorsMaxEvery_32f);
+    max_sweep<Zor64f>(zorsMaxEvery_64f);
+    overlap_walk<Zor8u>(zorsMaxEvery_8u);
+    overlap_walk<Zor16u>(zorsMaxEvery_16u);
+    overlap_walk<Zor32f>(zorsMaxEvery_32f);
+    overlap_walk<Zor64f>(zorsMaxEvery_64f);
+}
+
+TEST_P(MaxEvery, SecondOperandForNaNAndZeroPairs) {
+    const float n1 = vt::f32(0x7fc00011u), n2 = vt::f32(0xffc00022u);
+    const float pairs[][2] = {{n1, 2.0f}, {2.0f, n2}, {0.0f, -0.0f}, {-0.0f, 0.0f}, {n1, n2}};
+    for (int len : {3, 8, 16, 37, 64}) {
+        std::vector<float> a(len), b(len), d(len);
+        std::vector<double> a64(len), b64(len), d64(len);
+        for (int i = 0; i < len; ++i) a[i] = a64[i] = pairs[i % 5][0], b[i] = b64[i] = pairs[i % 5][1];
+        ASSERT_EQ(zorsMaxEvery_32f(a.data(), b.data(), d.data(), len), zorStsNoErr);
+        ASSERT_EQ(zorsMaxEvery_64f(a64.data(), b64.data(), d64.data(), len), zorStsNoErr);
+        for (int i = 0; i < len; ++i) {
+            EXPECT_EQ(vt::bits(d[i]), vt::bits(b[i])) << "len " << len << " i " << i;
+            EXPECT_EQ(vt::bits(d64[i]), vt::bits(b64[i])) << "len " << len << " i " << i;
+        }
+    }
+}
+
+// ---- reversal ---------------------------------------------------------------------
+
+// Elements are distinct byte patterns, compared as bytes; equal pointers
+// reverse in place.
+template <typename T> void flip_sweep(ZorStatus (*fn)(const T*, T*, int32_t)) {
+    std::vector<std::vector<uint8_t>> d(1, std::vector<uint8_t>(8200 * sizeof(T)));
+    for (size_t i = 0; i < d[0].size(); ++i) d[0][i] = (uint8_t)(i * 7 + i / 251);
+    for (bool inplace : {false, true})
+        sweep<uint8_t>(d, inplace, sizeof(T), true,
+                       [&](const uint8_t* const* s, uint8_t* o, int32_t n) { return fn((const T*)s[0], (T*)o, n); },
+                       [&](size_t i, int len) { return d[0][(len - 1 - i / sizeof(T)) * sizeof(T) + i % sizeof(T)]; });
+}
+
+TEST_P(Flip, EveryTypeOutOfPlaceAndInPlace) {
+    flip_sweep<Zor32f>(zorsFlip_32f);
+    flip_sweep<Zor32fc>(zorsFlip_32fc);
+    flip_sweep<Zor64f>(zorsFlip_64f);
+    flip_sweep<Zor64fc>(zorsFlip_64fc);
+}
+
+// ---- checks in their order ----------------------------------------------------------
+
+TEST_P(Checks, PointersThenLength) {
+    float f[4] = {1, 2, 3, 4};
+    double d[4] = {1, 2, 3, 4};
+    Zor32fc c[2] = {{1, 2}, {3, 4}};
+    Zor64fc z[2] = {{1, 2}, {3, 4}};
+    Zor8u b[4] = {1, 2, 3, 4};
+    Zor16u h[4] = {1, 2, 3, 4};
+    const float* nf = nullptr;
+    const ZorStatus N = zorStsNullPtrErr, S = zorStsSizeErr;
+    const struct {
+        ZorStatus got, want;
+        int line;
+    } cases[] = {
+        {zorsAdd_32f(nf, f, f, 0), N, __LINE__},         {zorsAdd_32f(f, f, nullptr, 4), N, __LINE__},
+        {zorsAdd_32f(f, f, f, 0), S, __LINE__},          {zorsAdd_32f(f, f, f, -3), S, __LINE__},
+        {zorsAdd_64f(d, nullptr, d, -1), N, __LINE__},   {zorsAdd_32f_I(nullptr, f, 0), N, __LINE__},
+        {zorsAdd_64f_I(d, d, 0), S, __LINE__},           {zorsMul_32f(f, nullptr, f, 0), N, __LINE__},
+        {zorsMul_32f_I(f, f, -1), S, __LINE__},          {zorsMulC_32f(nf, f, 0, 1.0f), N, __LINE__},
+        {zorsMulC_32f(f, f, 0, 1.0f), S, __LINE__},      {zorsMulC_32f(f, f, 0, 0.0f), S, __LINE__},
+        {zorsMulC_64f(d, nullptr, 1, 0.0), N, __LINE__}, {zorsMulC_32f_I(nullptr, 0, 1.0f), N, __LINE__},
+        {zorsMulC_32f_I(f, 0, 1.0f), S, __LINE__},       {zorsMulC_32fc(c, nullptr, 0, c[0]), N, __LINE__},
+        {zorsMulC_64fc(z, z, 0, z[0]), S, __LINE__},     {zorsSubC_32f(f, nullptr, 0, 0.0f), N, __LINE__},
+        {zorsSubC_32f(f, f, -2, 0.0f), S, __LINE__},     {zorsSqr_32f_I(nullptr, -1), N, __LINE__},
+        {zorsSqr_32f_I(f, 0), S, __LINE__},
+        // Complex sums: the length first, then the real form over 2 * len
+        // (32 bits: from 0x40000000 on it wraps negative), pointers there.
+        {zorsAdd_32fc(nullptr, nullptr, nullptr, 0), S, __LINE__},
+        {zorsAdd_64fc(nullptr, z, z, -1), S, __LINE__},
+        {zorsAdd_32fc_I(nullptr, nullptr, 0), S, __LINE__},
+        {zorsAdd_32fc(c, nullptr, c, 1), N, __LINE__},
+        {zorsAdd_32fc(nullptr, c, c, 0x3fffffff), N, __LINE__},
+        {zorsAdd_32fc(c, c, c, 0x40000000), S, __LINE__},
+        {zorsAdd_64fc(nullptr, nullptr, nullptr, 0x40000000), N, __LINE__},
+        {zorsAdd_32fc_I(c, c, 0x7fffffff), S, __LINE__},
+        {zorsAdd_64fc_I(z, z, 0x60000000), S, __LINE__},
+        // Flip: equal pointers go to the in-place form and its checks.
+        {zorsFlip_32f(nullptr, nullptr, 0), N, __LINE__}, {zorsFlip_32f(f, f, 0), S, __LINE__},
+        {zorsFlip_64fc(nullptr, nullptr, 5), N, __LINE__}, {zorsFlip_32fc(c, nullptr, 0), N, __LINE__},
+        {zorsFlip_64f(d, d + 1, 0), S, __LINE__},
+        {zorsCopy_32f(nf, f, 0), N, __LINE__},           {zorsCopy_64fc(z, z, 0), S, __LINE__},
+        {zorsCopy_64f(d, nullptr, 3), N, __LINE__},      {zorsCopy_32fc(c, c + 1, -1), S, __LINE__},
+        {zorsMove_32f(f, nullptr, 0), N, __LINE__},      {zorsMove_64fc(z, z, 0), S, __LINE__},
+        {zorsMove_64f(nullptr, d, 2), N, __LINE__},      {zorsMove_32fc(c, c, -7), S, __LINE__},
+        // Maximum: pointers first, then the unsigned length, only 0 refused.
+        {zorsMaxEvery_8u(b, b, nullptr, 0), N, __LINE__}, {zorsMaxEvery_8u(b, b, b, 0), S, __LINE__},
+        {zorsMaxEvery_16u(nullptr, h, h, 4), N, __LINE__}, {zorsMaxEvery_32f(f, f, f, 0), S, __LINE__},
+        {zorsMaxEvery_64f(d, nullptr, d, 0), N, __LINE__},
+    };
+    for (const auto& c : cases) EXPECT_EQ(c.got, c.want) << "case at line " << c.line;
+    // Nothing written by any refused call.
+    EXPECT_TRUE(f[0] == 1 && f[3] == 4 && d[3] == 4 && c[1].im == 4 && z[1].im == 4 && b[3] == 4 && h[3] == 4);
+}
+
+ZOR_INSTANTIATE_LEVELS(Arith);
+ZOR_INSTANTIATE_LEVELS(MaxEvery);
+ZOR_INSTANTIATE_LEVELS(Flip);
+ZOR_INSTANTIATE_LEVELS(Checks);
+
+}  // namespace

@@ -1,0 +1,185 @@
+// Helpers of the element-wise vector tests: guarded buffers compared whole,
+// bit-level views of floats, and the sets of lengths and values.
+#ifndef ZOR_TEST_VECTOR_SUPPORT_H
+#define ZOR_TEST_VECTOR_SUPPORT_H
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+#include <limits>
+#include <random>
+#include <string>
+#include <type_traits>
+#include <vector>
+
+#include "zortypes.h"
+
+namespace vt {
+
+// A region of `bytes` at 64 + `misalign` bytes past an `align`-byte
+// boundary, inside random guard bytes. Copy raw to form the expected image of the whole
+// buffer, apply the model to the copy at the same offset, compare whole.
+struct Region {
+    std::vector<uint8_t> raw;
+    size_t offset;
+    size_t bytes;
+
+    Region(size_t n, size_t misalign, uint32_t seed = 1, size_t align = 64)
+        : raw(n + misalign + align + 192), bytes(n) {
+        uint64_t x = 0x9e3779b97f4a7c15ull * (seed + 1);
+        for (size_t i = 0; i < raw.size(); i += 8) {
+            x = x * 6364136223846793005ull + 1442695040888963407ull;
+            const uint64_t w = x ^ (x >> 29);
+            std::memcpy(raw.data() + i, &w, std::min<size_t>(8, raw.size() - i));
+        }
+        const size_t pad = (align - (uintptr_t)raw.data() % align) % align;
+        offset = pad + 64 + misalign;
+    }
+    uint8_t* data() { return raw.data() + offset; }
+    template <typename T> T* as() { return reinterpret_cast<T*>(data()); }
+    uint8_t* in(std::vector<uint8_t>& image) const { return image.data() + offset; }
+};
+
+// Empty when equal; else where the first difference lies.
+inline std::string first_difference(const std::vector<uint8_t>& got, const std::vector<uint8_t>& want,
+                                    size_t origin) {
+    if (got.size() == want.size() && std::memcmp(got.data(), want.data(), got.size()) == 0) return "";
+    for (size_t i = 0; i < got.size(); ++i)
+        if (got[i] != want[i])
+            return "byte " + std::to_string((long long)i - (long long)origin) + " of the region: got " +
+                   std::to_string(got[i]) + ", want " + std::to_string(want[i]);
+    return "";
+}
+
+#define EXPECT_IMAGE(region, image) \
+    EXPECT_EQ(vt::first_difference((region).raw, (image), (region).offset), "")
+#define ASSERT_IMAGE(region, image) \
+    ASSERT_EQ(vt::first_difference((region).raw, (image), (region).offset), "")
+
+// Element access at any byte address.
+template <typename T> inline T get(const void* p, size_t i) {
+    T x;
+    std::memcpy(&x, static_cast<const uint8_t*>(p) + i * sizeof(T), sizeof(T));
+    return x;
+}
+template <typename T> inline void put(void* p, size_t i, T x) {
+    std::memcpy(static_cast<uint8_t*>(p) + i * sizeof(T), &x, sizeof(T));
+}
+
+inline uint32_t bits(float x) {
+    uint32_t u;
+    std::memcpy(&u, &x, 4);
+    return u;
+}
+inline uint64_t bits(double x) {
+    uint64_t u;
+    std::memcpy(&u, &x, 8);
+    return u;
+}
+inline float f32(uint32_t u) {
+    float x;
+    std::memcpy(&x, &u, 4);
+    return x;
+}
+inline double f64(uint64_t u) {
+    double x;
+    std::memcpy(&x, &u, 8);
+    return x;
+}
+
+// Equal bits, or both NaN: where two NaNs meet, which payload survives is
+// the processor's choice of operand order, not ours.
+template <typename T> inline bool same(T a, T b) {
+    return bits(a) == bits(b) || (std::isnan(a) && std::isnan(b));
+}
+
+// 0..70, and each power of two from 2^7 to 2^13 with its neighbours.
+inline std::vector<int> lengths() {
+    std::vector<int> v;
+    for (int n = 0; n <= 70; ++n) v.push_back(n);
+    for (int k = 7; k <= 13; ++k)
+        for (int d = -1; d <= 1; ++d) v.push_back((1 << k) + d);
+    return v;
+}
+
+// Ordinary values of mixed sign and magnitude with the special ones
+// sprinkled in: quiet and signalling NaNs with payloads, zeros of both
+// signs, infinities, denormals, the extremes.
+template <typename T> inline std::vector<T> values(size_t n, uint32_t seed) {
+    std::mt19937_64 gen(seed);
+    std::uniform_real_distribution<T> mant(-2, 2);
+    std::uniform_int_distribution<int> expo(-30, 30);
+    const T inf = std::numeric_limits<T>::infinity();
+    T specials[] = {T(0), -T(0), inf, -inf, std::numeric_limits<T>::quiet_NaN(),
+                    -std::numeric_limits<T>::quiet_NaN(), std::numeric_limits<T>::signaling_NaN(),
+                    std::numeric_limits<T>::denorm_min(), -std::numeric_limits<T>::denorm_min() * 77,
+                    std::numeric_limits<T>::max(), -std::numeric_limits<T>::min(), T(1), T(-1)};
+    if (sizeof(T) == 4) specials[4] = (T)f32(0x7fc12345u), specials[6] = (T)f32(0x7f812345u);
+    std::vector<T> v(n);
+    for (size_t i = 0; i < n; ++i) {
+        if (gen() % 7 == 0)
+            v[i] = specials[gen() % (sizeof specials / sizeof specials[0])];
+        else
+            v[i] = std::ldexp(mant(gen), expo(gen));
+    }
+    return v;
+}
+
+// Guards bytewise; the values in the region bit for bit, or, when not
+// exact, with any NaN matching any NaN.
+template <typename T>
+::testing::AssertionResult matches(const Region& r, const std::vector<uint8_t>& want, size_t count, bool exact) {
+    const size_t end = r.offset + count * sizeof(T);
+    for (size_t i = 0; i < r.raw.size(); ++i)
+        if ((i < r.offset || i >= end) && r.raw[i] != want[i])
+            return ::testing::AssertionFailure() << "guard byte " << (long long)i - (long long)r.offset;
+    for (size_t i = 0; i < count; ++i) {
+        const T g = get<T>(r.raw.data() + r.offset, i), w = get<T>(want.data() + r.offset, i);
+        bool equal = std::memcmp(&g, &w, sizeof(T)) == 0;
+        if constexpr (std::is_floating_point_v<T>) equal = equal || (!exact && same(g, w));
+        if (!equal)
+            return ::testing::AssertionFailure() << "value " << i << ": got " << +g << ", want " << +w;
+    }
+    return ::testing::AssertionSuccess();
+}
+
+// Every length and every placement of source and destination: aligned,
+// one element off, 12 bytes off, one byte off. data holds one vector
+// per source; elements are `unit` values each (2 for complex). In place,
+// the destination starts as source 0 and stands for it. call(sources,
+// destination, len) returns the status; model(i) or model(i, len) is
+// value i of the result.
+template <typename T, typename Call, typename Model>
+void sweep(const std::vector<std::vector<T>>& data, bool inplace, int unit, bool exact, Call call, Model model) {
+    const size_t places[] = {0, unit * sizeof(T), 12, 1};
+    for (size_t ps : places)
+        for (size_t pd : places)
+            for (int len : lengths()) {
+                const size_t count = (size_t)len * unit;
+                std::vector<Region> in;
+                for (size_t k = 0; k < data.size(); ++k) in.emplace_back(count * sizeof(T), (ps + 5 * k * pd) % 16, 10 + k);
+                Region out(count * sizeof(T), pd, 20);
+                const T* src[3] = {};
+                for (size_t k = 0; k < data.size(); ++k) {
+                    Region& r = inplace && k == 0 ? out : in[k];
+                    for (size_t i = 0; i < count; ++i) put<T>(r.data(), i, data[k][i]);
+                    src[k] = r.as<T>();
+                }
+                auto want = out.raw;
+                for (size_t i = 0; i < count; ++i) {
+                    if constexpr (std::is_invocable_v<Model, size_t, int>)
+                        put<T>(out.in(want), i, model(i, len));
+                    else
+                        put<T>(out.in(want), i, model(i));
+                }
+                ASSERT_EQ(call(src, out.as<T>(), len), len ? zorStsNoErr : zorStsSizeErr);
+                ASSERT_TRUE(matches<T>(out, want, count, exact)) << "len " << len << " at " << ps << ", " << pd;
+            }
+}
+
+}  // namespace vt
+
+#endif
