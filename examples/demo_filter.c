@@ -1,0 +1,7 @@
+/* Linear filtering on every level. */
+#include <stdio.h>
+
+#include "zor.h"
+#include "demo.h"
+
+void demo_filter(void) {}
