@@ -50,8 +50,9 @@ typedef struct ZoriFilterBorderSpec ZoriFilterBorderSpec;
  * zor8u, zor16u, zor16s, zor32f (data) with zor16s or zor32f (taps), or
  * zor64f for both with one channel. Records made by
  * zoriFilterBorderInit_32f have float taps: size them with kernelType
- * zor32f (16-bit taps are answered as float taps wherever such taps can't
- * serve, as for 16u or 32f data).
+ * zor32f. 16-bit taps are answered as float taps for 16u data and for 16s
+ * data with 3 or 4 channels, a kernel 1 wide or 1 high, or one channel and
+ * a kernel under 3 wide; 32f data with 16-bit taps gets no work area.
  * Checks, in this order:
  *   zorStsSizeErr (-6)          a side of kernelSize or dstRoiSize below 1
  *   zorStsDataTypeErr (-59)     a type outside the sets above

@@ -63,6 +63,7 @@ big kernel_x(int32_t kernelType, int32_t dataType, int32_t c, int32_t kw, int32_
         default: return 0;
         }
     }
+    if (dataType == zor32f) return 0;
     if (dataType == zor16s) {
         switch (c) {
         case 1: return ((8 * S + W + 3) >> 2) * 16;
@@ -323,10 +324,11 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriFilterBorderGetSize)(ZoriSize kernelSize, ZoriS
     if (numChannels < 1 || numChannels > 4) return zorStsChannelErr;
     if (!pSpecSize || !pBufferSize) return zorStsNullPtrErr;
     int32_t kt = kernelType;
-    // 16-bit taps exist only for 8u and some 16s data; every other case is
-    // answered as float taps (as is 32f data, the one record made here).
+    // 16-bit taps are answered as float taps for 16u data and for the 16s
+    // shapes that have no 16-bit-tap kernel. 32f data keeps the 16-bit
+    // answer, which has no kernel work area.
     if (kt == zor16s &&
-        (dataType == zor16u || dataType == zor32f ||
+        (dataType == zor16u ||
          (dataType == zor16s && (numChannels == 3 || numChannels == 4 || kw == 1 || kh == 1 ||
                                  (numChannels == 1 && kw < 3)))))
         kt = zor32f;
@@ -388,9 +390,8 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriFilterBorderInit_32f)(const Zor32f* pKernel, Zo
     // Four copies of each tap in the caller's order (the 16-bit data
     // takes them in pairs along a kernel row, which lands on the same
     // places); 16s taps are scaled by 2^-16 for pixels in the upper half
-    // of a 32-bit lane. 32f data gets the plain copies, which the 32f
-    // kernel of n0 and k0 reads.
-    if (numChannels != 2) {
+    // of a 32-bit lane. The 32f kernels read the reversed taps: no table.
+    if (numChannels != 2 && dataType != zor32f) {
         const float scale = dataType == zor16s ? 1.0f / 65536.0f : 1.0f;
         for (int32_t j = 0; j < kh; ++j) {
             for (int32_t i = 0; i < kw; ++i) {

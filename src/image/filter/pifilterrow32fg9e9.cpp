@@ -77,19 +77,25 @@ inline vf vpix(const Zor16s* p) {
 }
 #endif
 
+// Saturated and rounded to nearest, ties to even, whatever the caller's
+// rounding control says.
+inline __m256i vnear(vf v, float lo, float hi) {
+    return _mm256_cvttps_epi32(
+        _mm256_round_ps(vclamp(v, lo, hi), _MM_FROUND_TO_NEAREST_INT | _MM_FROUND_NO_EXC));
+}
 inline void vput(Zor8u* p, vf v) {
-    const __m256i i = _mm256_cvtps_epi32(vclamp(v, 0.0f, 255.0f));
+    const __m256i i = vnear(v, 0.0f, 255.0f);
     const __m128i w =
         _mm_packus_epi32(_mm256_castsi256_si128(i), _mm256_extractf128_si256(i, 1));
     _mm_storel_epi64((__m128i*)p, _mm_packus_epi16(w, w));
 }
 inline void vput(Zor16u* p, vf v) {
-    const __m256i i = _mm256_cvtps_epi32(vclamp(v, 0.0f, 65535.0f));
+    const __m256i i = vnear(v, 0.0f, 65535.0f);
     _mm_storeu_si128((__m128i*)p,
                      _mm_packus_epi32(_mm256_castsi256_si128(i), _mm256_extractf128_si256(i, 1)));
 }
 inline void vput(Zor16s* p, vf v) {
-    const __m256i i = _mm256_cvtps_epi32(vclamp(v, -32768.0f, 32767.0f));
+    const __m256i i = vnear(v, -32768.0f, 32767.0f);
     _mm_storeu_si128((__m128i*)p,
                      _mm_packs_epi32(_mm256_castsi256_si128(i), _mm256_extractf128_si256(i, 1)));
 }
@@ -133,6 +139,13 @@ inline vf vfma(vf a, vf b, vf c) { return _mm512_fmadd_ps(a, b, c); }
 
 inline __mmask16 lanes(int32_t n) { return (__mmask16)((1u << n) - 1u); }
 
+// Saturated and rounded to nearest, ties to even, whatever the caller's
+// rounding control says.
+inline __m512i vnear(vf v, float lo, float hi) {
+    return _mm512_cvt_roundps_epi32(vclamp(v, lo, hi),
+                                    _MM_FROUND_TO_NEAREST_INT | _MM_FROUND_NO_EXC);
+}
+
 inline vf vpix(const Zor8u* p) {
     return _mm512_cvtepi32_ps(_mm512_cvtepu8_epi32(_mm_loadu_si128((const __m128i*)p)));
 }
@@ -146,15 +159,15 @@ inline vf vpix(const Zor16s* p) {
 
 inline void vput(Zor8u* p, vf v) {
     _mm_storeu_si128((__m128i*)p,
-                     _mm512_cvtusepi32_epi8(_mm512_cvtps_epi32(vclamp(v, 0.0f, 255.0f))));
+                     _mm512_cvtusepi32_epi8(vnear(v, 0.0f, 255.0f)));
 }
 inline void vput(Zor16u* p, vf v) {
     _mm256_storeu_si256((__m256i*)p,
-                        _mm512_cvtusepi32_epi16(_mm512_cvtps_epi32(vclamp(v, 0.0f, 65535.0f))));
+                        _mm512_cvtusepi32_epi16(vnear(v, 0.0f, 65535.0f)));
 }
 inline void vput(Zor16s* p, vf v) {
     _mm256_storeu_si256(
-        (__m256i*)p, _mm512_cvtsepi32_epi16(_mm512_cvtps_epi32(vclamp(v, -32768.0f, 32767.0f))));
+        (__m256i*)p, _mm512_cvtsepi32_epi16(vnear(v, -32768.0f, 32767.0f)));
 }
 
 // Byte and word loads under a mask need BW, which n0 lacks: stage them.
@@ -164,15 +177,15 @@ template <typename T> inline vf vpix_n(const T* p, int32_t n) {
     return vpix(b);
 }
 inline void vput_n(Zor8u* p, vf v, int32_t n) {
-    _mm512_mask_cvtusepi32_storeu_epi8(p, lanes(n), _mm512_cvtps_epi32(vclamp(v, 0.0f, 255.0f)));
+    _mm512_mask_cvtusepi32_storeu_epi8(p, lanes(n), vnear(v, 0.0f, 255.0f));
 }
 inline void vput_n(Zor16u* p, vf v, int32_t n) {
     _mm512_mask_cvtusepi32_storeu_epi16(p, lanes(n),
-                                        _mm512_cvtps_epi32(vclamp(v, 0.0f, 65535.0f)));
+                                        vnear(v, 0.0f, 65535.0f));
 }
 inline void vput_n(Zor16s* p, vf v, int32_t n) {
     _mm512_mask_cvtsepi32_storeu_epi16(p, lanes(n),
-                                       _mm512_cvtps_epi32(vclamp(v, -32768.0f, 32767.0f)));
+                                       vnear(v, -32768.0f, 32767.0f));
 }
 inline vf vload_n(const float* p, int32_t n) { return _mm512_maskz_loadu_ps(lanes(n), p); }
 inline void vstore_n(float* p, vf v, int32_t n) { _mm512_mask_storeu_ps(p, lanes(n), v); }
@@ -197,12 +210,10 @@ template <int S> struct Walk {
     Walk from(int32_t k) const { return Walk{base + (ptrdiff_t)k * S}; }
 };
 typedef Walk<-1> Reversed;
-typedef Walk<4> Table;
 
 inline Reversed reversed_taps(const Spec& s) {
     return Reversed{s.pTaps + s.kernelWidth * s.kernelHeight - 1};
 }
-inline Table table_taps(const Spec& s) { return Table{s.pBroadcastTaps}; }
 
 template <typename T> struct TapsOf {
     typedef Reversed type;
@@ -213,12 +224,9 @@ template <> struct TapsOf<Zor16s> {
     static type get(const Spec& s) { return type{kScaled16s ? s.pBroadcastTaps : reversed_taps(s).base}; }
 };
 
-// n0 and k0 take the 32f taps from the record's broadcast table, e9 and
-// l9 from the reversed store.
-typedef Walk<kMasked ? 4 : -1> Taps32f;
-inline Taps32f taps_32f(const Spec& s) {
-    return Taps32f{kMasked ? s.pBroadcastTaps : reversed_taps(s).base};
-}
+// 32f records carry no broadcast table: every level reads the reversed store.
+typedef Reversed Taps32f;
+inline Taps32f taps_32f(const Spec& s) { return reversed_taps(s); }
 
 inline float pix1(Zor8u v) { return (float)v; }
 inline float pix1(Zor16u v) { return (float)v; }

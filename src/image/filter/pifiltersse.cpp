@@ -69,52 +69,19 @@ inline void to_float(const Zor16s* p, float* out, int32_t n) {
 
 // ---- line to pixels ------------------------------------------------------------
 
-// TEMPORARY: local stand-ins, so that this file needs nothing that is not
-// on main yet. Once the vector layer's row conversions (32f to 8u, 16u,
-// 16s with mode 1, scale 0) and in-place constant addition land, these
-// become calls of ZOR_NAME(zorsConvert_32f8u_Sfs) and kin and of
-// ZOR_NAME(zorsAddC_32f_I).
-// Saturate in float, then convert in the rounding mode in force (nearest).
-inline __m128i near_i32(const float* p, float lo, float hi) {
-    const __m128 v = _mm_min_ps(_mm_max_ps(_mm_loadu_ps(p), _mm_set1_ps(lo)), _mm_set1_ps(hi));
-    return _mm_cvtps_epi32(v);
+// Bias (zero in every record made here: the call returns at once) and the
+// always-nearest conversion of the finished line.
+inline void to_pixels(float* line, Zor8u* out, int32_t w, float bias) {
+    ZOR_NAME(zorsAddC_32f_I)(line, w, bias);
+    ZOR_NAME(zorsConvert_32f8u_Sfs)(line, out, w, 1, 0);
 }
-template <typename T> inline T near1(float v, float lo, float hi) {
-    return v >= hi ? (T)hi : v <= lo ? (T)lo : v != v ? (T)0 : (T)_mm_cvtss_si32(_mm_set_ss(v));
+inline void to_pixels(float* line, Zor16u* out, int32_t w, float bias) {
+    ZOR_NAME(zorsAddC_32f_I)(line, w, bias);
+    ZOR_NAME(zorsConvert_32f16u_Sfs)(line, out, w, 1, 0);
 }
-inline void to_pixels(const float* line, Zor8u* out, int32_t w) {
-    int32_t i = 0;
-    for (; i + 16 <= w; i += 16) {
-        const __m128i a = _mm_packs_epi32(near_i32(line + i, 0.0f, 255.0f),
-                                          near_i32(line + i + 4, 0.0f, 255.0f));
-        const __m128i b = _mm_packs_epi32(near_i32(line + i + 8, 0.0f, 255.0f),
-                                          near_i32(line + i + 12, 0.0f, 255.0f));
-        _mm_storeu_si128((__m128i*)(out + i), _mm_packus_epi16(a, b));
-    }
-    for (; i < w; ++i) out[i] = near1<Zor8u>(line[i], 0.0f, 255.0f);
-}
-inline void to_pixels(const float* line, Zor16u* out, int32_t w) {
-    // No unsigned 32-to-16 pack before SSE4.1: shift into the signed range.
-    const __m128i bias32 = _mm_set1_epi32(32768);
-    const __m128i bias16 = _mm_set1_epi16((short)0x8000);
-    int32_t i = 0;
-    for (; i + 8 <= w; i += 8) {
-        const __m128i a = _mm_sub_epi32(near_i32(line + i, 0.0f, 65535.0f), bias32);
-        const __m128i b = _mm_sub_epi32(near_i32(line + i + 4, 0.0f, 65535.0f), bias32);
-        _mm_storeu_si128((__m128i*)(out + i), _mm_xor_si128(_mm_packs_epi32(a, b), bias16));
-    }
-    for (; i < w; ++i) out[i] = near1<Zor16u>(line[i], 0.0f, 65535.0f);
-}
-inline void to_pixels(const float* line, Zor16s* out, int32_t w) {
-    int32_t i = 0;
-    for (; i + 8 <= w; i += 8)
-        _mm_storeu_si128((__m128i*)(out + i),
-                         _mm_packs_epi32(near_i32(line + i, -32768.0f, 32767.0f),
-                                         near_i32(line + i + 4, -32768.0f, 32767.0f)));
-    for (; i < w; ++i) out[i] = near1<Zor16s>(line[i], -32768.0f, 32767.0f);
-}
-inline void add_bias(float* line, int32_t w, float bias) {
-    for (int32_t i = 0; i < w; ++i) line[i] += bias;
+inline void to_pixels(float* line, Zor16s* out, int32_t w, float bias) {
+    ZOR_NAME(zorsAddC_32f_I)(line, w, bias);
+    ZOR_NAME(zorsConvert_32f16s_Sfs)(line, out, w, 1, 0);
 }
 
 // ---- the line passes -------------------------------------------------------------
@@ -168,12 +135,6 @@ void pass2(const float* in, float* l0, const float* t0, float* l1, const float* 
 }
 
 template <typename T>
-void finish(float* line, T* out, int32_t w, float bias) {
-    if (bias != 0.0f) add_bias(line, w, bias);
-    to_pixels(line, out, w);
-}
-
-template <typename T>
 void rowacc_t(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
               const Spec& s, float* work) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
@@ -202,8 +163,8 @@ void rowacc_t(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w,
             else
                 pass2<false, false>(in, l0, taps_row(s, r), l1, taps_row(s, r - 1), w, kw);
         }
-        finish(l0, row_at(dst, dstStep, y), w, bias);
-        finish(l1, row_at(dst, dstStep, y + 1), w, bias);
+        to_pixels(l0, row_at(dst, dstStep, y), w, bias);
+        to_pixels(l1, row_at(dst, dstStep, y + 1), w, bias);
     }
     if (y < h) {
         for (int32_t r = 0; r < kh; ++r) {
@@ -213,7 +174,7 @@ void rowacc_t(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w,
             else
                 pass1<false>(in, l0, taps_row(s, r), w, kw);
         }
-        finish(l0, row_at(dst, dstStep, y), w, bias);
+        to_pixels(l0, row_at(dst, dstStep, y), w, bias);
     }
 }
 
