@@ -93,63 +93,25 @@ big kernel_x(int32_t kernelType, int32_t dataType, int32_t c, int32_t kw, int32_
 
 inline big round64(big x) { return (x + 63) & ~(big)63; }
 
-template <typename T> struct Frames;
-template <> struct Frames<Zor8u> {
-    static void repl(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyReplicateBorder_8u_C1R)(s, ss, sr, d, ds, dr, top, left);
+// The three frame copies per element type, as overloads.
+#define ZOR_FILTER_FRAMES(T, t)                                                                 \
+    inline void repl(const T* s, int32_t ss, ZoriSize sr, T* d, int32_t ds, ZoriSize dr,       \
+                     int32_t top, int32_t left) {                                               \
+        ZOR_NAME(zoriCopyReplicateBorder_##t##_C1R)(s, ss, sr, d, ds, dr, top, left);           \
+    }                                                                                           \
+    inline void mirr(const T* s, int32_t ss, ZoriSize sr, T* d, int32_t ds, ZoriSize dr,       \
+                     int32_t top, int32_t left) {                                               \
+        ZOR_NAME(zoriCopyMirrorBorder_##t##_C1R)(s, ss, sr, d, ds, dr, top, left);              \
+    }                                                                                           \
+    inline void cnst(const T* s, int32_t ss, ZoriSize sr, T* d, int32_t ds, ZoriSize dr,       \
+                     int32_t top, int32_t left, T v) {                                          \
+        ZOR_NAME(zoriCopyConstBorder_##t##_C1R)(s, ss, sr, d, ds, dr, top, left, v);            \
     }
-    static void mirr(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyMirrorBorder_8u_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void cnst(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left, Zor8u v) {
-        ZOR_NAME(zoriCopyConstBorder_8u_C1R)(s, ss, sr, d, ds, dr, top, left, v);
-    }
-};
-template <> struct Frames<Zor16u> {
-    static void repl(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyReplicateBorder_16u_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void mirr(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyMirrorBorder_16u_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void cnst(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left, Zor16u v) {
-        ZOR_NAME(zoriCopyConstBorder_16u_C1R)(s, ss, sr, d, ds, dr, top, left, v);
-    }
-};
-template <> struct Frames<Zor16s> {
-    static void repl(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyReplicateBorder_16s_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void mirr(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyMirrorBorder_16s_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void cnst(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left, Zor16s v) {
-        ZOR_NAME(zoriCopyConstBorder_16s_C1R)(s, ss, sr, d, ds, dr, top, left, v);
-    }
-};
-template <> struct Frames<Zor32f> {
-    static void repl(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyReplicateBorder_32f_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void mirr(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyMirrorBorder_32f_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void cnst(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left, Zor32f v) {
-        ZOR_NAME(zoriCopyConstBorder_32f_C1R)(s, ss, sr, d, ds, dr, top, left, v);
-    }
-};
+ZOR_FILTER_FRAMES(Zor8u, 8u)
+ZOR_FILTER_FRAMES(Zor16u, 16u)
+ZOR_FILTER_FRAMES(Zor16s, 16s)
+ZOR_FILTER_FRAMES(Zor32f, 32f)
+#undef ZOR_FILTER_FRAMES
 
 // One framed temporary: a source rectangle at the temporary's (left, top),
 // the rest made up by the border kind. Rows of the temporary are exactly
@@ -159,11 +121,11 @@ void make_frame(int32_t kind, const T* src, int32_t srcStep, int32_t sw, int32_t
                 int32_t tw, int32_t th, int32_t top, int32_t left, T value) {
     const int32_t ts = tw * (int32_t)sizeof(T);
     if (kind == zorBorderRepl)
-        Frames<T>::repl(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left);
+        repl(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left);
     else if (kind == zorBorderMirror)
-        Frames<T>::mirr(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left);
+        mirr(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left);
     else
-        Frames<T>::cnst(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left, value);
+        cnst(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left, value);
 }
 
 template <typename T> inline const T* at(const T* p, int32_t step, int32_t dy, int32_t dx) {

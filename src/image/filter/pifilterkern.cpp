@@ -82,34 +82,24 @@ inline float window_sum(const T* src, int32_t srcStep, int32_t x, const Spec& s)
     return sum;
 }
 
-template <typename T>
-void scalar_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
-                const Spec& s) {
+inline void put(Zor8u* o, float v, int32_t mode) { *o = convert<Zor8u>(v, mode); }
+inline void put(Zor16u* o, float v, int32_t mode) { *o = convert<Zor16u>(v, mode); }
+inline void put(Zor16s* o, float v, int32_t mode) { *o = convert<Zor16s>(v, mode); }
+inline void put(Zor32f* o, float v, int32_t) { *o = v; }  // stored as summed
+
+template <typename T, bool kSplit = false>
+void scalar(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
+            const Spec& s) {
     const float bias = bias_of(s);
     const int32_t mode = s.roundMode;
     for (int32_t y = 0; y < h; ++y) {
         const T* in = row_at(src, srcStep, y);
         T* out = row_at(dst, dstStep, y);
         for (int32_t x = 0; x < w; ++x) {
-            float v = window_sum<T, false>(in, srcStep, x, s);
+            float v = window_sum<T, kSplit>(in, srcStep, x, s);
             // Only a non-zero bias is added, so that -0 sums stay as they are.
             if (bias != 0.0f) v += bias;
-            out[x] = convert<T>(v, mode);
-        }
-    }
-}
-
-template <bool kSplit>
-void scalar_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
-                int32_t h, const Spec& s) {
-    const float bias = bias_of(s);
-    for (int32_t y = 0; y < h; ++y) {
-        const Zor32f* in = row_at(src, srcStep, y);
-        Zor32f* out = row_at(dst, dstStep, y);
-        for (int32_t x = 0; x < w; ++x) {
-            float v = window_sum<Zor32f, kSplit>(in, srcStep, x, s);
-            if (bias != 0.0f) v += bias;
-            out[x] = v;
+            put(out + x, v, mode);
         }
     }
 }
@@ -122,7 +112,7 @@ template <typename T>
 inline void run_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
                     const Spec& s, float* work) {
     if (s.kernelWidth <= 2 || w <= 16)
-        scalar_int(src, srcStep, dst, dstStep, w, h, s);
+        scalar(src, srcStep, dst, dstStep, w, h, s);
     else
         rowacc(src, srcStep, dst, dstStep, w, h, s, work);
 }
@@ -130,12 +120,12 @@ inline void run_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int3
 inline void run_flt(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
                     int32_t h, const Spec& s, float*) {
 #if defined(ZOR_LEVEL_m7)
-    scalar_32f<true>(src, srcStep, dst, dstStep, w, h, s);
+    scalar<Zor32f, true>(src, srcStep, dst, dstStep, w, h, s);
 #else
     if (w > s.kernelWidth + 8)
         vec_32f_sse(src, srcStep, dst, dstStep, w, h, s);
     else
-        scalar_32f<false>(src, srcStep, dst, dstStep, w, h, s);
+        scalar(src, srcStep, dst, dstStep, w, h, s);
 #endif
 }
 
@@ -145,7 +135,7 @@ template <typename T>
 inline void run_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
                     const Spec& s, float* work) {
     if (w < 8)
-        scalar_int(src, srcStep, dst, dstStep, w, h, s);
+        scalar(src, srcStep, dst, dstStep, w, h, s);
     else
         vec_avx(src, srcStep, dst, dstStep, w, h, s, work);
 }
@@ -157,7 +147,7 @@ inline void run_flt(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dst
     vec_avx(src, srcStep, dst, dstStep, w, h, s, work);
 #else
     if (w < 8)
-        scalar_32f<false>(src, srcStep, dst, dstStep, w, h, s);
+        scalar(src, srcStep, dst, dstStep, w, h, s);
     else
         vec_avx(src, srcStep, dst, dstStep, w, h, s, work);
 #endif
