@@ -282,24 +282,18 @@ TEST_P(Filter64f, MatchesTheModelBitForBit) {
         }
 }
 
-// Long rows with several full blocks and every remainder.
-TEST_P(Filter64f, LongRowsFoldSixteenSums) {
+// Long rows with several full blocks and every remainder, and ROIs wider
+// than the sweep's with tall and flat kernels.
+TEST_P(Filter64f, LongRowsAndWideRois) {
     std::mt19937 rng(99 + GetParam().index);
     int seed = 0;
-    for (int kw : {17, 23, 47, 48, 49, 64, 65, 70})
-        for (int width : {1, 2, 3, 7, 16, 33}) {
+    for (int kw : {23, 48, 49, 70})
+        for (int width : {1, 3, 16, 33}) {
             ++seed;
             ASSERT_NO_FATAL_FAILURE(check_case(vary(kw, 1, width, 2, seed), rng));
         }
-}
-
-TEST_P(Filter64f, ImageSizedCasesAndTallKernels) {
-    std::mt19937 rng(5 + GetParam().index);
-    const Case cases[] = {
-        vary(5, 5, 123, 17, 4), vary(3, 3, 257, 5, 1), vary(1, 15, 100, 6, 2),
-        vary(11, 9, 77, 7, 3),  vary(2, 13, 65, 3, 0), vary(14, 2, 90, 4, 2),
-        vary(1, 1, 71, 3, 1),
-    };
+    const Case cases[] = {vary(5, 5, 123, 17, 4), vary(1, 15, 100, 6, 2), vary(11, 9, 77, 7, 3),
+                          vary(2, 13, 65, 3, 0), vary(14, 2, 90, 4, 2)};
     for (const Case& c : cases) ASSERT_NO_FATAL_FAILURE(check_case(c, rng));
 }
 
