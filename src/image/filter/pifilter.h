@@ -24,7 +24,7 @@ struct Spec {
     uint32_t bias[2];       // word 0: float added to each sum (zero from Init)
     int16_t* pIntTaps;      // integer-tap path only
     float* pTaps;           // reversed taps, head + 128
-    float* pBroadcastTaps;  // four copies of each tap, caller's order
+    float* pBroadcastTaps;  // four copies of each tap, caller's order (not for 32f)
     int32_t numChannels;
     uint8_t reserved[128 - 68];
 };

@@ -1,10 +1,10 @@
 // Vector kernels of the general filter on the AVX levels (e9, l9, n0, k0).
 //
 // Integer pixels go through float rows in the kernel work area: for each
-// output row, every source row under the kernel is converted once into a
-// float row, its kernel row is applied tap by tap to a float line (the
-// first kernel row sets the line, later ones add), and the last kernel row
-// converts the line to nearest with saturation. Kernels one tap wide sum
+// pair of output rows, every source row under them is converted once into
+// a float row and applied tap by tap to both float lines with its kernel
+// row for each (the first kernel row sets a line, later ones add); the
+// last kernel row converts the line to nearest with saturation. Kernels one tap wide sum
 // straight from the pixels and need no work area. 32f pixels are summed
 // in registers over all taps and stored as they are. l9 and above use
 // fused multiply-add, so their last bit may differ from e9.
@@ -225,8 +225,6 @@ template <> struct TapsOf<Zor16s> {
 };
 
 // 32f records carry no broadcast table: every level reads the reversed store.
-typedef Reversed Taps32f;
-inline Taps32f taps_32f(const Spec& s) { return reversed_taps(s); }
 
 inline float pix1(Zor8u v) { return (float)v; }
 inline float pix1(Zor16u v) { return (float)v; }
@@ -408,7 +406,7 @@ void filter_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t 
 // the block lies over this source row.
 template <int R, int N, bool kAll>
 __attribute__((always_inline)) inline void source_row(const Zor32f* p, vf (&a)[R][N], const bool (&live)[R],
-                       const Taps32f (&rowTaps)[R], int32_t kw) {
+                       const Reversed (&rowTaps)[R], int32_t kw) {
     for (int32_t i = 0; i < kw; ++i) {
         vf v[N];
 #pragma GCC unroll 16
@@ -430,7 +428,7 @@ __attribute__((always_inline)) inline void source_row(const Zor32f* p, vf (&a)[R
 // source vector loaded serves each of the R rows it lies under.
 template <int R, int N>
 inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep,
-                      Taps32f c, int32_t kw, int32_t kh, int32_t x) {
+                      Reversed c, int32_t kw, int32_t kh, int32_t x) {
     vf a[R][N];
 #pragma GCC unroll 4
     for (int q = 0; q < R; ++q)
@@ -440,7 +438,7 @@ inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t d
         const Zor32f* p = row_at(src, srcStep, r) + x;
         // Output row q takes this source row with kernel row r - q.
         bool live[R];
-        Taps32f rowTaps[R];
+        Reversed rowTaps[R];
 #pragma GCC unroll 4
         for (int q = 0; q < R; ++q) {
             live[q] = r - q >= 0 && r - q < kh;
@@ -463,12 +461,12 @@ inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t d
 }
 
 // The last n < VL outputs of one row (n0, k0).
-inline void tail_32f(const Zor32f* src, int32_t srcStep, Zor32f* out, Taps32f c,
+inline void tail_32f(const Zor32f* src, int32_t srcStep, Zor32f* out, Reversed c,
                      int32_t kw, int32_t kh, int32_t x, int32_t n) {
     vf a = vzero();
     for (int32_t j = 0; j < kh; ++j) {
         const Zor32f* p = row_at(src, srcStep, j) + x;
-        const Taps32f cj = c.from(j * kw);
+        const Reversed cj = c.from(j * kw);
         for (int32_t i = 0; i < kw; ++i) a = vfma(vset(cj[i]), vload_n(p + i, n), a);
     }
     vstore_n(out + x, a, n);
@@ -477,7 +475,7 @@ inline void tail_32f(const Zor32f* src, int32_t srcStep, Zor32f* out, Taps32f c,
 // R rows of output.
 template <int R, int N>
 void rows_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
-              Taps32f c, int32_t kw, int32_t kh) {
+              Reversed c, int32_t kw, int32_t kh) {
     int32_t x = 0;
     for (; x + N * VL <= w; x += N * VL)
         block_32f<R, N>(src, srcStep, dst, dstStep, c, kw, kh, x);
@@ -510,7 +508,7 @@ constexpr int kRows32f = 2, kCols32f = 4;  // 8 of the 16
 void filter_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
                 int32_t h, const Spec& s) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
-    const Taps32f c = taps_32f(s);
+    const Reversed c = reversed_taps(s);
     int32_t y = 0;
     for (; y + kRows32f <= h; y += kRows32f)
         rows_32f<kRows32f, kCols32f>(row_at(src, srcStep, y), srcStep, row_at(dst, dstStep, y),
