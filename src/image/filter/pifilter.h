@@ -78,8 +78,8 @@ void rowacc(const Zor16s* src, int32_t srcStep, Zor16s* dst, int32_t dstStep, in
 void vec_32f_sse(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
                  int32_t h, const Spec& s);
 
-// AVX levels (pifilterrow32fg9e9.cpp): row (kh == 1), column (kw == 1) and
-// two-dimensional kernels; integers convert to nearest.
+// AVX levels (pifilterrow32fg9e9.cpp): sums in registers or through float
+// lines; integers convert to nearest.
 void vec_avx(const Zor8u* src, int32_t srcStep, Zor8u* dst, int32_t dstStep, int32_t w, int32_t h,
              const Spec& s, float* work);
 void vec_avx(const Zor16u* src, int32_t srcStep, Zor16u* dst, int32_t dstStep, int32_t w,

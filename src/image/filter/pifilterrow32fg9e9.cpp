@@ -1,13 +1,14 @@
 // Vector kernels of the general filter on the AVX levels (e9, l9, n0, k0).
 //
-// Integer pixels go through float rows in the kernel work area: for each
-// pair of output rows, every source row under them is converted once into
-// a float row and applied tap by tap to both float lines with its kernel
-// row for each (the first kernel row sets a line, later ones add); the
-// last kernel row converts the line to nearest with saturation. Kernels one tap wide sum
-// straight from the pixels and need no work area. 32f pixels are summed
-// in registers over all taps and stored as they are. l9 and above use
-// fused multiply-add, so their last bit may differ from e9.
+// Every kernel one tap wide, every 32f kernel, and integer kernels of few
+// taps (any size on l9) keep all sums of a block of outputs in registers:
+// each source vector loaded (and converted, for integer pixels) serves
+// every output row it lies under. Larger integer kernels go through float
+// rows in the kernel work area: for each pair of output rows, every source
+// row under them is converted once and applied tap by tap to both float
+// lines with its kernel row for each (the first kernel row sets a line,
+// later ones add). Integer results round to nearest with saturation. l9
+// and above use fused multiply-add, so their last bit may differ from e9.
 #include "variant.h"
 
 #if defined(ZOR_LEVEL_e9) || defined(ZOR_LEVEL_l9) || defined(ZOR_LEVEL_n0) || \
@@ -132,8 +133,11 @@ inline vf vzero() { return _mm512_setzero_ps(); }
 inline vf vset(float x) { return _mm512_set1_ps(x); }
 inline vf vload(const float* p) { return _mm512_loadu_ps(p); }
 inline void vstore(float* p, vf v) { _mm512_storeu_ps(p, v); }
+// Full-mask forms: the plain ones start from an undefined vector, which
+// GCC 12 reports as uninitialised once they are inlined deep enough.
 inline vf vclamp(vf v, float lo, float hi) {
-    return _mm512_min_ps(_mm512_max_ps(v, _mm512_set1_ps(lo)), _mm512_set1_ps(hi));
+    return _mm512_maskz_min_ps(0xFFFF, _mm512_maskz_max_ps(0xFFFF, v, _mm512_set1_ps(lo)),
+                               _mm512_set1_ps(hi));
 }
 inline vf vfma(vf a, vf b, vf c) { return _mm512_fmadd_ps(a, b, c); }
 
@@ -142,8 +146,8 @@ inline __mmask16 lanes(int32_t n) { return (__mmask16)((1u << n) - 1u); }
 // Saturated and rounded to nearest, ties to even, whatever the caller's
 // rounding control says.
 inline __m512i vnear(vf v, float lo, float hi) {
-    return _mm512_cvt_roundps_epi32(vclamp(v, lo, hi),
-                                    _MM_FROUND_TO_NEAREST_INT | _MM_FROUND_NO_EXC);
+    return _mm512_maskz_cvt_roundps_epi32(0xFFFF, vclamp(v, lo, hi),
+                                          _MM_FROUND_TO_NEAREST_INT | _MM_FROUND_NO_EXC);
 }
 
 inline vf vpix(const Zor8u* p) {
@@ -157,18 +161,13 @@ inline vf vpix(const Zor16s* p) {
         _mm512_slli_epi32(_mm512_cvtepi16_epi32(_mm256_loadu_si256((const __m256i*)p)), 16));
 }
 
-inline void vput(Zor8u* p, vf v) {
-    _mm_storeu_si128((__m128i*)p,
-                     _mm512_cvtusepi32_epi8(vnear(v, 0.0f, 255.0f)));
-}
-inline void vput(Zor16u* p, vf v) {
-    _mm256_storeu_si256((__m256i*)p,
-                        _mm512_cvtusepi32_epi16(vnear(v, 0.0f, 65535.0f)));
-}
-inline void vput(Zor16s* p, vf v) {
-    _mm256_storeu_si256(
-        (__m256i*)p, _mm512_cvtsepi32_epi16(vnear(v, -32768.0f, 32767.0f)));
-}
+// Narrowing stores (as the partial ones below, with every lane).
+inline void vput_n(Zor8u* p, vf v, int32_t n);
+inline void vput_n(Zor16u* p, vf v, int32_t n);
+inline void vput_n(Zor16s* p, vf v, int32_t n);
+inline void vput(Zor8u* p, vf v) { vput_n(p, v, VL); }
+inline void vput(Zor16u* p, vf v) { vput_n(p, v, VL); }
+inline void vput(Zor16s* p, vf v) { vput_n(p, v, VL); }
 
 // Byte and word loads under a mask need BW, which n0 lacks: stage them.
 template <typename T> inline vf vpix_n(const T* p, int32_t n) {
@@ -312,42 +311,6 @@ void pass(const float* in, const Line<T>* ln, int32_t kw, int32_t lw, int32_t w)
     for (; x < lw; x += VL) pass_block<1, L>(in, ln, kw, x, w);
 }
 
-// Kernels one tap wide: the taps of a column straight from the pixels.
-template <int N, typename T>
-inline void column_block(const T* src, int32_t srcStep, T* out, typename TapsOf<T>::type c,
-                         int32_t kh,
-                         int32_t x) {
-    vf a[N];
-#pragma GCC unroll 16
-    for (int k = 0; k < N; ++k) a[k] = vzero();
-    for (int32_t j = 0; j < kh; ++j) {
-        const T* p = row_at(src, srcStep, j) + x;
-        const vf t = vset(c[j]);
-    #pragma GCC unroll 16
-        for (int k = 0; k < N; ++k) a[k] = vfma(t, vpix(p + k * VL), a[k]);
-    }
-#pragma GCC unroll 16
-    for (int k = 0; k < N; ++k) vput(out + x + k * VL, a[k]);
-}
-
-template <typename T>
-void column(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
-            typename TapsOf<T>::type c, int32_t kh) {
-    for (int32_t y = 0; y < h; ++y) {
-        const T* in = row_at(src, srcStep, y);
-        T* out = row_at(dst, dstStep, y);
-        int32_t x = 0;
-        for (; x + 4 * VL <= w; x += 4 * VL) column_block<4>(in, srcStep, out, c, kh, x);
-        for (; x + VL <= w; x += VL) column_block<1>(in, srcStep, out, c, kh, x);
-        if (x < w) {
-            vf a = vzero();
-            for (int32_t j = 0; j < kh; ++j)
-                a = vfma(vset(c[j]), vpix_n(row_at(in, srcStep, j) + x, w - x), a);
-            vput_n(out + x, a, w - x);
-        }
-    }
-}
-
 // Rows of kernels at least 2 wide: each source row is converted once per
 // pair of output rows and feeds both (kernel row r for the upper line,
 // r - 1 for the lower one).
@@ -356,10 +319,6 @@ void filter_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t 
                 const Spec& s, float* work) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
     const typename TapsOf<T>::type c = TapsOf<T>::get(s);
-    if (kw == 1) {
-        column(src, srcStep, dst, dstStep, w, h, c, kh);
-        return;
-    }
     // Work area: two lines of lw floats and the float row of lw + kw - 1,
     // within the 4 W + 4 kw kh floats that the size query grants.
     const int32_t lw = (w + VL - 1) & ~(VL - 1);
@@ -400,18 +359,30 @@ void filter_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t 
     }
 }
 
-// ---- 32f -----------------------------------------------------------------------
+// ---- all taps in registers ------------------------------------------------------
+
+// Loads and stores of the register blocks: 32f as it is, integer pixels
+// converted on the fly (nearest, saturated, on the way out).
+inline vf vsrc(const Zor32f* p) { return vload(p); }
+template <typename T> inline vf vsrc(const T* p) { return vpix(p); }
+inline vf vsrc_n(const Zor32f* p, int32_t n) { return vload_n(p, n); }
+template <typename T> inline vf vsrc_n(const T* p, int32_t n) { return vpix_n(p, n); }
+inline void vout(Zor32f* p, vf v) { vstore(p, v); }
+template <typename T> inline void vout(T* p, vf v) { vput(p, v); }
+inline void vout_n(Zor32f* p, vf v, int32_t n) { vstore_n(p, v, n); }
+template <typename T> inline void vout_n(T* p, vf v, int32_t n) { vput_n(p, v, n); }
 
 // One source row's taps into the R x N sums; kAll: every output row of
 // the block lies over this source row.
-template <int R, int N, bool kAll>
-__attribute__((always_inline)) inline void source_row(const Zor32f* p, vf (&a)[R][N], const bool (&live)[R],
-                       const Reversed (&rowTaps)[R], int32_t kw) {
+template <int R, int N, bool kAll, typename T, typename C>
+__attribute__((always_inline)) inline void source_row(const T* p, vf (&a)[R][N],
+                                                      const bool (&live)[R],
+                                                      const C (&rowTaps)[R], int32_t kw) {
     for (int32_t i = 0; i < kw; ++i) {
         vf v[N];
 #pragma GCC unroll 16
         for (int k = 0; k < N; ++k) {
-            v[k] = vload(p + i + k * VL);
+            v[k] = vsrc(p + i + k * VL);
             if (R > 1) keep(v[k]);
         }
 #pragma GCC unroll 4
@@ -426,19 +397,19 @@ __attribute__((always_inline)) inline void source_row(const Zor32f* p, vf (&a)[R
 
 // All taps for R output rows by N vectors at x, in registers: every
 // source vector loaded serves each of the R rows it lies under.
-template <int R, int N>
-inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep,
-                      Reversed c, int32_t kw, int32_t kh, int32_t x) {
+template <int R, int N, typename T, typename C>
+inline void block(const T* src, int32_t srcStep, T* dst, int32_t dstStep, C c, int32_t kw,
+                  int32_t kh, int32_t x) {
     vf a[R][N];
 #pragma GCC unroll 4
     for (int q = 0; q < R; ++q)
 #pragma GCC unroll 16
         for (int k = 0; k < N; ++k) a[q][k] = vzero();
     for (int32_t r = 0; r < kh + R - 1; ++r) {
-        const Zor32f* p = row_at(src, srcStep, r) + x;
+        const T* p = row_at(src, srcStep, r) + x;
         // Output row q takes this source row with kernel row r - q.
         bool live[R];
-        Reversed rowTaps[R];
+        C rowTaps[R];
 #pragma GCC unroll 4
         for (int q = 0; q < R; ++q) {
             live[q] = r - q >= 0 && r - q < kh;
@@ -457,84 +428,103 @@ inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t d
 #pragma GCC unroll 4
     for (int q = 0; q < R; ++q)
 #pragma GCC unroll 16
-        for (int k = 0; k < N; ++k) vstore(row_at(dst, dstStep, q) + x + k * VL, a[q][k]);
+        for (int k = 0; k < N; ++k) vout(row_at(dst, dstStep, q) + x + k * VL, a[q][k]);
 }
 
 // The last n < VL outputs of one row (n0, k0).
-inline void tail_32f(const Zor32f* src, int32_t srcStep, Zor32f* out, Reversed c,
-                     int32_t kw, int32_t kh, int32_t x, int32_t n) {
+template <typename T, typename C>
+inline void tail(const T* src, int32_t srcStep, T* out, C c, int32_t kw, int32_t kh, int32_t x,
+                 int32_t n) {
     vf a = vzero();
     for (int32_t j = 0; j < kh; ++j) {
-        const Zor32f* p = row_at(src, srcStep, j) + x;
-        const Reversed cj = c.from(j * kw);
-        for (int32_t i = 0; i < kw; ++i) a = vfma(vset(cj[i]), vload_n(p + i, n), a);
+        const T* p = row_at(src, srcStep, j) + x;
+        const C cj = c.from(j * kw);
+        for (int32_t i = 0; i < kw; ++i) a = vfma(vset(cj[i]), vsrc_n(p + i, n), a);
     }
-    vstore_n(out + x, a, n);
+    vout_n(out + x, a, n);
 }
 
 // R rows of output.
-template <int R, int N>
-void rows_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
-              Reversed c, int32_t kw, int32_t kh) {
+template <int R, int N, typename T, typename C>
+void rows(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, C c, int32_t kw,
+          int32_t kh) {
     int32_t x = 0;
-    for (; x + N * VL <= w; x += N * VL)
-        block_32f<R, N>(src, srcStep, dst, dstStep, c, kw, kh, x);
+    for (; x + N * VL <= w; x += N * VL) block<R, N>(src, srcStep, dst, dstStep, c, kw, kh, x);
     // The whole vectors left over in one block, so that each source vector
     // loaded still serves all R rows.
     switch ((w - x) / VL) {
-    case 3: block_32f<R, 3>(src, srcStep, dst, dstStep, c, kw, kh, x); break;
-    case 2: block_32f<R, 2>(src, srcStep, dst, dstStep, c, kw, kh, x); break;
-    case 1: block_32f<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, x); break;
+    case 3: block<R, 3>(src, srcStep, dst, dstStep, c, kw, kh, x); break;
+    case 2: block<R, 2>(src, srcStep, dst, dstStep, c, kw, kh, x); break;
+    case 1: block<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, x); break;
     default:
-        for (; x + VL <= w; x += VL) block_32f<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, x);
+        for (; x + VL <= w; x += VL) block<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, x);
     }
     x += (w - x) / VL * VL;
     if (x == w) return;
     if (kMasked) {
         for (int q = 0; q < R; ++q)
-            tail_32f(row_at(src, srcStep, q), srcStep, row_at(dst, dstStep, q), c, kw, kh, x,
-                     w - x);
+            tail(row_at(src, srcStep, q), srcStep, row_at(dst, dstStep, q), c, kw, kh, x, w - x);
     } else {  // w >= VL on e9 and l9: redo the last whole vector
-        block_32f<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, w - VL);
+        block<R, 1>(src, srcStep, dst, dstStep, c, kw, kh, w - VL);
     }
 }
 
 #if ZOR_VECTOR_BYTES == 64
-constexpr int kRows32f = 4, kCols32f = 4;  // 16 of the 32 registers accumulate
+constexpr int kRows = 4, kCols = 4;  // 16 of the 32 registers accumulate
 #else
-constexpr int kRows32f = 2, kCols32f = 4;  // 8 of the 16
+constexpr int kRows = 2, kCols = 4;  // 8 of the 16
 #endif
 
-void filter_32f(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
-                int32_t h, const Spec& s) {
-    const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
-    const Reversed c = reversed_taps(s);
+template <typename T, typename C>
+void filter_regs(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
+                 C c, int32_t kw, int32_t kh) {
     int32_t y = 0;
-    for (; y + kRows32f <= h; y += kRows32f)
-        rows_32f<kRows32f, kCols32f>(row_at(src, srcStep, y), srcStep, row_at(dst, dstStep, y),
-                                     dstStep, w, c, kw, kh);
+    for (; y + kRows <= h; y += kRows)
+        rows<kRows, kCols>(row_at(src, srcStep, y), srcStep, row_at(dst, dstStep, y), dstStep, w,
+                           c, kw, kh);
     for (; y < h; ++y)
-        rows_32f<1, NB>(row_at(src, srcStep, y), srcStep, row_at(dst, dstStep, y), dstStep, w, c,
-                        kw, kh);
+        rows<1, NB>(row_at(src, srcStep, y), srcStep, row_at(dst, dstStep, y), dstStep, w, c, kw,
+                    kh);
+}
+
+// Integer pixels: kernels up to kRegsTaps taps keep all sums in registers
+// and convert the pixels as they load them; larger ones convert each row
+// once per pair of output rows and sum through float lines. Where the
+// turn lies was measured per level at 1920x1080.
+#if defined(ZOR_LEVEL_l9)
+constexpr int32_t kRegsTaps = 1 << 30;
+#else
+constexpr int32_t kRegsTaps = 9;
+#endif
+
+template <typename T>
+void filter_any(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
+                const Spec& s, float* work) {
+    const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
+    if (kw == 1 || kw * kh <= kRegsTaps)
+        filter_regs(src, srcStep, dst, dstStep, w, h, TapsOf<T>::get(s), kw, kh);
+    else
+        filter_int(src, srcStep, dst, dstStep, w, h, s, work);
 }
 
 }  // namespace
 
 void vec_avx(const Zor8u* src, int32_t srcStep, Zor8u* dst, int32_t dstStep, int32_t w, int32_t h,
              const Spec& s, float* work) {
-    filter_int(src, srcStep, dst, dstStep, w, h, s, work);
+    filter_any(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void vec_avx(const Zor16u* src, int32_t srcStep, Zor16u* dst, int32_t dstStep, int32_t w,
              int32_t h, const Spec& s, float* work) {
-    filter_int(src, srcStep, dst, dstStep, w, h, s, work);
+    filter_any(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void vec_avx(const Zor16s* src, int32_t srcStep, Zor16s* dst, int32_t dstStep, int32_t w,
              int32_t h, const Spec& s, float* work) {
-    filter_int(src, srcStep, dst, dstStep, w, h, s, work);
+    filter_any(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void vec_avx(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
              int32_t h, const Spec& s, float*) {
-    filter_32f(src, srcStep, dst, dstStep, w, h, s);
+    filter_regs(src, srcStep, dst, dstStep, w, h, reversed_taps(s), s.kernelWidth,
+                s.kernelHeight);
 }
 
 }  // namespace filt
