@@ -12,6 +12,7 @@
 #include <random>
 #include <vector>
 
+#include "vector_support.h"
 #include "zorinternal.h"
 
 namespace {
@@ -23,17 +24,8 @@ using RadixSort = zortest::LevelTest;
 const float kInf = std::numeric_limits<float>::infinity();
 const float kNaN = std::numeric_limits<float>::quiet_NaN();
 
-uint32_t bits(float x) {
-    uint32_t u;
-    std::memcpy(&u, &x, 4);
-    return u;
-}
-
-float from_bits(uint32_t u) {
-    float x;
-    std::memcpy(&x, &u, 4);
-    return x;
-}
+using vt::bits;
+const auto from_bits = vt::f32;
 
 std::vector<float> random_floats(size_t n, uint32_t seed, int range = 1000) {
     std::mt19937 gen(seed);
