@@ -169,19 +169,10 @@ TEST_P(Clear, EveryTypeEveryPlace) {
     clear_all(ZOR_BODY(zorsZero_64fc), true);
 }
 
-template <typename T> void copy_all(ZorStatus (*fn)(const T*, T*, int32_t)) {
-    std::vector<std::vector<uint8_t>> d(1, std::vector<uint8_t>(8200 * sizeof(T)));
-    for (size_t i = 0; i < d[0].size(); ++i) d[0][i] = (uint8_t)(i * 13 + 5);
-    vt::sweep<uint8_t>(d, false, sizeof(T), true,
-                       [&](const uint8_t* const* s, uint8_t* o, int32_t n) { return fn((const T*)s[0], (T*)o, n); },
-                       [&](size_t i) { return d[0][i]; });
-    EXPECT_EQ(fn(nullptr, nullptr, 0), zorStsNullPtrErr);
-}
-
 TEST_P(Clear, IntegerCopies) {
-    copy_all(ZOR_BODY(zorsCopy_8u));
-    copy_all(ZOR_BODY(zorsCopy_16s));
-    copy_all(ZOR_BODY(zorsCopy_32s));
+    vt::copy_sweep(ZOR_BODY(zorsCopy_8u));
+    vt::copy_sweep(ZOR_BODY(zorsCopy_16s));
+    vt::copy_sweep(ZOR_BODY(zorsCopy_32s));
 }
 
 // ---- conversion ---------------------------------------------------------------
