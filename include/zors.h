@@ -35,7 +35,9 @@ ZorStatus zorsMul_32f_I(const Zor32f* pSrc, Zor32f* pSrcDst, int32_t len);
 /* dst = src * value. value == 1 (after the checks) copies, bit for bit,
  * NaN payloads included; value == 0 or -0 zero-fills, so NaN or infinite
  * elements give +0. The in-place form returns at once for 1. A NaN value
- * goes to the arithmetic. Complex values multiply without conjugation. */
+ * goes to the arithmetic. The complex forms take no short cut and do not
+ * conjugate: re = s.re*v.re - s.im*v.im, im = s.im*v.re + s.re*v.im, each
+ * product rounded on its own (no fused multiply-add on any level). */
 ZorStatus zorsMulC_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len, Zor32f value);
 ZorStatus zorsMulC_64f(const Zor64f* pSrc, Zor64f* pDst, int32_t len, Zor64f value);
 ZorStatus zorsMulC_32f_I(Zor32f* pSrcDst, int32_t len, Zor32f value);
@@ -66,7 +68,9 @@ ZorStatus zorsFlip_64f(const Zor64f* pSrc, Zor64f* pDst, int32_t len);
 ZorStatus zorsFlip_64fc(const Zor64fc* pSrc, Zor64fc* pDst, int32_t len);
 
 /* dst[i] = src1[i] > src2[i] ? src1[i] : src2[i]: a NaN on either side
- * gives src2, and of +0/-0 the second. len is unsigned: only 0 is refused. */
+ * gives src2, and of +0/-0 the second. len is unsigned: only 0 is refused.
+ * A destination overlapping a source gives the result of an element by
+ * element walk from the first element. */
 ZorStatus zorsMaxEvery_8u(const Zor8u* pSrc1, const Zor8u* pSrc2, Zor8u* pDst, uint32_t len);
 ZorStatus zorsMaxEvery_16u(const Zor16u* pSrc1, const Zor16u* pSrc2, Zor16u* pDst, uint32_t len);
 ZorStatus zorsMaxEvery_32f(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, uint32_t len);

@@ -26,7 +26,8 @@ ZorStatus zorsFlip_32fc_I(Zor32fc* pSrcDst, int32_t len);
 ZorStatus zorsFlip_64f_I(Zor64f* pSrcDst, int32_t len);
 ZorStatus zorsFlip_64fc_I(Zor64fc* pSrcDst, int32_t len);
 
-/* All bytes of the vector zero; the byte count is formed in 32 bits. */
+/* All bytes of the vector zero. Byte counts are formed in 64 bits, so a
+ * vector of more than 2 GiB is cleared (or copied) whole. */
 ZorStatus zorsZero_8u(Zor8u* pDst, int32_t len);
 ZorStatus zorsZero_32s(Zor32s* pDst, int32_t len);
 ZorStatus zorsZero_32f(Zor32f* pDst, int32_t len);
@@ -64,6 +65,36 @@ double zorsCeilOne(double x);
 double zorsSqrtOne(double x);
 double zorsSinOne(double x);
 double zorsCosOne(double x);
+
+/* Row functions for the image operations of the same level: no argument
+ * checks (valid pointers, len >= 0) and no short cuts for special values,
+ * so a NaN times 0 stays NaN. One IEEE operation per element in the
+ * rounding mode in force, the same bits on every level and alignment.
+ * Sub is the second minus the first: dst = src2 - src1. */
+void ownsAdd_32f(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, int32_t len);
+void ownsSub_32f(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, int32_t len);
+void ownsMul_32f(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, int32_t len);
+void ownsAdd_64f(const Zor64f* pSrc1, const Zor64f* pSrc2, Zor64f* pDst, int32_t len);
+/* srcDst = srcDst op src */
+void ownsAdd_32f_I(const Zor32f* pSrc, Zor32f* pSrcDst, int32_t len);
+void ownsMul_32f_I(const Zor32f* pSrc, Zor32f* pSrcDst, int32_t len);
+void ownsAdd_64f_I(const Zor64f* pSrc, Zor64f* pSrcDst, int32_t len);
+/* dst = src op value */
+void ownsAddC_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len, Zor32f value);
+void ownsSubC_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len, Zor32f value);
+void ownsMulC_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len, Zor32f value);
+void ownsMulC_64f(const Zor64f* pSrc, Zor64f* pDst, int32_t len, Zor64f value);
+void ownsMulC_32f_I(Zor32f* pSrcDst, int32_t len, Zor32f value);
+void ownsMulC_64f_I(Zor64f* pSrcDst, int32_t len, Zor64f value);
+/* re = a.re*v.re - a.im*v.im, im = a.im*v.re + a.re*v.im, each product
+ * rounded on its own (never fused). */
+void ownsMulC_32fc(const Zor32fc* pSrc, Zor32fc* pDst, int32_t len, Zor32fc value);
+void ownsMulC_64fc(const Zor64fc* pSrc, Zor64fc* pDst, int32_t len, Zor64fc value);
+/* Byte counts. Copy: no overlap; it picks vector loops, string moves or
+ * non-temporal stores by length and cache size, the bytes written the same
+ * whichever way. Zero likewise. */
+void ownsCopy_8u(const Zor8u* pSrc, Zor8u* pDst, size_t len);
+void ownsZero_8u(Zor8u* pDst, size_t len);
 
 /* Memory kernels behind the copies and clears, one per way of moving the
  * bytes; each works for any length and alignment (copies: no overlap). The

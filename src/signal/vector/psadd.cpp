@@ -9,7 +9,7 @@
 
 #include <utility>
 
-#include "psrow.h"
+#include "psround.h"
 #include "simd.h"
 
 ZOR_BEGIN
@@ -137,68 +137,67 @@ template <typename V, typename T> void mulc_complex(const T* a, T* d, int32_t n,
     }
     for (; i < total; i += 2) {
         const T x = a[i], y = a[i + 1];
-        T xr = x * re, yr = y * re;
-        // Opaque to the compiler: its complex-multiply pattern would fuse
-        // the products into the sums, contraction switched off or not.
-        __asm__("" : "+x"(xr), "+x"(yr));
-        d[i] = xr - y * im;
-        d[i + 1] = yr + x * im;
+        d[i] = rounded(x * re) - rounded(y * im);
+        d[i + 1] = rounded(y * re) + rounded(x * im);
     }
 }
 
 inline bool is_zero(double v) { return v == 0; }  // -0 too; NaN never
 
 }  // namespace
-
-void ownsAdd_32f(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, int32_t len) {
-    binary<vf32>(pSrc1, pSrc2, pDst, len, add);
-}
-void ownsSub_32f(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, int32_t len) {
-    binary<vf32>(pSrc2, pSrc1, pDst, len, sub);
-}
-void ownsMul_32f(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, int32_t len) {
-    binary<vf32>(pSrc1, pSrc2, pDst, len, mul);
-}
-void ownsAdd_64f(const Zor64f* pSrc1, const Zor64f* pSrc2, Zor64f* pDst, int32_t len) {
-    binary<vf64>(pSrc1, pSrc2, pDst, len, add);
-}
-void ownsAdd_32f_I(const Zor32f* pSrc, Zor32f* pSrcDst, int32_t len) {
-    binary<vf32>(pSrcDst, pSrc, pSrcDst, len, add);
-}
-void ownsMul_32f_I(const Zor32f* pSrc, Zor32f* pSrcDst, int32_t len) {
-    binary<vf32>(pSrcDst, pSrc, pSrcDst, len, mul);
-}
-void ownsAdd_64f_I(const Zor64f* pSrc, Zor64f* pSrcDst, int32_t len) {
-    binary<vf64>(pSrcDst, pSrc, pSrcDst, len, add);
-}
-void ownsAddC_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len, Zor32f value) {
-    unary<vf32>(pSrc, pDst, len, [value](auto x) { return x + value; });
-}
-void ownsSubC_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len, Zor32f value) {
-    unary<vf32>(pSrc, pDst, len, [value](auto x) { return x - value; });
-}
-void ownsMulC_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len, Zor32f value) {
-    unary<vf32>(pSrc, pDst, len, [value](auto x) { return x * value; });
-}
-void ownsMulC_64f(const Zor64f* pSrc, Zor64f* pDst, int32_t len, Zor64f value) {
-    unary<vf64>(pSrc, pDst, len, [value](auto x) { return x * value; });
-}
-void ownsMulC_32f_I(Zor32f* pSrcDst, int32_t len, Zor32f value) {
-    ownsMulC_32f(pSrcDst, pSrcDst, len, value);
-}
-void ownsMulC_64f_I(Zor64f* pSrcDst, int32_t len, Zor64f value) {
-    ownsMulC_64f(pSrcDst, pSrcDst, len, value);
-}
-void ownsMulC_32fc(const Zor32fc* pSrc, Zor32fc* pDst, int32_t len, Zor32fc value) {
-    mulc_complex<vf32>(&pSrc->re, &pDst->re, len, value.re, value.im);
-}
-void ownsMulC_64fc(const Zor64fc* pSrc, Zor64fc* pDst, int32_t len, Zor64fc value) {
-    mulc_complex<vf64>(&pSrc->re, &pDst->re, len, value.re, value.im);
-}
-
 ZOR_END
 
 using namespace ZOR_NS;
+
+// ---- row functions ----------------------------------------------------------
+
+ZOR_INTERNAL void ZOR_NAME(ownsAdd_32f)(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, int32_t len) {
+    binary<vf32>(pSrc1, pSrc2, pDst, len, add);
+}
+ZOR_INTERNAL void ZOR_NAME(ownsSub_32f)(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, int32_t len) {
+    binary<vf32>(pSrc2, pSrc1, pDst, len, sub);
+}
+ZOR_INTERNAL void ZOR_NAME(ownsMul_32f)(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, int32_t len) {
+    binary<vf32>(pSrc1, pSrc2, pDst, len, mul);
+}
+ZOR_INTERNAL void ZOR_NAME(ownsAdd_64f)(const Zor64f* pSrc1, const Zor64f* pSrc2, Zor64f* pDst, int32_t len) {
+    binary<vf64>(pSrc1, pSrc2, pDst, len, add);
+}
+ZOR_INTERNAL void ZOR_NAME(ownsAdd_32f_I)(const Zor32f* pSrc, Zor32f* pSrcDst, int32_t len) {
+    binary<vf32>(pSrcDst, pSrc, pSrcDst, len, add);
+}
+ZOR_INTERNAL void ZOR_NAME(ownsMul_32f_I)(const Zor32f* pSrc, Zor32f* pSrcDst, int32_t len) {
+    binary<vf32>(pSrcDst, pSrc, pSrcDst, len, mul);
+}
+ZOR_INTERNAL void ZOR_NAME(ownsAdd_64f_I)(const Zor64f* pSrc, Zor64f* pSrcDst, int32_t len) {
+    binary<vf64>(pSrcDst, pSrc, pSrcDst, len, add);
+}
+ZOR_INTERNAL void ZOR_NAME(ownsAddC_32f)(const Zor32f* pSrc, Zor32f* pDst, int32_t len, Zor32f value) {
+    unary<vf32>(pSrc, pDst, len, [value](auto x) { return x + value; });
+}
+ZOR_INTERNAL void ZOR_NAME(ownsSubC_32f)(const Zor32f* pSrc, Zor32f* pDst, int32_t len, Zor32f value) {
+    unary<vf32>(pSrc, pDst, len, [value](auto x) { return x - value; });
+}
+ZOR_INTERNAL void ZOR_NAME(ownsMulC_32f)(const Zor32f* pSrc, Zor32f* pDst, int32_t len, Zor32f value) {
+    unary<vf32>(pSrc, pDst, len, [value](auto x) { return x * value; });
+}
+ZOR_INTERNAL void ZOR_NAME(ownsMulC_64f)(const Zor64f* pSrc, Zor64f* pDst, int32_t len, Zor64f value) {
+    unary<vf64>(pSrc, pDst, len, [value](auto x) { return x * value; });
+}
+ZOR_INTERNAL void ZOR_NAME(ownsMulC_32f_I)(Zor32f* pSrcDst, int32_t len, Zor32f value) {
+    ZOR_NAME(ownsMulC_32f)(pSrcDst, pSrcDst, len, value);
+}
+ZOR_INTERNAL void ZOR_NAME(ownsMulC_64f_I)(Zor64f* pSrcDst, int32_t len, Zor64f value) {
+    ZOR_NAME(ownsMulC_64f)(pSrcDst, pSrcDst, len, value);
+}
+ZOR_INTERNAL void ZOR_NAME(ownsMulC_32fc)(const Zor32fc* pSrc, Zor32fc* pDst, int32_t len, Zor32fc value) {
+    mulc_complex<vf32>(&pSrc->re, &pDst->re, len, value.re, value.im);
+}
+ZOR_INTERNAL void ZOR_NAME(ownsMulC_64fc)(const Zor64fc* pSrc, Zor64fc* pDst, int32_t len, Zor64fc value) {
+    mulc_complex<vf64>(&pSrc->re, &pDst->re, len, value.re, value.im);
+}
+
+
 
 #define CHECK2(p, q, len)                                     \
     if ((p) == nullptr || (q) == nullptr) return zorStsNullPtrErr; \
@@ -210,23 +209,23 @@ using namespace ZOR_NS;
 ZOR_ENTRY ZorStatus ZOR_NAME(zorsAdd_32f)(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst,
                                           int32_t len) {
     CHECK3(pSrc1, pSrc2, pDst, len);
-    ownsAdd_32f(pSrc1, pSrc2, pDst, len);
+    ZOR_NAME(ownsAdd_32f)(pSrc1, pSrc2, pDst, len);
     return zorStsNoErr;
 }
 ZOR_ENTRY ZorStatus ZOR_NAME(zorsAdd_64f)(const Zor64f* pSrc1, const Zor64f* pSrc2, Zor64f* pDst,
                                           int32_t len) {
     CHECK3(pSrc1, pSrc2, pDst, len);
-    ownsAdd_64f(pSrc1, pSrc2, pDst, len);
+    ZOR_NAME(ownsAdd_64f)(pSrc1, pSrc2, pDst, len);
     return zorStsNoErr;
 }
 ZOR_ENTRY ZorStatus ZOR_NAME(zorsAdd_32f_I)(const Zor32f* pSrc, Zor32f* pSrcDst, int32_t len) {
     CHECK2(pSrc, pSrcDst, len);
-    ownsAdd_32f_I(pSrc, pSrcDst, len);
+    ZOR_NAME(ownsAdd_32f_I)(pSrc, pSrcDst, len);
     return zorStsNoErr;
 }
 ZOR_ENTRY ZorStatus ZOR_NAME(zorsAdd_64f_I)(const Zor64f* pSrc, Zor64f* pSrcDst, int32_t len) {
     CHECK2(pSrc, pSrcDst, len);
-    ownsAdd_64f_I(pSrc, pSrcDst, len);
+    ZOR_NAME(ownsAdd_64f_I)(pSrc, pSrcDst, len);
     return zorStsNoErr;
 }
 
@@ -260,12 +259,12 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zorsAdd_64fc_I)(const Zor64fc* pSrc, Zor64fc* pSrcD
 ZOR_ENTRY ZorStatus ZOR_NAME(zorsMul_32f)(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst,
                                           int32_t len) {
     CHECK3(pSrc1, pSrc2, pDst, len);
-    ownsMul_32f(pSrc1, pSrc2, pDst, len);
+    ZOR_NAME(ownsMul_32f)(pSrc1, pSrc2, pDst, len);
     return zorStsNoErr;
 }
 ZOR_ENTRY ZorStatus ZOR_NAME(zorsMul_32f_I)(const Zor32f* pSrc, Zor32f* pSrcDst, int32_t len) {
     CHECK2(pSrc, pSrcDst, len);
-    ownsMul_32f_I(pSrc, pSrcDst, len);
+    ZOR_NAME(ownsMul_32f_I)(pSrc, pSrcDst, len);
     return zorStsNoErr;
 }
 
@@ -276,7 +275,7 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zorsMulC_32f)(const Zor32f* pSrc, Zor32f* pDst, int
     CHECK2(pSrc, pDst, len);
     if (value == 1.0f) return ZOR_NAME(zorsCopy_32f)(pSrc, pDst, len);
     if (is_zero(value)) return ZOR_NAME(zorsZero_32f)(pDst, len);
-    ownsMulC_32f(pSrc, pDst, len, value);
+    ZOR_NAME(ownsMulC_32f)(pSrc, pDst, len, value);
     return zorStsNoErr;
 }
 ZOR_ENTRY ZorStatus ZOR_NAME(zorsMulC_64f)(const Zor64f* pSrc, Zor64f* pDst, int32_t len,
@@ -284,7 +283,7 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zorsMulC_64f)(const Zor64f* pSrc, Zor64f* pDst, int
     CHECK2(pSrc, pDst, len);
     if (value == 1.0) return ZOR_NAME(zorsCopy_64f)(pSrc, pDst, len);
     if (is_zero(value)) return ZOR_NAME(zorsZero_64f)(pDst, len);
-    ownsMulC_64f(pSrc, pDst, len, value);
+    ZOR_NAME(ownsMulC_64f)(pSrc, pDst, len, value);
     return zorStsNoErr;
 }
 ZOR_ENTRY ZorStatus ZOR_NAME(zorsMulC_32f_I)(Zor32f* pSrcDst, int32_t len, Zor32f value) {
@@ -292,7 +291,7 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zorsMulC_32f_I)(Zor32f* pSrcDst, int32_t len, Zor32
     if (len < 1) return zorStsSizeErr;
     if (value == 1.0f) return zorStsNoErr;
     if (is_zero(value)) return ZOR_NAME(zorsZero_32f)(pSrcDst, len);
-    ownsMulC_32f_I(pSrcDst, len, value);
+    ZOR_NAME(ownsMulC_32f_I)(pSrcDst, len, value);
     return zorStsNoErr;
 }
 ZOR_INTERNAL ZorStatus ZOR_NAME(zorsMulC_64f_I)(Zor64f* pSrcDst, int32_t len, Zor64f value) {
@@ -300,19 +299,19 @@ ZOR_INTERNAL ZorStatus ZOR_NAME(zorsMulC_64f_I)(Zor64f* pSrcDst, int32_t len, Zo
     if (len < 1) return zorStsSizeErr;
     if (value == 1.0) return zorStsNoErr;
     if (is_zero(value)) return ZOR_NAME(zorsZero_64f)(pSrcDst, len);
-    ownsMulC_64f_I(pSrcDst, len, value);
+    ZOR_NAME(ownsMulC_64f_I)(pSrcDst, len, value);
     return zorStsNoErr;
 }
 ZOR_ENTRY ZorStatus ZOR_NAME(zorsMulC_32fc)(const Zor32fc* pSrc, Zor32fc* pDst, int32_t len,
                                             Zor32fc value) {
     CHECK2(pSrc, pDst, len);
-    ownsMulC_32fc(pSrc, pDst, len, value);
+    ZOR_NAME(ownsMulC_32fc)(pSrc, pDst, len, value);
     return zorStsNoErr;
 }
 ZOR_ENTRY ZorStatus ZOR_NAME(zorsMulC_64fc)(const Zor64fc* pSrc, Zor64fc* pDst, int32_t len,
                                             Zor64fc value) {
     CHECK2(pSrc, pDst, len);
-    ownsMulC_64fc(pSrc, pDst, len, value);
+    ZOR_NAME(ownsMulC_64fc)(pSrc, pDst, len, value);
     return zorStsNoErr;
 }
 
@@ -320,14 +319,14 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zorsSubC_32f)(const Zor32f* pSrc, Zor32f* pDst, int
                                            Zor32f value) {
     CHECK2(pSrc, pDst, len);
     if (is_zero(value)) return ZOR_NAME(zorsCopy_32f)(pSrc, pDst, len);
-    ownsSubC_32f(pSrc, pDst, len, value);
+    ZOR_NAME(ownsSubC_32f)(pSrc, pDst, len, value);
     return zorStsNoErr;
 }
 ZOR_INTERNAL ZorStatus ZOR_NAME(zorsAddC_32f_I)(Zor32f* pSrcDst, int32_t len, Zor32f value) {
     if (pSrcDst == nullptr) return zorStsNullPtrErr;
     if (len < 1) return zorStsSizeErr;
     if (is_zero(value)) return zorStsNoErr;
-    ownsAddC_32f(pSrcDst, pSrcDst, len, value);
+    ZOR_NAME(ownsAddC_32f)(pSrcDst, pSrcDst, len, value);
     return zorStsNoErr;
 }
 

@@ -12,7 +12,6 @@
 #include <stdint.h>
 #include <string.h>
 
-#include "psrow.h"
 #include "simd.h"
 
 ZOR_BEGIN
@@ -147,36 +146,32 @@ void copy_readahead(const Zor8u* s, Zor8u* d, size_t n) {
     simd::store(d + n - VB, tail);
 }
 
-// Pieces of 1, 2, 4, ... up to the destination's vector boundary, vector
-// stores, pieces for the rest.
+// One unaligned vector at each end (they may overlap the middle), aligned
+// vector stores between; ordinary or non-temporal.
 template <bool NT> void zero_body(Zor8u* d, size_t n) {
     if (n < VB) {
         zero_short(d, n);
         return;
     }
-    for (size_t k = 1; k < VB; k *= 2) {
-        if ((uintptr_t)d & k) {
-            memset(d, 0, k);  // k is a power of two: one store
-            d += k;
-            n -= k;
-        }
-    }
     const vu8 z = vu8{};
-    for (; n >= 4 * VB; n -= 4 * VB, d += 4 * VB) {
+    simd::store(d, z);
+    simd::store(d + n - VB, z);
+    Zor8u* p = d + VB - ((uintptr_t)d & (VB - 1));
+    Zor8u* const end = d + n;
+    for (; end - p >= (ptrdiff_t)(4 * VB); p += 4 * VB) {
         for (size_t k = 0; k < 4; ++k) {
             if (NT)
-                simd::stream(d + k * VB, z);
+                simd::stream(p + k * VB, z);
             else
-                simd::store(d + k * VB, z);
+                simd::store(p + k * VB, z);
         }
     }
-    for (; n >= VB; n -= VB, d += VB) {
+    for (; end - p >= (ptrdiff_t)VB; p += VB) {
         if (NT)
-            simd::stream(d, z);
+            simd::stream(p, z);
         else
-            simd::store(d, z);
+            simd::store(p, z);
     }
-    zero_short(d, n);
     if (NT) simd::store_fence();
 }
 
@@ -280,16 +275,11 @@ static void zero_policy(Zor8u* d, size_t n, int64_t) {
 static int64_t zero_cache(size_t) { return -1; }
 #endif
 
-void ownsCopy_8u(const Zor8u* pSrc, Zor8u* pDst, size_t len) {
-    copy_policy(pSrc, pDst, len, copy_cache(len));
-}
-
-void ownsZero_8u(Zor8u* pDst, size_t len) { zero_policy(pDst, len, zero_cache(len)); }
 
 // Overlap is safe because every piece and block is loaded whole before it
 // is stored, walking away from the side the destination overlaps: down from
 // the end when the source lies below the destination, else up.
-void ownsMove_8u(const Zor8u* s, Zor8u* d, size_t n) {
+void move_any(const Zor8u* s, Zor8u* d, size_t n) {
     if (s == d) return;
     if (s > d) {
         if (n >= 64) {
@@ -324,13 +314,23 @@ using ZOR_NS::copy_nt;
 using ZOR_NS::copy_policy;
 using ZOR_NS::copy_readahead;
 using ZOR_NS::copy_vec;
+using ZOR_NS::copy_cache;
 using ZOR_NS::kLeaf2Codes;
-using ZOR_NS::ownsCopy_8u;
-using ZOR_NS::ownsZero_8u;
+using ZOR_NS::move_any;
 using ZOR_NS::rep_movsb;
 using ZOR_NS::rep_stosb;
 using ZOR_NS::zero_body;
+using ZOR_NS::zero_cache;
 using ZOR_NS::zero_policy;
+
+// The whole policy of the level, with the cache size asked where the choice
+// depends on it.
+ZOR_INTERNAL void ZOR_NAME(ownsCopy_8u)(const Zor8u* pSrc, Zor8u* pDst, size_t len) {
+    copy_policy(pSrc, pDst, len, copy_cache(len));
+}
+ZOR_INTERNAL void ZOR_NAME(ownsZero_8u)(Zor8u* pDst, size_t len) {
+    zero_policy(pDst, len, zero_cache(len));
+}
 
 // ---- the kernels, reachable one by one for tests -----------------------------
 
@@ -360,7 +360,7 @@ ZOR_INTERNAL void ZOR_NAME(ownsZero_8u_cache)(Zor8u* pDst, size_t len, int64_t c
     zero_policy(pDst, len, cacheBytes);
 }
 ZOR_INTERNAL void ZOR_NAME(ownsMove_8u)(const Zor8u* pSrc, Zor8u* pDst, size_t len) {
-    ZOR_NS::ownsMove_8u(pSrc, pDst, len);
+    move_any(pSrc, pDst, len);
 }
 
 // Same matching as the runtime's leaf 2 decoding: the low byte of EAX must
@@ -394,24 +394,24 @@ ZOR_INTERNAL int32_t ZOR_NAME(ownsCopyCacheSize)(const uint32_t regs[4]) {
         return zorStsNoErr;                                                     \
     }
 
-COPY_LIKE(ZOR_ENTRY, zorsCopy_32f, Zor32f, ownsCopy_8u)
-COPY_LIKE(ZOR_ENTRY, zorsCopy_32fc, Zor32fc, ownsCopy_8u)
-COPY_LIKE(ZOR_ENTRY, zorsCopy_64f, Zor64f, ownsCopy_8u)
-COPY_LIKE(ZOR_ENTRY, zorsCopy_64fc, Zor64fc, ownsCopy_8u)
-COPY_LIKE(ZOR_INTERNAL, zorsCopy_8u, Zor8u, ownsCopy_8u)
-COPY_LIKE(ZOR_INTERNAL, zorsCopy_16s, Zor16s, ownsCopy_8u)
-COPY_LIKE(ZOR_INTERNAL, zorsCopy_32s, Zor32s, ownsCopy_8u)
-COPY_LIKE(ZOR_ENTRY, zorsMove_32f, Zor32f, ZOR_NS::ownsMove_8u)
-COPY_LIKE(ZOR_ENTRY, zorsMove_32fc, Zor32fc, ZOR_NS::ownsMove_8u)
-COPY_LIKE(ZOR_ENTRY, zorsMove_64f, Zor64f, ZOR_NS::ownsMove_8u)
-COPY_LIKE(ZOR_ENTRY, zorsMove_64fc, Zor64fc, ZOR_NS::ownsMove_8u)
+COPY_LIKE(ZOR_ENTRY, zorsCopy_32f, Zor32f, ZOR_NAME(ownsCopy_8u))
+COPY_LIKE(ZOR_ENTRY, zorsCopy_32fc, Zor32fc, ZOR_NAME(ownsCopy_8u))
+COPY_LIKE(ZOR_ENTRY, zorsCopy_64f, Zor64f, ZOR_NAME(ownsCopy_8u))
+COPY_LIKE(ZOR_ENTRY, zorsCopy_64fc, Zor64fc, ZOR_NAME(ownsCopy_8u))
+COPY_LIKE(ZOR_INTERNAL, zorsCopy_8u, Zor8u, ZOR_NAME(ownsCopy_8u))
+COPY_LIKE(ZOR_INTERNAL, zorsCopy_16s, Zor16s, ZOR_NAME(ownsCopy_8u))
+COPY_LIKE(ZOR_INTERNAL, zorsCopy_32s, Zor32s, ZOR_NAME(ownsCopy_8u))
+COPY_LIKE(ZOR_ENTRY, zorsMove_32f, Zor32f, move_any)
+COPY_LIKE(ZOR_ENTRY, zorsMove_32fc, Zor32fc, move_any)
+COPY_LIKE(ZOR_ENTRY, zorsMove_64f, Zor64f, move_any)
+COPY_LIKE(ZOR_ENTRY, zorsMove_64fc, Zor64fc, move_any)
 #undef COPY_LIKE
 
 #define ZERO(name, T)                                                  \
     ZOR_INTERNAL ZorStatus ZOR_NAME(name)(T* pDst, int32_t len) {      \
         if (pDst == nullptr) return zorStsNullPtrErr;                  \
         if (len < 1) return zorStsSizeErr;                             \
-        ownsZero_8u((Zor8u*)pDst, (size_t)len * sizeof(T));            \
+        ZOR_NAME(ownsZero_8u)((Zor8u*)pDst, (size_t)len * sizeof(T));            \
         return zorStsNoErr;                                            \
     }
 

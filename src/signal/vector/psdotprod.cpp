@@ -10,6 +10,7 @@
 #include <stdint.h>
 #include <utility>
 
+#include "psround.h"
 #include "simd.h"
 
 ZOR_BEGIN
@@ -26,17 +27,11 @@ template <typename V> inline V neg_zero() {
 
 // ---- element arithmetic of the fixed short order ----------------------------
 
-// The compiler's vectorizer recognises (ac - bd, ad + bc) and emits a fused
-// multiply-subtract-add even with contraction off; a register barrier on
-// each product keeps every product rounded on its own, on every level.
-template <typename T> inline T kept(T x) {
-    __asm__("" : "+x"(x));
-    return x;
-}
-
+// Each product rounded on its own (rounded(): no fused multiply-add on any
+// level), so the short order gives the same bits everywhere.
 template <typename T> inline void complex_mul(T ar, T ai, T br, T bi, T* re, T* im) {
-    *re = kept(ar * br) - kept(ai * bi);
-    *im = kept(ar * bi) + kept(ai * br);
+    *re = rounded(ar * br) - rounded(ai * bi);
+    *im = rounded(ar * bi) + rounded(ai * br);
 }
 
 inline float mul(float a, float b) { return a * b; }

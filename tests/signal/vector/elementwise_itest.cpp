@@ -76,29 +76,63 @@ TEST_P(Elementwise, ShortCutsOfTheInPlaceConstantForms) {
     EXPECT_EQ(f, f0);
 }
 
-// The public flips reach these through equal pointers at every length;
-// here the checks and one length per shape of the loop.
-TEST_P(Elementwise, InPlaceReversal) {
-    auto check = [](auto body, size_t size) {
-        for (int len : {1, 2, 3, 17, 64, 1001}) {
-            Region r(len * size, 4);
-            auto want = r.raw;
-            for (int i = 0; i < len; ++i) std::memcpy(r.in(want) + i * size, r.data() + (len - 1 - i) * size, size);
-            ASSERT_EQ(body(r.data(), len), zorStsNoErr);
-            ASSERT_IMAGE(r, want) << "size " << size << " len " << len;
-        }
-        EXPECT_EQ(body(nullptr, 0), zorStsNullPtrErr);
-        Zor64fc one{};
-        EXPECT_EQ(body(&one, 0), zorStsSizeErr);
+// The public flips reach these through equal pointers at every length and
+// placement; here only their own checks.
+TEST_P(Elementwise, InPlaceReversalChecks) {
+    Zor64fc one[1] = {{1, 2}};
+    EXPECT_EQ(ZOR_BODY(zorsFlip_32f_I)(nullptr, 0), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsFlip_32fc_I)((Zor32fc*)one, 0), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsFlip_64f_I)(nullptr, 5), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsFlip_64fc_I)(one, -1), zorStsSizeErr);
+    EXPECT_EQ(one[0].im, 2);
+}
+
+// The row functions behind the image arithmetic: nothing written at length
+// 0, Sub the second minus the first, and no short cut for any constant, so
+// NaN and infinity times 0 stay NaN.
+TEST_P(Elementwise, RowFunctionsTakeNoShortCuts) {
+    const std::vector<std::vector<float>> f = {vt::values<float>(8200, 5), vt::values<float>(8200, 6)};
+    const std::vector<std::vector<double>> d = {vt::values<double>(8200, 7), vt::values<double>(8200, 8)};
+    auto done = [](int32_t n) { return n ? zorStsNoErr : zorStsSizeErr; };
+    using F = const float* const*;
+    using D = const double* const*;
+    auto two = [&](auto fn, auto op) {
+        vt::sweep<float>(f, false, 1, false, [&](F s, float* o, int32_t n) { fn(s[0], s[1], o, n); return done(n); },
+                         [&](size_t i) { return op(f[0][i], f[1][i]); });
     };
-    const auto f32 = ZOR_BODY(zorsFlip_32f_I);
-    const auto f32c = ZOR_BODY(zorsFlip_32fc_I);
-    const auto f64 = ZOR_BODY(zorsFlip_64f_I);
-    const auto f64c = ZOR_BODY(zorsFlip_64fc_I);
-    check([&](void* p, int32_t n) { return f32((Zor32f*)p, n); }, 4);
-    check([&](void* p, int32_t n) { return f32c((Zor32fc*)p, n); }, 8);
-    check([&](void* p, int32_t n) { return f64((Zor64f*)p, n); }, 8);
-    check([&](void* p, int32_t n) { return f64c((Zor64fc*)p, n); }, 16);
+    two(ZOR_BODY(ownsAdd_32f), [](float x, float y) { return x + y; });
+    two(ZOR_BODY(ownsSub_32f), [](float x, float y) { return y - x; });
+    two(ZOR_BODY(ownsMul_32f), [](float x, float y) { return x * y; });
+    const auto add64 = ZOR_BODY(ownsAdd_64f);
+    vt::sweep<double>(d, false, 1, false, [&](D s, double* o, int32_t n) { add64(s[0], s[1], o, n); return done(n); },
+                      [&](size_t i) { return d[0][i] + d[1][i]; });
+    // In place: srcDst (source 0) op src (source 1).
+    const auto addI = ZOR_BODY(ownsAdd_32f_I), mulI = ZOR_BODY(ownsMul_32f_I);
+    const auto add64I = ZOR_BODY(ownsAdd_64f_I);
+    vt::sweep<float>(f, true, 1, false, [&](F s, float* o, int32_t n) { addI(s[1], o, n); return done(n); },
+                     [&](size_t i) { return f[0][i] + f[1][i]; });
+    vt::sweep<float>(f, true, 1, false, [&](F s, float* o, int32_t n) { mulI(s[1], o, n); return done(n); },
+                     [&](size_t i) { return f[0][i] * f[1][i]; });
+    vt::sweep<double>(d, true, 1, false, [&](D s, double* o, int32_t n) { add64I(s[1], o, n); return done(n); },
+                      [&](size_t i) { return d[0][i] + d[1][i]; });
+    const auto addc = ZOR_BODY(ownsAddC_32f), subc = ZOR_BODY(ownsSubC_32f), mulc = ZOR_BODY(ownsMulC_32f);
+    const auto mulcI = ZOR_BODY(ownsMulC_32f_I);
+    const auto mulc64 = ZOR_BODY(ownsMulC_64f);
+    const auto mulc64I = ZOR_BODY(ownsMulC_64f_I);
+    for (float v : {0.0f, -0.0f, 1.0f, -2.5f}) {
+        vt::sweep<float>(f, false, 1, false, [&](F s, float* o, int32_t n) { addc(s[0], o, n, v); return done(n); },
+                         [&](size_t i) { return f[0][i] + v; });
+        vt::sweep<float>(f, false, 1, false, [&](F s, float* o, int32_t n) { subc(s[0], o, n, v); return done(n); },
+                         [&](size_t i) { return f[0][i] - v; });
+        vt::sweep<float>(f, false, 1, false, [&](F s, float* o, int32_t n) { mulc(s[0], o, n, v); return done(n); },
+                         [&](size_t i) { return f[0][i] * v; });
+        vt::sweep<float>(f, true, 1, false, [&](F, float* o, int32_t n) { mulcI(o, n, v); return done(n); },
+                         [&](size_t i) { return f[0][i] * v; });
+        vt::sweep<double>(d, false, 1, false, [&](D s, double* o, int32_t n) { mulc64(s[0], o, n, v); return done(n); },
+                          [&](size_t i) { return d[0][i] * (double)v; });
+        vt::sweep<double>(d, true, 1, false, [&](D, double* o, int32_t n) { mulc64I(o, n, v); return done(n); },
+                          [&](size_t i) { return d[0][i] * (double)v; });
+    }
 }
 
 // ---- clears and integer copies ------------------------------------------------
@@ -135,19 +169,10 @@ TEST_P(Clear, EveryTypeEveryPlace) {
     clear_all(ZOR_BODY(zorsZero_64fc), true);
 }
 
-template <typename T> void copy_all(ZorStatus (*fn)(const T*, T*, int32_t)) {
-    std::vector<std::vector<uint8_t>> d(1, std::vector<uint8_t>(8200 * sizeof(T)));
-    for (size_t i = 0; i < d[0].size(); ++i) d[0][i] = (uint8_t)(i * 13 + 5);
-    vt::sweep<uint8_t>(d, false, sizeof(T), true,
-                       [&](const uint8_t* const* s, uint8_t* o, int32_t n) { return fn((const T*)s[0], (T*)o, n); },
-                       [&](size_t i) { return d[0][i]; });
-    EXPECT_EQ(fn(nullptr, nullptr, 0), zorStsNullPtrErr);
-}
-
 TEST_P(Clear, IntegerCopies) {
-    copy_all(ZOR_BODY(zorsCopy_8u));
-    copy_all(ZOR_BODY(zorsCopy_16s));
-    copy_all(ZOR_BODY(zorsCopy_32s));
+    vt::copy_sweep(ZOR_BODY(zorsCopy_8u));
+    vt::copy_sweep(ZOR_BODY(zorsCopy_16s));
+    vt::copy_sweep(ZOR_BODY(zorsCopy_32s));
 }
 
 // ---- conversion ---------------------------------------------------------------

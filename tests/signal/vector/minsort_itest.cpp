@@ -12,6 +12,7 @@
 #include <random>
 #include <vector>
 
+#include "vector_support.h"
 #include "zorinternal.h"
 
 namespace {
@@ -23,17 +24,8 @@ using RadixSort = zortest::LevelTest;
 const float kInf = std::numeric_limits<float>::infinity();
 const float kNaN = std::numeric_limits<float>::quiet_NaN();
 
-uint32_t bits(float x) {
-    uint32_t u;
-    std::memcpy(&u, &x, 4);
-    return u;
-}
-
-float from_bits(uint32_t u) {
-    float x;
-    std::memcpy(&x, &u, 4);
-    return x;
-}
+using vt::bits;
+const auto from_bits = vt::f32;
 
 std::vector<float> random_floats(size_t n, uint32_t seed, int range = 1000) {
     std::mt19937 gen(seed);
@@ -95,45 +87,33 @@ TEST_P(MinSearch, AgreesWithTheStrictScanOnEveryPath) {
     }
 }
 
-TEST_P(MinSearch, EqualMinimaKeepTheLowestIndex) {
+// Equal minima (zeros of both signs among them), NaNs and -infinity on
+// both paths at every start alignment: the strict scan decides; a NaN
+// first stands, any other is passed over.
+TEST_P(MinSearch, EqualMinimaSignedZerosAndNaNs) {
     const int level = GetParam().index;
     float v;
     int i;
     const float three[3] = {1, 0, 0};
     ASSERT_EQ(ZOR_BODY(zorsMinIndx_32f)(three, 3, &v, &i), zorStsNoErr);
     EXPECT_EQ(i, 1);
-    for (int len : {34, 40, 64, 129}) {
+    for (int len : {2, 33, 34, 40, 64, 129, 200})
         for (int offset = 0; offset < 4; ++offset) {
-            std::vector<float> buf(len + 4, 1.0f);
+            std::vector<float> buf(len + 4);
             float* p = buf.data() + offset;
-            for (int k = 1; k < len; ++k) p[k] = 0.0f;
-            ZOR_BODY(zorsMinIndx_32f)(p, len, &v, &i);
-            EXPECT_EQ(i, 1) << len << " " << offset;
-            // +0 and -0 compare equal: the first of them stays.
-            p[len / 2] = -0.0f;
-            p[len - 1] = -0.0f;
+            for (int k = 0; k < len; ++k) p[k] = k ? 0.0f : 1.0f;
+            expect_like_model(p, len, "equal", level);
+            p[len / 2] = p[len - 1] = -0.0f;
             expect_like_model(p, len, "signed zeros", level);
+            for (int k = 0; k < len; ++k) p[k] = (float)(len - k);
+            p[len - 1] = kNaN;
+            expect_like_model(p, len, "NaN last", level);
+            p[len / 2] = kNaN;
+            p[len - 1] = -kInf;
+            expect_like_model(p, len, "-inf last", level);
+            p[0] = kNaN;
+            expect_like_model(p, len, "NaN first", level);
         }
-    }
-}
-
-TEST_P(MinSearch, NaNsArePassedOverUnlessFirst) {
-    const int level = GetParam().index;
-    for (int len : {2, 33, 34, 50, 200}) {
-        std::vector<float> v(len);
-        for (int k = 0; k < len; ++k) v[k] = (float)(len - k);
-        v[len - 1] = kNaN;
-        expect_like_model(v.data(), len, "NaN last", level);
-        v[len / 2] = kNaN;
-        v[len - 1] = -kInf;
-        expect_like_model(v.data(), len, "-inf last", level);
-        v[0] = kNaN;
-        float m;
-        int i;
-        ZOR_BODY(zorsMinIndx_32f)(v.data(), len, &m, &i);
-        EXPECT_TRUE(std::isnan(m));
-        EXPECT_EQ(i, 0);
-    }
 }
 
 TEST_P(MinSearch, ChecksAndNullIndex) {

@@ -11,6 +11,7 @@
 #include <random>
 #include <vector>
 
+#include "vector_support.h"
 #include "zors.h"
 #include "zortest.h"
 
@@ -19,25 +20,12 @@ namespace {
 using Sum = zortest::LevelTest;
 using DotProd = zortest::LevelTest;
 
-uint32_t bits(float x) {
-    uint32_t u;
-    std::memcpy(&u, &x, 4);
-    return u;
-}
+using vt::bits;
 
-uint64_t bits(double x) {
-    uint64_t u;
-    std::memcpy(&u, &x, 8);
-    return u;
-}
-
-// Lengths 1..70 and around powers of two up to 2^14.
+// Lengths 1..70 and around powers of two up to 2^13.
 std::vector<int> lengths() {
-    std::vector<int> v;
-    for (int n = 1; n <= 70; ++n) v.push_back(n);
-    for (int k = 7; k <= 14; ++k) {
-        for (int d = -1; d <= 1; ++d) v.push_back((1 << k) + d);
-    }
+    std::vector<int> v = vt::lengths();
+    v.erase(v.begin());
     return v;
 }
 

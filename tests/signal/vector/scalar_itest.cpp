@@ -14,6 +14,7 @@
 #include <random>
 #include <vector>
 
+#include "vector_support.h"
 #include "zorinternal.h"
 
 #ifdef ZOR_HAVE_QUADMATH
@@ -28,17 +29,8 @@ using SinCosOne = zortest::LevelTest;
 const double kInf = std::numeric_limits<double>::infinity();
 const double kNaN = std::numeric_limits<double>::quiet_NaN();
 
-uint64_t bits(double x) {
-    uint64_t u;
-    std::memcpy(&u, &x, 8);
-    return u;
-}
-
-double from_bits(uint64_t u) {
-    double x;
-    std::memcpy(&x, &u, 8);
-    return x;
-}
+using vt::bits;
+const auto from_bits = vt::f64;
 
 // ---- floor, ceiling, square root --------------------------------------------
 

@@ -180,6 +180,17 @@ void sweep(const std::vector<std::vector<T>>& data, bool inplace, int unit, bool
             }
 }
 
+// A copy (or move without overlap) of elements of type T: every length and
+// placement, compared as bytes; then the null check.
+template <typename T> void copy_sweep(ZorStatus (*fn)(const T*, T*, int32_t)) {
+    std::vector<std::vector<uint8_t>> d(1, std::vector<uint8_t>(8200 * sizeof(T)));
+    for (size_t i = 0; i < d[0].size(); ++i) d[0][i] = (uint8_t)(i * 13 + 5);
+    sweep<uint8_t>(d, false, sizeof(T), true,
+                   [&](const uint8_t* const* s, uint8_t* o, int32_t n) { return fn((const T*)s[0], (T*)o, n); },
+                   [&](size_t i) { return d[0][i]; });
+    EXPECT_EQ(fn(nullptr, nullptr, 0), zorStsNullPtrErr);
+}
+
 }  // namespace vt
 
 #endif
