@@ -100,9 +100,6 @@ template <typename V> inline V med3(V a, V b, V c) {
     return vmax(vmin(a, b), vmin(vmax(a, b), c));
 }
 
-// Counters of the histogram kernels start at zero.
-inline void zero_counters(int32_t* p, int32_t n) { memset(p, 0, (size_t)n * sizeof *p); }
-
 // Loads of one vector or one element from a byte address.
 template <typename V> inline V ld(const void* p) {
     V v;

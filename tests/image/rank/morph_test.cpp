@@ -507,23 +507,6 @@ template <typename T> void same_on_every_level() {
 TEST(MorphLevels, SameBitsOnEveryLevel32f) { same_on_every_level<Zor32f>(); }
 TEST(MorphLevels, SameBitsOnEveryLevel8u) { same_on_every_level<Zor8u>(); }
 
-// Records are the same bytes on every level, apart from the pointers
-// into themselves.
-TEST(MorphLevels, RecordIsTheSameOnEveryLevel) {
-    const Mask m = random_mask(9, 6, 21, 50);
-    std::vector<uint8_t> first;
-    for (const zortest::Level& l : zortest::all_levels()) {
-        if (!zortest::runnable(l)) continue;
-        zorSetCpuFeatures(l.select);
-        Record r = make_record<Zor16s>({10, 10}, m);
-        std::vector<uint8_t> bytes(r.spec.begin() + 8, r.spec.begin() + 40);
-        bytes.insert(bytes.end(), r.spec.begin() + 136, r.spec.begin() + r.specSize);
-        if (first.empty()) first = bytes;
-        else EXPECT_EQ(bytes, first) << l.name;
-    }
-    zorInit();
-}
-
 // ---- the record -----------------------------------------------------------------------------
 
 struct HeadView {
