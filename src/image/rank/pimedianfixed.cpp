@@ -278,7 +278,44 @@ void square5(const Job<T>& j) {
     }
 }
 
+// Median of a 7x7 window of 8u pixels by forgetful selection. While the
+// values still standing number at least (m + 3) / 2 of the m still in
+// question (standing or not yet seen), their least and greatest cannot be
+// the median: both are dropped and the next value joins. 26 of the 49
+// start; after 23 rounds three are left, and their median is the result.
+template <typename X>
+inline X forget49(const uint8_t* p, ptrdiff_t step) {
+    X s[26];
+#pragma GCC unroll 26
+    for (int k = 0; k < 26; ++k) s[k] = ld<X>(p + (k / 7) * step + k % 7);
+#pragma GCC unroll 23
+    for (int r = 0; r < 23; ++r) {
+#pragma GCC unroll 25
+        for (int i = r + 1; i < 26; ++i) cex(s[r], s[i]);
+#pragma GCC unroll 24
+        for (int i = r + 1; i < 25; ++i) cex(s[i], s[25]);
+        const int k = 26 + r;
+        s[25] = ld<X>(p + (k / 7) * step + k % 7);
+    }
+    return med3(s[23], s[24], s[25]);
+}
+
 }  // namespace
+
+// Rows of at least one vector; the last vector ends at the row's end.
+void square7_8u(const Job<Zor8u>& j) {
+    typedef VecOf<Zor8u>::type V;
+    constexpr int32_t L = lanes<Zor8u>();
+    for (int32_t y = 0; y < j.height; ++y) {
+        const uint8_t* top = row_at(j.src, j.srcStep, (ptrdiff_t)y - 3) - 3;
+        uint8_t* d = row_at(j.dst, j.dstStep, y);
+        for (int32_t x = 0;; x += L) {
+            if (x + L > j.width) x = j.width - L;
+            st<V>(d + x, forget49<V>(top + x, j.srcStep));
+            if (x + L == j.width) break;
+        }
+    }
+}
 
 template <typename T> void fixed_1x3(const Job<T>& j) { run_taps<T, Net3>(j, j.srcStep); }
 template <typename T> void fixed_1x5(const Job<T>& j) { run_taps<T, Net5>(j, j.srcStep); }

@@ -68,15 +68,15 @@ void sliding_8u(const Job<Zor8u>& j, int32_t firstRow) {
     }
 }
 
-// Two output rows at a time: their windows share kh - 1 rows, whose
-// counters are kept once; each row adds its own window row. Counters are
-// 16-bit, four bins to a 64-bit word (n stays below 32768, so words add
-// without carries between lanes), and each median is first found to its
-// word, four bins a step, then to its lane. The two counts of pixels under
-// the medians' words travel in one 64-bit word (row a in the low half, row
-// b in the high one), and a table tells for each word of bins whether it
-// lies under either median's word, so that a pixel updates both counts with
-// one addition.
+// R output rows at a time (2 or 4): the window rows all of them read have
+// their counters kept once, and each output row has its own counters for
+// the rest of its window. Counters are 16-bit, four bins to a 64-bit word
+// (n stays below 32768, so words add without carries between lanes), and
+// each median is first found to its word, four bins a step, then to its
+// lane. The R counts of pixels under the medians' words travel as 16-bit
+// lanes of one 64-bit word, and a table tells for each word of bins which
+// medians' words lie above it, so that a pixel updates all counts with one
+// addition.
 constexpr uint64_t kLanes = 0x0001000100010001ull;
 
 // Each lane plus the lanes below it.
@@ -98,88 +98,93 @@ inline uint64_t word_at(const uint16_t* counts, int32_t w) {
     return v;
 }
 
-void sliding_8u_pairs(const Job<Zor8u>& j, int32_t y) {
+template <int R>
+void sliding_8u_rows(const Job<Zor8u>& j, int32_t y) {
     const int32_t kw = j.kw, kh = j.kh, rx = kw >> 1, ry = kh >> 1;
     const uint32_t t = (uint32_t)(kw * kh) >> 1;
     const ptrdiff_t step = j.srcStep;
-    uint16_t shared[256], own[2][256];
-    uint64_t under[64];  // bit 0: word under median a's word; bit 32: under b's
-    const Zor8u* rowA = row_at(j.src, step, (ptrdiff_t)y - ry);
-    const Zor8u* first = row_at(rowA, step, 1);
-    const Zor8u* rowB = row_at(rowA, step, kh);
-    Zor8u* dA = row_at(j.dst, j.dstStep, y);
-    Zor8u* dB = row_at(j.dst, j.dstStep, (ptrdiff_t)y + 1);
+    uint16_t shared[256], own[R][256];
+    uint64_t under[64];  // lane i: word under median i's word
+    // Window rows u = 0 .. kh + R - 2 from the first output row's top; row u
+    // belongs to outputs lo .. hi. Rows of all outputs come first.
+    const Zor8u* top = row_at(j.src, step, (ptrdiff_t)y - ry);
+    const Zor8u* rows[64];  // kh + R - 1 of them, at most 64
+    int32_t lo[64], hi[64];
+    int32_t nShared = 0, nRows = 0;
+    for (int32_t u = R - 1; u < kh; ++u, ++nShared, ++nRows) rows[nRows] = row_at(top, step, u);
+    for (int32_t u = 0; u < kh + R - 1; ++u) {
+        if (u >= R - 1 && u < kh) continue;
+        rows[nRows] = row_at(top, step, u);
+        lo[nRows] = u - kh + 1 > 0 ? u - kh + 1 : 0;
+        hi[nRows] = u < R - 1 ? u : R - 1;
+        ++nRows;
+    }
     ZOR_NAME(zorsZero_8u)((Zor8u*)shared, (int32_t)sizeof shared);
     ZOR_NAME(zorsZero_8u)((Zor8u*)own, (int32_t)sizeof own);
-    for (int32_t k = 0; k < kh - 1; ++k) {
-        const Zor8u* r = row_at(first, step, k);
-        for (int32_t dx = -rx; dx <= rx; ++dx) ++shared[r[dx]];
-    }
-    for (int32_t dx = -rx; dx <= rx; ++dx) {
-        ++own[0][rowA[dx]];
-        ++own[1][rowB[dx]];
-    }
-    int32_t wm[2] = {0, 0};
-    uint32_t sum[2] = {0, 0};
-    for (int h = 0; h < 2; ++h) {
+    ZOR_NAME(zorsZero_8u)((Zor8u*)under, (int32_t)sizeof under);
+    for (int32_t k = 0; k < nShared; ++k)
+        for (int32_t dx = -rx; dx <= rx; ++dx) ++shared[rows[k][dx]];
+    for (int32_t k = nShared; k < nRows; ++k)
+        for (int32_t i = lo[k]; i <= hi[k]; ++i)
+            for (int32_t dx = -rx; dx <= rx; ++dx) ++own[i][rows[k][dx]];
+
+    // Moves median i to its word again and returns it.
+    int32_t wm[R];
+    uint32_t sum[R];
+    auto walk = [&](int32_t i) {
+        const uint16_t* mine = own[i];
+        const uint64_t bit = 1ull << (16 * i);
+        int32_t w = wm[i];
+        uint32_t s = sum[i];
+        uint64_t word;
+        while (s > t) {
+            --w;
+            s -= (uint32_t)(lane_totals(word_at(shared, w) + word_at(mine, w)) >> 48);
+            under[w] &= ~bit;
+        }
         for (;;) {
-            const uint32_t n = (uint32_t)(lane_totals(word_at(shared, wm[h]) +
-                                                      word_at(own[h], wm[h])) >> 48);
-            if (sum[h] + n > t) break;
-            sum[h] += n;
-            ++wm[h];
+            word = word_at(shared, w) + word_at(mine, w);
+            const uint32_t n = (uint32_t)(lane_totals(word) >> 48);
+            if (s + n > t) break;
+            s += n;
+            under[w] |= bit;
+            ++w;
         }
+        wm[i] = w;
+        sum[i] = s;
+        return (Zor8u)(4 * w + lanes_within(word, t - s));
+    };
+    Zor8u* d[R];
+    for (int32_t i = 0; i < R; ++i) {
+        d[i] = row_at(j.dst, j.dstStep, (ptrdiff_t)y + i);
+        wm[i] = 0;
+        sum[i] = 0;
     }
-    for (int32_t w = 0; w < 64; ++w)
-        under[w] = (uint64_t)(w < wm[0]) | (uint64_t)(w < wm[1]) << 32;
     for (int32_t x = 0;; ++x) {
-        for (int h = 0; h < 2; ++h) {
-            const uint64_t bit = 1ull << (32 * h);
-            int32_t w = wm[h];
-            uint32_t s = sum[h];
-            uint64_t word;
-            while (s > t) {
-                --w;
-                s -= (uint32_t)(lane_totals(word_at(shared, w) + word_at(own[h], w)) >> 48);
-                under[w] &= ~bit;
-            }
-            for (;;) {
-                word = word_at(shared, w) + word_at(own[h], w);
-                const uint32_t n = (uint32_t)(lane_totals(word) >> 48);
-                if (s + n > t) break;
-                s += n;
-                under[w] |= bit;
-                ++w;
-            }
-            wm[h] = w;
-            sum[h] = s;
-            (h ? dB : dA)[x] = (Zor8u)(4 * w + lanes_within(word, t - s));
-        }
-        if (x + 1 == j.width) break;
-        uint64_t kept = (uint64_t)sum[0] + ((uint64_t)sum[1] << 32);
-        const Zor8u* r = first + x + 1;
 #pragma GCC unroll 4
-        for (int32_t k = 0; k < kh - 1; ++k, r += step) {
-            const int32_t out = r[-rx - 1], in = r[rx];
+        for (int32_t i = 0; i < R; ++i) d[i][x] = walk(i);
+        if (x + 1 == j.width) break;
+        uint64_t kept = 0;
+        for (int32_t i = 0; i < R; ++i) kept += (uint64_t)sum[i] << (16 * i);
+#pragma GCC unroll 4
+        for (int32_t k = 0; k < nShared; ++k) {
+            const int32_t out = rows[k][x - rx], in = rows[k][x + 1 + rx];
             --shared[out];
             ++shared[in];
             kept += under[in >> 2] - under[out >> 2];
         }
-        {
-            const int32_t out = rowA[x - rx], in = rowA[x + 1 + rx];
-            --own[0][out];
-            ++own[0][in];
-            kept += (under[in >> 2] & 1) - (under[out >> 2] & 1);
+        for (int32_t k = nShared; k < nRows; ++k) {
+            const int32_t out = rows[k][x - rx], in = rows[k][x + 1 + rx];
+            uint64_t lanes = 0;
+            for (int32_t i = lo[k]; i <= hi[k]; ++i) {
+                --own[i][out];
+                ++own[i][in];
+                lanes |= 0xffffull << (16 * i);
+            }
+            // Whole-word arithmetic: each lane ends between 0 and n.
+            kept += (under[in >> 2] & lanes) - (under[out >> 2] & lanes);
         }
-        {
-            const int32_t out = rowB[x - rx], in = rowB[x + 1 + rx];
-            --own[1][out];
-            ++own[1][in];
-            kept += (under[in >> 2] & (1ull << 32)) - (under[out >> 2] & (1ull << 32));
-        }
-        // Each half is a count from 0 to n again, so the word splits cleanly.
-        sum[0] = (uint32_t)kept;
-        sum[1] = (uint32_t)(kept >> 32);
+        for (int32_t i = 0; i < R; ++i) sum[i] = (uint32_t)(kept >> (16 * i)) & 0xffff;
     }
 }
 
@@ -289,10 +294,17 @@ void general_8u(const Job<Zor8u>& j) {
         column_bubble_8u(j);
         return;
     }
-    // A mask one row high shares nothing between rows.
+    if (j.kw == 7 && j.kh == 7 && j.width >= lanes<Zor8u>()) {
+        square7_8u(j);
+        return;
+    }
+    // A mask one row high shares nothing between rows; 16-bit counters
+    // hold n below 32768.
     int32_t y = 0;
-    if (j.kh > 1 && j.kw * j.kh < 32768)
-        for (; y + 1 < j.height; y += 2) sliding_8u_pairs(j, y);
+    if (j.kh > 1 && j.kw * j.kh < 32768 && j.kh < 61) {
+        for (; y + 3 < j.height; y += 4) sliding_8u_rows<4>(j, y);
+        for (; y + 1 < j.height; y += 2) sliding_8u_rows<2>(j, y);
+    }
     sliding_8u(j, y);
 }
 
