@@ -10,6 +10,7 @@
 
 #include "border_type.h"
 #include "morph_internal.h"
+#include "rank_bands.h"
 
 ZOR_BEGIN
 namespace morph {
@@ -198,98 +199,8 @@ ZorStatus init(ZoriSize roi, const Zor8u* pMask, ZoriSize mask, ZoriMorphState* 
 
 // ---- the driver ---------------------------------------------------------------
 
-// copy(): TEMPORARY, a frame of width 0 (a plain copy) until the image
-// copies zoriCopy_8u/16u/16s/32f_C1R land; then call those.
-template <typename T> struct Frames;
-template <> struct Frames<Zor8u> {
-    static void copy(const Zor8u* s, int32_t ss, Zor8u* d, int32_t ds, ZoriSize r) {
-        ZOR_NAME(zoriCopyConstBorder_8u_C1R)(s, ss, r, d, ds, r, 0, 0, Zor8u());
-    }
-    static void repl(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyReplicateBorder_8u_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void mirr(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyMirrorBorder_8u_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void cnst(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left, Zor8u v) {
-        ZOR_NAME(zoriCopyConstBorder_8u_C1R)(s, ss, sr, d, ds, dr, top, left, v);
-    }
-};
-template <> struct Frames<Zor16u> {
-    static void copy(const Zor16u* s, int32_t ss, Zor16u* d, int32_t ds, ZoriSize r) {
-        ZOR_NAME(zoriCopyConstBorder_16u_C1R)(s, ss, r, d, ds, r, 0, 0, Zor16u());
-    }
-    static void repl(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyReplicateBorder_16u_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void mirr(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyMirrorBorder_16u_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void cnst(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left, Zor16u v) {
-        ZOR_NAME(zoriCopyConstBorder_16u_C1R)(s, ss, sr, d, ds, dr, top, left, v);
-    }
-};
-template <> struct Frames<Zor16s> {
-    static void copy(const Zor16s* s, int32_t ss, Zor16s* d, int32_t ds, ZoriSize r) {
-        ZOR_NAME(zoriCopyConstBorder_16s_C1R)(s, ss, r, d, ds, r, 0, 0, Zor16s());
-    }
-    static void repl(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyReplicateBorder_16s_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void mirr(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyMirrorBorder_16s_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void cnst(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left, Zor16s v) {
-        ZOR_NAME(zoriCopyConstBorder_16s_C1R)(s, ss, sr, d, ds, dr, top, left, v);
-    }
-};
-template <> struct Frames<Zor32f> {
-    static void copy(const Zor32f* s, int32_t ss, Zor32f* d, int32_t ds, ZoriSize r) {
-        ZOR_NAME(zoriCopyConstBorder_32f_C1R)(s, ss, r, d, ds, r, 0, 0, Zor32f());
-    }
-    static void repl(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyReplicateBorder_32f_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void mirr(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left) {
-        ZOR_NAME(zoriCopyMirrorBorder_32f_C1R)(s, ss, sr, d, ds, dr, top, left);
-    }
-    static void cnst(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds, ZoriSize dr,
-                     int32_t top, int32_t left, Zor32f v) {
-        ZOR_NAME(zoriCopyConstBorder_32f_C1R)(s, ss, sr, d, ds, dr, top, left, v);
-    }
-};
-
-// One framed temporary: the source rectangle at the temporary's (left,
-// top), the rest made up by the border kind (replicate, mirror or const).
-template <typename T>
-void make_frame(int32_t kind, const T* src, int32_t srcStep, int32_t sw, int32_t sh, T* tmp,
-                int32_t tw, int32_t th, int32_t top, int32_t left, T value) {
-    const int32_t ts = tw * (int32_t)sizeof(T);
-    if (kind == zorBorderRepl)
-        Frames<T>::repl(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left);
-    else if (kind == zorBorderMirror)
-        Frames<T>::mirr(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left);
-    else
-        Frames<T>::cnst(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left, value);
-}
-
-template <typename T> inline const T* at(const T* p, int32_t step, int32_t dy, int32_t dx) {
-    return (const T*)((const uint8_t*)p + (ptrdiff_t)dy * step) + dx;
-}
-template <typename T> inline T* at(T* p, int32_t step, int32_t dy, int32_t dx) {
-    return (T*)((uint8_t*)p + (ptrdiff_t)dy * step) + dx;
-}
+using rank::at;
+using rank::Copies;
 
 template <typename T> using Kernel = void (*)(const Job<T>&);
 
@@ -321,100 +232,27 @@ void drive(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t W, in
     memcpy(&hd, state, sizeof hd);
     const int32_t mw = hd.maskWidth, mh = hd.maskHeight;
     if ((mw == 1 && mh == 1) || (hd.maskFeature & kEmpty)) {
-        Frames<T>::copy(src, srcStep, dst, dstStep, {W, H});
+        Copies<T>::copy(src, srcStep, dst, dstStep, {W, H});
         return;
     }
     const Kernel<T> kernel = pick<T, Op>(hd);
     const int32_t ax = (mw - 1) >> 1, ay = (mh - 1) >> 1;
-    const int32_t right = mw - ax - 1, bottom = mh - ay - 1;
-    const int32_t kind = zorBorderKind(borderType);
-    const bool small = W <= mw || H <= mh;
-
-    // A side the mask does not reach counts as being in memory.
-    int32_t flags = borderType & zorBorderFlagMask;
-    if (ax == 0) {
-        flags |= zorBorderInMemLeft;
-        if (right == 0) flags |= zorBorderInMemRight;
-    }
-    if (ay == 0) {
-        flags |= zorBorderInMemTop;
-        if (bottom == 0) flags |= zorBorderInMemBottom;
-    }
-
     T* tmp = align32((T*)buffer);
-    const int64_t frameBytes = round32(frame_elems(mw, mh, ax, ay, W, H) * (int64_t)sizeof(T));
     Job<T> job;
     job.head = &hd;
-    job.ring = (uint8_t*)tmp + frameBytes;
-    auto run = [&](const T* s, int32_t ss, T* d, int32_t w, int32_t h) {
-        job.src = s;
-        job.srcStep = ss;
-        job.dst = d;
-        job.dstStep = dstStep;
-        job.width = w;
-        job.height = h;
-        kernel(job);
-    };
-
-    if (flags == zorBorderInMem) {
-        run(at(src, srcStep, -ay, -ax), srcStep, dst, W, H);
-        return;
-    }
-    const bool inT = flags & zorBorderInMemTop, inB = flags & zorBorderInMemBottom;
-    const bool inL = flags & zorBorderInMemLeft, inR = flags & zorBorderInMemRight;
-
-    if (small) {
-        // One frame for the whole ROI; sides in memory enlarge the copied
-        // rectangle instead of being made up.
-        const int32_t tw = W + mw - 1, th = H + mh - 1;
-        const int32_t sw = W + (inL ? ax : 0) + (inR ? right : 0);
-        const int32_t sh = H + (inT ? ay : 0) + (inB ? bottom : 0);
-        make_frame(kind, at(src, srcStep, inT ? -ay : 0, inL ? -ax : 0), srcStep, sw, sh, tmp, tw,
-                   th, inT ? 0 : ay, inL ? 0 : ax, value);
-        run(tmp, tw * (int32_t)sizeof(T), dst, W, H);
-        return;
-    }
-
-    // Top and bottom bands span the full width; their corners come from
-    // memory where the left or right side is there, else from the frame.
-    const int32_t bandX = inL ? -ax : 0;
-    const int32_t bandW = W + (inL ? ax : 0) + (inR ? right : 0);
-    const int32_t bandLeft = inL ? 0 : ax;
-    const int32_t bandTw = W + mw - 1;
-    if (!inT) {
-        make_frame(kind, at(src, srcStep, 0, bandX), srcStep, bandW, mh - 1, tmp, bandTw,
-                   ay + mh - 1, ay, bandLeft, value);
-        run(tmp, bandTw * (int32_t)sizeof(T), dst, W, ay);
-        src = at(src, srcStep, ay, 0);
-        dst = at(dst, dstStep, ay, 0);
-        H -= ay;
-    }
-    if (!inB) {
-        const int32_t rows = mh - 1;
-        make_frame(kind, at(src, srcStep, H - rows, bandX), srcStep, bandW, rows, tmp, bandTw,
-                   rows + bottom, 0, bandLeft, value);
-        run(tmp, bandTw * (int32_t)sizeof(T), at(dst, dstStep, H - bottom, 0), W, bottom);
-        H -= bottom;
-    }
-    // Left and right bands need no vertical frame: the rows above and below
-    // what remains are real, taken off by the bands above or in memory.
-    if (!inL) {
-        const int32_t tw = mw + ax - 1, th = mh + H - 1;
-        make_frame(kind, at(src, srcStep, -ay, 0), srcStep, mw - 1, th, tmp, tw, th, 0, ax, value);
-        run(tmp, tw * (int32_t)sizeof(T), dst, ax, H);
-        src += ax;
-        dst += ax;
-        W -= ax;
-    }
-    if (!inR) {
-        const int32_t cols = mw - 1;
-        const int32_t tw = cols + right, th = mh + H - 1;
-        make_frame(kind, at(src, srcStep, -ay, W - cols), srcStep, cols, th, tmp, tw, th, 0, 0,
-                   value);
-        run(tmp, tw * (int32_t)sizeof(T), dst + (W - right), right, H);
-        W -= right;
-    }
-    run(at(src, srcStep, -ay, -ax), srcStep, dst, W, H);
+    job.ring = (uint8_t*)tmp + round32(frame_elems(mw, mh, ax, ay, W, H) * (int64_t)sizeof(T));
+    job.dstStep = dstStep;
+    rank::cut_bands<T>(
+        src, srcStep, W, H, ax, ay, borderType & zorBorderFlagMask, zorBorderKind(borderType),
+        value, tmp,
+        [&](int32_t, const T* s, int32_t ss, int32_t x, int32_t y, int32_t w, int32_t h) {
+            job.src = at(s, ss, -ay, -ax);
+            job.srcStep = ss;
+            job.dst = at(dst, dstStep, y, x);
+            job.width = w;
+            job.height = h;
+            kernel(job);
+        });
 }
 
 template <typename T, typename Op>

@@ -50,6 +50,8 @@ template <typename T> void fixed_5x1(const Job<T>& j);
 template <typename T> void fixed_3x3(const Job<T>& j);
 template <typename T> void fixed_5x5(const Job<T>& j);
 void fixed_1x7_16s(const Job<Zor16s>& j);
+// 8u 7x7 on rows of at least one vector (a general mask with a network).
+void square7_8u(const Job<Zor8u>& j);
 void fixed_7x1_16s(const Job<Zor16s>& j);
 
 // Any other mask (pimedianhist.cpp, pimedian32f.cpp).
@@ -99,9 +101,6 @@ template <typename V> inline void cex(V& a, V& b) {
 template <typename V> inline V med3(V a, V b, V c) {
     return vmax(vmin(a, b), vmin(vmax(a, b), c));
 }
-
-// Counters of the histogram kernels start at zero.
-inline void zero_counters(int32_t* p, int32_t n) { memset(p, 0, (size_t)n * sizeof *p); }
 
 // Loads of one vector or one element from a byte address.
 template <typename V> inline V ld(const void* p) {

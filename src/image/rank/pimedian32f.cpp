@@ -159,7 +159,7 @@ struct KeyHist {
         int32_t* l2 = tab->l2;
         const int32_t rank2 = t - b1;
         if (!valid2) {
-            zero_counters(l2, 2048);
+            ZOR_NAME(zorsZero_32s)(l2, 2048);
             for (int32_t i = 0; i < n; ++i)
                 if ((int32_t)(keys[i] >> 21) == m1) ++l2[(keys[i] >> 10) & 0x7ff];
             m2 = 0;
@@ -176,7 +176,7 @@ struct KeyHist {
         const int32_t rank3 = rank2 - b2;
         const uint32_t high = (uint32_t)m1 << 21 | (uint32_t)m2 << 10;
         if (!valid3) {
-            zero_counters(l3, 1024);
+            ZOR_NAME(zorsZero_32s)(l3, 1024);
             for (int32_t i = 0; i < n; ++i)
                 if ((keys[i] & ~0x3ffu) == high) ++l3[keys[i] & 0x3ff];
             m3 = 0;
@@ -202,7 +202,7 @@ void key_histogram(const Job<Zor32f>& j, KeyTables* tab, uint32_t* keys) {
     for (int32_t y = 0; y < j.height; ++y) {
         const Zor32f* top = row_at(j.src, step, (ptrdiff_t)y - ry);
         Zor32f* d = row_at(j.dst, j.dstStep, y);
-        zero_counters(tab->l1, 2048);
+        ZOR_NAME(zorsZero_32s)(tab->l1, 2048);
         h.m1 = h.b1 = 0;
         h.m2 = h.b2 = h.m3 = h.b3 = 0;
         h.valid2 = h.valid3 = false;

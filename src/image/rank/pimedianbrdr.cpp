@@ -8,6 +8,7 @@
 
 #include "border_type.h"
 #include "median_internal.h"
+#include "rank_bands.h"
 
 ZOR_BEGIN
 namespace {
@@ -85,68 +86,17 @@ int64_t multi_channel_bytes(int64_t W, int64_t H, int64_t kw, int64_t kh, int32_
 
 // ---- the driver -------------------------------------------------------------
 
-// Per element type: the kernel table and the copies that frame a band.
-template <typename T> struct Ops;
+using rank::Copies;
 
-template <> struct Ops<Zor8u> {
-    static Kernel<Zor8u> general() { return general_8u; }
-    static ZorStatus copy(const Zor8u* s, int32_t ss, Zor8u* d, int32_t ds, ZoriSize r) {
-        return ZOR_NAME(zoriCopy_8u_C1R)(s, ss, d, ds, r);
-    }
-    static ZorStatus repl(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds,
-                          ZoriSize dr, int32_t t, int32_t l) {
-        return ZOR_NAME(zoriCopyReplicateBorder_8u_C1R)(s, ss, sr, d, ds, dr, t, l);
-    }
-    static ZorStatus cnst(const Zor8u* s, int32_t ss, ZoriSize sr, Zor8u* d, int32_t ds,
-                          ZoriSize dr, int32_t t, int32_t l, Zor8u v) {
-        return ZOR_NAME(zoriCopyConstBorder_8u_C1R)(s, ss, sr, d, ds, dr, t, l, v);
-    }
-};
-
-template <> struct Ops<Zor16u> {
-    static Kernel<Zor16u> general() { return general_16u; }
-    static ZorStatus copy(const Zor16u* s, int32_t ss, Zor16u* d, int32_t ds, ZoriSize r) {
-        return ZOR_NAME(zoriCopy_16u_C1R)(s, ss, d, ds, r);
-    }
-    static ZorStatus repl(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds,
-                          ZoriSize dr, int32_t t, int32_t l) {
-        return ZOR_NAME(zoriCopyReplicateBorder_16u_C1R)(s, ss, sr, d, ds, dr, t, l);
-    }
-    static ZorStatus cnst(const Zor16u* s, int32_t ss, ZoriSize sr, Zor16u* d, int32_t ds,
-                          ZoriSize dr, int32_t t, int32_t l, Zor16u v) {
-        return ZOR_NAME(zoriCopyConstBorder_16u_C1R)(s, ss, sr, d, ds, dr, t, l, v);
-    }
-};
-
-template <> struct Ops<Zor16s> {
-    static Kernel<Zor16s> general() { return general_16s; }
-    static ZorStatus copy(const Zor16s* s, int32_t ss, Zor16s* d, int32_t ds, ZoriSize r) {
-        return ZOR_NAME(zoriCopy_16s_C1R)(s, ss, d, ds, r);
-    }
-    static ZorStatus repl(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds,
-                          ZoriSize dr, int32_t t, int32_t l) {
-        return ZOR_NAME(zoriCopyReplicateBorder_16s_C1R)(s, ss, sr, d, ds, dr, t, l);
-    }
-    static ZorStatus cnst(const Zor16s* s, int32_t ss, ZoriSize sr, Zor16s* d, int32_t ds,
-                          ZoriSize dr, int32_t t, int32_t l, Zor16s v) {
-        return ZOR_NAME(zoriCopyConstBorder_16s_C1R)(s, ss, sr, d, ds, dr, t, l, v);
-    }
-};
-
-template <> struct Ops<Zor32f> {
-    static Kernel<Zor32f> general() { return general_32f; }
-    static ZorStatus copy(const Zor32f* s, int32_t ss, Zor32f* d, int32_t ds, ZoriSize r) {
-        return ZOR_NAME(zoriCopy_32f_C1R)(s, ss, d, ds, r);
-    }
-    static ZorStatus repl(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds,
-                          ZoriSize dr, int32_t t, int32_t l) {
-        return ZOR_NAME(zoriCopyReplicateBorder_32f_C1R)(s, ss, sr, d, ds, dr, t, l);
-    }
-    static ZorStatus cnst(const Zor32f* s, int32_t ss, ZoriSize sr, Zor32f* d, int32_t ds,
-                          ZoriSize dr, int32_t t, int32_t l, Zor32f v) {
-        return ZOR_NAME(zoriCopyConstBorder_32f_C1R)(s, ss, sr, d, ds, dr, t, l, v);
-    }
-};
+template <typename T> Kernel<T> general(int32_t kw, int32_t kh);
+template <> Kernel<Zor8u> general<Zor8u>(int32_t, int32_t) { return general_8u; }
+template <> Kernel<Zor16u> general<Zor16u>(int32_t, int32_t) { return general_16u; }
+template <> Kernel<Zor32f> general<Zor32f>(int32_t, int32_t) { return general_32f; }
+template <> Kernel<Zor16s> general<Zor16s>(int32_t kw, int32_t kh) {
+    if (kw == 1 && kh == 7) return fixed_1x7_16s;
+    if (kw == 7 && kh == 1) return fixed_7x1_16s;
+    return general_16s;
+}
 
 // The seven mask classes; the 16s general class tries its 7-tap lines first.
 template <typename T>
@@ -157,20 +107,7 @@ Kernel<T> class_kernel(int32_t kw, int32_t kh) {
     if (kw == 5 && kh == 1) return fixed_5x1<T>;
     if (kw == 3 && kh == 3) return fixed_3x3<T>;
     if (kw == 5 && kh == 5) return fixed_5x5<T>;
-    return Ops<T>::general();
-}
-
-template <>
-Kernel<Zor16s> class_kernel<Zor16s>(int32_t kw, int32_t kh) {
-    if (kw == 1 && kh == 3) return fixed_1x3<Zor16s>;
-    if (kw == 1 && kh == 5) return fixed_1x5<Zor16s>;
-    if (kw == 3 && kh == 1) return fixed_3x1<Zor16s>;
-    if (kw == 5 && kh == 1) return fixed_5x1<Zor16s>;
-    if (kw == 3 && kh == 3) return fixed_3x3<Zor16s>;
-    if (kw == 5 && kh == 5) return fixed_5x5<Zor16s>;
-    if (kw == 1 && kh == 7) return fixed_1x7_16s;
-    if (kw == 7 && kh == 1) return fixed_7x1_16s;
-    return general_16s;
+    return general<T>(kw, kh);
 }
 
 template <typename T>
@@ -214,23 +151,6 @@ void run_in_memory(Kernel<T> kernel, Job<T> job, uint8_t* ring) {
 }
 
 template <typename T>
-struct Border {
-    int32_t kind;
-    T value;
-};
-
-// Frames `srcSize` source pixels at `src` into `frame` (rows of
-// frameSize.width pixels) with `top` rows and `left` columns before them.
-template <typename T>
-ZorStatus make_frame(const Border<T>& b, const T* src, int32_t srcStep, ZoriSize srcSize, T* frame,
-                     ZoriSize frameSize, int32_t top, int32_t left) {
-    const int32_t frameStep = frameSize.width * (int32_t)sizeof(T);
-    if (b.kind == zorBorderConst)
-        return Ops<T>::cnst(src, srcStep, srcSize, frame, frameStep, frameSize, top, left, b.value);
-    return Ops<T>::repl(src, srcStep, srcSize, frame, frameStep, frameSize, top, left);
-}
-
-template <typename T>
 ZorStatus median_filter(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriSize roi,
                         ZoriSize mask, int32_t borderType, T borderValue, Zor8u* pBuffer,
                         int32_t dataType) {
@@ -247,7 +167,7 @@ ZorStatus median_filter(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep
     const int32_t kw = mask.width, kh = mask.height, W = roi.width, H = roi.height;
     if (kw == 1 && kh == 1) {
         if ((const void*)pSrc == (const void*)pDst) return zorStsNoErr;
-        return Ops<T>::copy(pSrc, srcStep, pDst, dstStep, roi);
+        return Copies<T>::copy(pSrc, srcStep, pDst, dstStep, roi);
     }
 
     int32_t flags = borderType == zorBorderInMem ? (int32_t)zorBorderInMem : borderType & 0xF0;
@@ -262,133 +182,59 @@ ZorStatus median_filter(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep
                 (flags & zorBorderInMemTop ? zorBorderInMemBottom : 0) |
                 (flags & zorBorderInMemBottom ? zorBorderInMemTop : 0);
     }
-    if (kw == 1) flags |= zorBorderInMemLeft | zorBorderInMemRight;
-    if (kh == 1) flags |= zorBorderInMemTop | zorBorderInMemBottom;
-    const bool inTop = flags & zorBorderInMemTop, inBottom = flags & zorBorderInMemBottom;
-    const bool inLeft = flags & zorBorderInMemLeft, inRight = flags & zorBorderInMemRight;
-
     const Kernel<T> kernel = class_kernel<T>(kw, kh);
     const int32_t rx = kw >> 1, ry = kh >> 1;
     const int32_t e = (int32_t)sizeof(T);
     const bool large = kw < W && kh < H;
-    const int64_t scratch = scratch_bytes(kw, kh, dataType);
-    const Border<T> border = {borderType & 0x0F, borderValue};
 
-    Job<T> job = {pSrc, srcStep, pDst, dstStep, W, H, kw, kh, nullptr};
-
+    // A ROI not larger than the mask: the frame, then the scratch (the
+    // frame's place is the ring when no frame is needed). Otherwise scratch,
+    // ring, the four result bands, then the band frames.
+    uint8_t *scratch, *ring, *frame;
+    T *topBand = nullptr, *bottomBand = nullptr, *leftBand = nullptr, *rightBand = nullptr;
     if (!large) {
-        const ZoriSize frameSize = {W + kw - 1, H + kh - 1};
-        uint8_t* const frameBytes = pBuffer;
-        job.scratch = pBuffer + align32((int64_t)frameSize.width * frameSize.height * e);
-        if (inTop && inBottom && inLeft && inRight) {
-            run_in_memory(kernel, job, frameBytes);  // the ring uses the frame's place
-            return zorStsNoErr;
-        }
-        // Sides in memory enlarge the copied rectangle instead of being framed.
-        const T* src = pSrc;
-        ZoriSize srcSize = roi;
-        if (inTop) src = row_at(src, srcStep, -ry), srcSize.height += ry;
-        if (inBottom) srcSize.height += ry;
-        if (inLeft) src -= rx, srcSize.width += rx;
-        if (inRight) srcSize.width += rx;
-        T* const frame = (T*)frameBytes;
-        const ZorStatus status = make_frame(border, src, srcStep, srcSize, frame, frameSize,
-                                            inTop ? 0 : ry, inLeft ? 0 : rx);
-        if (status != zorStsNoErr) return status;
-        job.src = row_at(frame, (ptrdiff_t)frameSize.width * e, ry) + rx;
-        job.srcStep = (ptrdiff_t)frameSize.width * e;
-        kernel(job);
-        return zorStsNoErr;
+        frame = ring = pBuffer;
+        scratch = pBuffer + align32((int64_t)(W + kw - 1) * (H + kh - 1) * e);
+    } else {
+        uint8_t* p = pBuffer;
+        scratch = p;
+        p += scratch_bytes(kw, kh, dataType);
+        ring = p;
+        p += ring_bytes(W, kh, e);
+        topBand = (T*)p;
+        p += align32((int64_t)W * ry * e);
+        bottomBand = (T*)p;
+        p += align32((int64_t)W * ry * e);
+        leftBand = (T*)p;
+        p += align32((int64_t)H * rx * e);
+        rightBand = (T*)p;
+        p += align32((int64_t)H * rx * e);
+        frame = p;
     }
-
-    // Scratch, ring, the four result bands, then the band frames.
-    uint8_t* p = pBuffer;
-    job.scratch = p;
-    p += scratch;
-    uint8_t* const ring = p;
-    p += ring_bytes(W, kh, e);
-    T* const topBand = (T*)p;
-    p += align32((int64_t)W * ry * e);
-    T* const bottomBand = (T*)p;
-    p += align32((int64_t)W * ry * e);
-    T* const leftBand = (T*)p;
-    p += align32((int64_t)H * rx * e);
-    T* const rightBand = (T*)p;
-    p += align32((int64_t)H * rx * e);
-    T* const frame = (T*)p;
-
-    int32_t y0 = 0, rows = H, x0 = 0, cols = W;
-    // Top band: ry output rows from the first kh - 1 source rows, with ry
-    // framed rows above; its corners are real where the sides are in memory.
-    auto horizontal_band = [&](int32_t firstRow, int32_t top, int32_t bottom, T* band) -> ZorStatus {
-        const ZoriSize srcSize = {W + (inLeft ? rx : 0) + (inRight ? rx : 0), kh - 1};
-        const ZoriSize frameSize = {W + kw - 1, kh - 1 + top + bottom};
-        const T* src = row_at(pSrc, srcStep, firstRow) - (inLeft ? rx : 0);
-        const ZorStatus status =
-            make_frame(border, src, srcStep, srcSize, frame, frameSize, top, inLeft ? 0 : rx);
-        if (status != zorStsNoErr) return status;
-        Job<T> band_job = job;
-        band_job.srcStep = (ptrdiff_t)frameSize.width * e;
-        band_job.src = row_at(frame, band_job.srcStep, ry) + rx;
-        band_job.dst = band;
-        band_job.dstStep = (ptrdiff_t)W * e;
-        band_job.width = W;
-        band_job.height = ry;
-        kernel(band_job);
-        return zorStsNoErr;
-    };
-    if (!inTop) {
-        const ZorStatus status = horizontal_band(0, ry, 0, topBand);
-        if (status != zorStsNoErr) return status;
-        y0 = ry;
-        rows -= ry;
-    }
-    if (!inBottom) {
-        const ZorStatus status = horizontal_band(H - kh + 1, 0, ry, bottomBand);
-        if (status != zorStsNoErr) return status;
-        rows -= ry;
-    }
-    // Left and right bands: rx output columns of the remaining rows; the
-    // rows above and below them are real (taken off by the top and bottom
-    // bands, or in memory).
-    auto vertical_band = [&](int32_t firstCol, int32_t left, int32_t right, T* band) -> ZorStatus {
-        const ZoriSize srcSize = {kw - 1, rows + kh - 1};
-        const ZoriSize frameSize = {kw - 1 + left + right, rows + kh - 1};
-        const T* src = row_at(pSrc, srcStep, y0 - ry) + firstCol;
-        const ZorStatus status =
-            make_frame(border, src, srcStep, srcSize, frame, frameSize, 0, left);
-        if (status != zorStsNoErr) return status;
-        Job<T> band_job = job;
-        band_job.srcStep = (ptrdiff_t)frameSize.width * e;
-        band_job.src = row_at(frame, band_job.srcStep, ry) + rx;
-        band_job.dst = band;
-        band_job.dstStep = (ptrdiff_t)rx * e;
-        band_job.width = rx;
-        band_job.height = rows;
-        kernel(band_job);
-        return zorStsNoErr;
-    };
-    if (!inLeft) {
-        const ZorStatus status = vertical_band(0, rx, 0, leftBand);
-        if (status != zorStsNoErr) return status;
-        x0 = rx;
-        cols -= rx;
-    }
-    if (!inRight) {
-        const ZorStatus status = vertical_band(W - kw + 1, 0, rx, rightBand);
-        if (status != zorStsNoErr) return status;
-        cols -= rx;
-    }
-
-    // Centre, straight on the caller's image.
-    Job<T> centre = job;
-    centre.src = row_at(pSrc, srcStep, y0) + x0;
-    centre.dst = row_at(pDst, dstStep, y0) + x0;
-    centre.width = cols;
-    centre.height = rows;
-    run_in_memory(kernel, centre, ring);
+    // Bands go to their result bands, the centre through the ring when in
+    // place; a whole frame has been read completely, so it goes to pDst.
+    const ZorStatus status = rank::cut_bands<T>(
+        pSrc, srcStep, W, H, rx, ry, flags, borderType & 0x0F, borderValue, (T*)frame,
+        [&](int32_t part, const T* s, int32_t ss, int32_t x, int32_t y, int32_t w, int32_t h) {
+            Job<T> job = {s, ss, rank::at(pDst, dstStep, y, x), dstStep, w, h, kw, kh, scratch};
+            switch (part) {
+                case rank::kTop: job.dst = topBand, job.dstStep = (ptrdiff_t)W * e; break;
+                case rank::kBottom: job.dst = bottomBand, job.dstStep = (ptrdiff_t)W * e; break;
+                case rank::kLeft: job.dst = leftBand, job.dstStep = (ptrdiff_t)rx * e; break;
+                case rank::kRight: job.dst = rightBand, job.dstStep = (ptrdiff_t)rx * e; break;
+                case rank::kCentre: run_in_memory(kernel, job, ring); return;
+                default: break;
+            }
+            kernel(job);
+        });
+    if (status != zorStsNoErr || !large) return status;
 
     // Bands last: every source pixel has been read by now.
+    const bool inTop = flags & zorBorderInMemTop || kh == 1;
+    const bool inBottom = flags & zorBorderInMemBottom || kh == 1;
+    const bool inLeft = flags & zorBorderInMemLeft || kw == 1;
+    const bool inRight = flags & zorBorderInMemRight || kw == 1;
+    const int32_t y0 = inTop ? 0 : ry, rows = H - (inTop ? 0 : ry) - (inBottom ? 0 : ry);
     if (!inTop) copy_rows(topBand, (ptrdiff_t)W * e, pDst, dstStep, W, ry);
     if (!inBottom)
         copy_rows(bottomBand, (ptrdiff_t)W * e, row_at(pDst, dstStep, H - ry), dstStep, W, ry);

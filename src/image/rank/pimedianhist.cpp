@@ -45,7 +45,7 @@ void sliding_8u(const Job<Zor8u>& j, int32_t firstRow) {
     for (int32_t y = firstRow; y < j.height; ++y) {
         const Zor8u* top = row_at(j.src, step, (ptrdiff_t)y - ry);
         Zor8u* d = row_at(j.dst, j.dstStep, y);
-        zero_counters(hist, 256);
+        ZOR_NAME(zorsZero_32s)(hist, 256);
         for (int32_t k = 0; k < kh; ++k) {
             const Zor8u* r = row_at(top, step, k);
             for (int32_t dx = -rx; dx <= rx; ++dx) ++hist[r[dx]];
@@ -68,87 +68,123 @@ void sliding_8u(const Job<Zor8u>& j, int32_t firstRow) {
     }
 }
 
-// Two output rows at a time: their windows share kh - 1 rows, whose
-// counters are kept once; each row adds its own window row. The two kept
-// sums travel in one 64-bit word (row a in the low half, row b in the
-// high one), and a table tells for each bin whether it lies below either
-// median, so that a pixel updates both sums with one addition.
-void sliding_8u_pairs(const Job<Zor8u>& j, int32_t y) {
+// R output rows at a time (2 or 4): the window rows all of them read have
+// their counters kept once, and each output row has its own counters for
+// the rest of its window. Counters are 16-bit, four bins to a 64-bit word
+// (n stays below 32768, so words add without carries between lanes), and
+// each median is first found to its word, four bins a step, then to its
+// lane. The R counts of pixels under the medians' words travel as 16-bit
+// lanes of one 64-bit word, and a table tells for each word of bins which
+// medians' words lie above it, so that a pixel updates all counts with one
+// addition.
+constexpr uint64_t kLanes = 0x0001000100010001ull;
+
+// Each lane plus the lanes below it.
+inline uint64_t lane_totals(uint64_t w) {
+    w += w << 16;
+    return w + (w << 32);
+}
+
+// How many leading lanes of a word hold running totals of at most r: a
+// lane of (r | 0x8000) - total keeps its top bit exactly then.
+inline int32_t lanes_within(uint64_t w, uint32_t r) {
+    const uint64_t kept = (((uint64_t)(r | 0x8000u) * kLanes - lane_totals(w)) >> 15) & kLanes;
+    return (int32_t)(lane_totals(kept) >> 48);
+}
+
+inline uint64_t word_at(const uint16_t* counts, int32_t w) {
+    uint64_t v;
+    memcpy(&v, counts + 4 * w, 8);
+    return v;
+}
+
+template <int R>
+void sliding_8u_rows(const Job<Zor8u>& j, int32_t y) {
     const int32_t kw = j.kw, kh = j.kh, rx = kw >> 1, ry = kh >> 1;
-    const int32_t t = (kw * kh) >> 1;
+    const uint32_t t = (uint32_t)(kw * kh) >> 1;
     const ptrdiff_t step = j.srcStep;
-    int32_t shared[256], own[2][256];
-    uint64_t below[256];  // bit 0: bin under median a; bit 32: under median b
-    const Zor8u* rowA = row_at(j.src, step, (ptrdiff_t)y - ry);
-    const Zor8u* first = row_at(rowA, step, 1);
-    const Zor8u* rowB = row_at(rowA, step, kh);
-    Zor8u* dA = row_at(j.dst, j.dstStep, y);
-    Zor8u* dB = row_at(j.dst, j.dstStep, (ptrdiff_t)y + 1);
-    zero_counters(shared, 256);
-    zero_counters(own[0], 256);
-    zero_counters(own[1], 256);
-    for (int32_t k = 0; k < kh - 1; ++k) {
-        const Zor8u* r = row_at(first, step, k);
-        for (int32_t dx = -rx; dx <= rx; ++dx) ++shared[r[dx]];
+    uint16_t shared[256], own[R][256];
+    uint64_t under[64];  // lane i: word under median i's word
+    // Window rows u = 0 .. kh + R - 2 from the first output row's top; row u
+    // belongs to outputs lo .. hi. Rows of all outputs come first.
+    const Zor8u* top = row_at(j.src, step, (ptrdiff_t)y - ry);
+    const Zor8u* rows[64];  // kh + R - 1 of them, at most 64
+    int32_t lo[64], hi[64];
+    int32_t nShared = 0, nRows = 0;
+    for (int32_t u = R - 1; u < kh; ++u, ++nShared, ++nRows) rows[nRows] = row_at(top, step, u);
+    for (int32_t u = 0; u < kh + R - 1; ++u) {
+        if (u >= R - 1 && u < kh) continue;
+        rows[nRows] = row_at(top, step, u);
+        lo[nRows] = u - kh + 1 > 0 ? u - kh + 1 : 0;
+        hi[nRows] = u < R - 1 ? u : R - 1;
+        ++nRows;
     }
-    for (int32_t dx = -rx; dx <= rx; ++dx) {
-        ++own[0][rowA[dx]];
-        ++own[1][rowB[dx]];
+    ZOR_NAME(zorsZero_8u)((Zor8u*)shared, (int32_t)sizeof shared);
+    ZOR_NAME(zorsZero_8u)((Zor8u*)own, (int32_t)sizeof own);
+    ZOR_NAME(zorsZero_8u)((Zor8u*)under, (int32_t)sizeof under);
+    for (int32_t k = 0; k < nShared; ++k)
+        for (int32_t dx = -rx; dx <= rx; ++dx) ++shared[rows[k][dx]];
+    for (int32_t k = nShared; k < nRows; ++k)
+        for (int32_t i = lo[k]; i <= hi[k]; ++i)
+            for (int32_t dx = -rx; dx <= rx; ++dx) ++own[i][rows[k][dx]];
+
+    // Moves median i to its word again and returns it.
+    int32_t wm[R];
+    uint32_t sum[R];
+    auto walk = [&](int32_t i) {
+        const uint16_t* mine = own[i];
+        const uint64_t bit = 1ull << (16 * i);
+        int32_t w = wm[i];
+        uint32_t s = sum[i];
+        uint64_t word;
+        while (s > t) {
+            --w;
+            s -= (uint32_t)(lane_totals(word_at(shared, w) + word_at(mine, w)) >> 48);
+            under[w] &= ~bit;
+        }
+        for (;;) {
+            word = word_at(shared, w) + word_at(mine, w);
+            const uint32_t n = (uint32_t)(lane_totals(word) >> 48);
+            if (s + n > t) break;
+            s += n;
+            under[w] |= bit;
+            ++w;
+        }
+        wm[i] = w;
+        sum[i] = s;
+        return (Zor8u)(4 * w + lanes_within(word, t - s));
+    };
+    Zor8u* d[R];
+    for (int32_t i = 0; i < R; ++i) {
+        d[i] = row_at(j.dst, j.dstStep, (ptrdiff_t)y + i);
+        wm[i] = 0;
+        sum[i] = 0;
     }
-    int32_t med[2], sum[2];
-    for (int h = 0; h < 2; ++h) {
-        med[h] = 0;
-        sum[h] = 0;
-        while (sum[h] + shared[med[h]] + own[h][med[h]] <= t)
-            sum[h] += shared[med[h]] + own[h][med[h]], ++med[h];
-    }
-    for (int32_t b = 0; b < 256; ++b)
-        below[b] = (uint64_t)(b < med[0]) | (uint64_t)(b < med[1]) << 32;
-    dA[0] = (Zor8u)med[0];
-    dB[0] = (Zor8u)med[1];
-    for (int32_t x = 1; x < j.width; ++x) {
-        uint64_t kept = (uint64_t)sum[0] + ((uint64_t)sum[1] << 32);
-        const Zor8u* r = first + x;
+    for (int32_t x = 0;; ++x) {
 #pragma GCC unroll 4
-        for (int32_t k = 0; k < kh - 1; ++k, r += step) {
-            const int32_t out = r[-rx - 1], in = r[rx];
+        for (int32_t i = 0; i < R; ++i) d[i][x] = walk(i);
+        if (x + 1 == j.width) break;
+        uint64_t kept = 0;
+        for (int32_t i = 0; i < R; ++i) kept += (uint64_t)sum[i] << (16 * i);
+#pragma GCC unroll 4
+        for (int32_t k = 0; k < nShared; ++k) {
+            const int32_t out = rows[k][x - rx], in = rows[k][x + 1 + rx];
             --shared[out];
             ++shared[in];
-            kept += below[in] - below[out];
+            kept += under[in >> 2] - under[out >> 2];
         }
-        {
-            const int32_t out = rowA[x - rx - 1], in = rowA[x + rx];
-            --own[0][out];
-            ++own[0][in];
-            kept += (below[in] & 1) - (below[out] & 1);
-        }
-        {
-            const int32_t out = rowB[x - rx - 1], in = rowB[x + rx];
-            --own[1][out];
-            ++own[1][in];
-            kept += (below[in] & (1ull << 32)) - (below[out] & (1ull << 32));
-        }
-        // Each half is a count from 0 to n again, so the word splits cleanly.
-        sum[0] = (int32_t)(uint32_t)kept;
-        sum[1] = (int32_t)(kept >> 32);
-        for (int h = 0; h < 2; ++h) {
-            const uint64_t bit = 1ull << (32 * h);
-            int32_t m = med[h], s = sum[h];
-            while (s > t) {
-                --m;
-                s -= shared[m] + own[h][m];
-                below[m] &= ~bit;
+        for (int32_t k = nShared; k < nRows; ++k) {
+            const int32_t out = rows[k][x - rx], in = rows[k][x + 1 + rx];
+            uint64_t lanes = 0;
+            for (int32_t i = lo[k]; i <= hi[k]; ++i) {
+                --own[i][out];
+                ++own[i][in];
+                lanes |= 0xffffull << (16 * i);
             }
-            while (s + shared[m] + own[h][m] <= t) {
-                s += shared[m] + own[h][m];
-                below[m] |= bit;
-                ++m;
-            }
-            med[h] = m;
-            sum[h] = s;
+            // Whole-word arithmetic: each lane ends between 0 and n.
+            kept += (under[in >> 2] & lanes) - (under[out >> 2] & lanes);
         }
-        dA[x] = (Zor8u)med[0];
-        dB[x] = (Zor8u)med[1];
+        for (int32_t i = 0; i < R; ++i) sum[i] = (uint32_t)(kept >> (16 * i)) & 0xffff;
     }
 }
 
@@ -176,8 +212,8 @@ template <typename T>
 void refine(Hist16& h, const T* top, ptrdiff_t step, int32_t x, int32_t kw, int32_t kh,
             int32_t t) {
     const int32_t rx = kw >> 1;
-    zero_counters(h.fine, 256);
-    zero_counters(h.group, 16);
+    ZOR_NAME(zorsZero_32s)(h.fine, 256);
+    ZOR_NAME(zorsZero_32s)(h.group, 16);
     for (int32_t k = 0; k < kh; ++k) {
         const T* r = row_at(top, step, k) + x;
         for (int32_t dx = -rx; dx <= rx; ++dx) {
@@ -220,7 +256,7 @@ void sliding_16(const Job<T>& j) {
     for (int32_t y = 0; y < j.height; ++y) {
         const T* top = row_at(j.src, step, (ptrdiff_t)y - ry);
         T* d = row_at(j.dst, j.dstStep, y);
-        zero_counters(h.coarse, 256);
+        ZOR_NAME(zorsZero_32s)(h.coarse, 256);
         for (int32_t k = 0; k < kh; ++k) {
             const T* r = row_at(top, step, k);
             for (int32_t dx = -rx; dx <= rx; ++dx) ++h.coarse[key_of<T>(r[dx]) >> 8];
@@ -258,10 +294,17 @@ void general_8u(const Job<Zor8u>& j) {
         column_bubble_8u(j);
         return;
     }
-    // A mask one row high shares nothing between rows.
+    if (j.kw == 7 && j.kh == 7 && j.width >= lanes<Zor8u>()) {
+        square7_8u(j);
+        return;
+    }
+    // A mask one row high shares nothing between rows; 16-bit counters
+    // hold n below 32768.
     int32_t y = 0;
-    if (j.kh > 1)
-        for (; y + 1 < j.height; y += 2) sliding_8u_pairs(j, y);
+    if (j.kh > 1 && j.kw * j.kh < 32768 && j.kh < 61) {
+        for (; y + 3 < j.height; y += 4) sliding_8u_rows<4>(j, y);
+        for (; y + 1 < j.height; y += 2) sliding_8u_rows<2>(j, y);
+    }
     sliding_8u(j, y);
 }
 

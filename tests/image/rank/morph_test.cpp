@@ -454,10 +454,10 @@ TEST_P(Morph, InfinityThroughGeneralAndRectanglePaths32f) {
 
 // ---- every level gives the same bits --------------------------------------------------
 
-// Values where the order of comparisons could show (signed zeros and
-// infinities), one record made on the processor's own level for all.
-template <typename T> std::vector<T> tricky_values(uint32_t seed, size_t n);
-template <> std::vector<Zor32f> tricky_values(uint32_t seed, size_t n) {
+// Floats where the order of comparisons could show (signed zeros and
+// infinities), one record made on the processor's own level for all; the
+// integer types are pinned to the model on every level already.
+std::vector<Zor32f> tricky_values(uint32_t seed, size_t n) {
     std::mt19937 rng(seed);
     const float pick[] = {0.0f, -0.0f, 1.0f, -1.0f, std::numeric_limits<float>::infinity(),
                           -std::numeric_limits<float>::infinity(), 2.5f};
@@ -465,16 +465,10 @@ template <> std::vector<Zor32f> tricky_values(uint32_t seed, size_t n) {
     for (auto& x : v) x = pick[rng() % 7];
     return v;
 }
-template <> std::vector<Zor8u> tricky_values(uint32_t seed, size_t n) {
-    std::mt19937 rng(seed);
-    std::vector<Zor8u> v(n);
-    for (auto& x : v) x = (Zor8u)rng();
-    return v;
-}
 
 template <typename T> void same_on_every_level() {
     const int W = 133, H = 21;
-    const std::vector<T> src = tricky_values<T>(77, (size_t)W * H);
+    const std::vector<T> src = tricky_values(77, (size_t)W * H);
     const Mask masks[] = {full(3, 3), full(5, 5), full(4, 7), make_mask(7, 7, "disc", kDisc7),
                           cross(5, 5, 2, 2), runs_mask(7, 6, 5), random_mask(9, 9, 6, 90),
                           random_mask(13, 13, 7, 80)};
@@ -505,24 +499,6 @@ template <typename T> void same_on_every_level() {
 }
 
 TEST(MorphLevels, SameBitsOnEveryLevel32f) { same_on_every_level<Zor32f>(); }
-TEST(MorphLevels, SameBitsOnEveryLevel8u) { same_on_every_level<Zor8u>(); }
-
-// Records are the same bytes on every level, apart from the pointers
-// into themselves.
-TEST(MorphLevels, RecordIsTheSameOnEveryLevel) {
-    const Mask m = random_mask(9, 6, 21, 50);
-    std::vector<uint8_t> first;
-    for (const zortest::Level& l : zortest::all_levels()) {
-        if (!zortest::runnable(l)) continue;
-        zorSetCpuFeatures(l.select);
-        Record r = make_record<Zor16s>({10, 10}, m);
-        std::vector<uint8_t> bytes(r.spec.begin() + 8, r.spec.begin() + 40);
-        bytes.insert(bytes.end(), r.spec.begin() + 136, r.spec.begin() + r.specSize);
-        if (first.empty()) first = bytes;
-        else EXPECT_EQ(bytes, first) << l.name;
-    }
-    zorInit();
-}
 
 // ---- the record -----------------------------------------------------------------------------
 
