@@ -50,6 +50,13 @@ static void report(void* ctx, const char* level) {
            sum == d->first ? "" : "  DIFFERS");
 }
 
+/* Rings of equal width need the radius itself; the demo links no libm. */
+static int32_t isqrt(uint32_t v) {
+    uint32_t r = 0;
+    while ((r + 1) * (r + 1) <= v) ++r;
+    return (int32_t)r;
+}
+
 static void rank_images(Zor8u* src, Zor8u* median, Zor8u* dilated, Zor8u* buffer,
                         ZoriMorphState* state) {
     static const Zor8u disc[25] = {0, 1, 1, 1, 0, 1, 1, 1, 1, 1, 1, 1, 1,
@@ -60,7 +67,7 @@ static void rank_images(Zor8u* src, Zor8u* median, Zor8u* dilated, Zor8u* buffer
     for (int32_t y = 0; y < kH; ++y)
         for (int32_t x = 0; x < kW; ++x) {
             const int32_t dx = x - kW / 2, dy = y - kH / 2;
-            const int32_t ring = ((dx * dx + dy * dy) >> 9) & 1;
+            const int32_t ring = (isqrt((uint32_t)(dx * dx + dy * dy)) / 24) & 1;
             Zor8u v = (Zor8u)(ring ? 200 - (x + y) / 8 : 40 + (x + y) / 8);
             rng = rng * 1103515245u + 12345u;
             const uint32_t r = (rng >> 16) % 20;
