@@ -7,8 +7,7 @@
 #include <stdlib.h>
 #include <string.h>
 
-#include "zor.h"
-#include "zor_levels.h"
+#include "bench_support.h"
 
 #ifdef ZOR_BENCH_OPENCV
 #include <opencv2/core.hpp>
@@ -19,12 +18,6 @@ namespace {
 
 constexpr int kW = 1920, kH = 1080, kB = 2;
 constexpr int kDW = kW + 2 * kB, kDH = kH + 2 * kB;
-
-uint64_t detected() {
-    uint64_t features = 0;
-    zorGetCpuFeatures(&features, nullptr);
-    return features;
-}
 
 // Contiguous rows, as the OpenCV matrices have them.
 struct Buffers {
@@ -95,15 +88,8 @@ void opencv_border(benchmark::State& state, int type, int border) {
 #endif
 
 int register_all() {
-#define BORDER_REGISTER(index, name, select, need)                                           \
-    if ((detected() & (need)) == (need)) {                                                   \
-        benchmark::RegisterBenchmark("border/replicate_8u/zor_" #name, replicate_8u, select) \
-            ->Unit(benchmark::kMicrosecond);                                                 \
-        benchmark::RegisterBenchmark("border/const_32f/zor_" #name, const_32f, select)       \
-            ->Unit(benchmark::kMicrosecond);                                                 \
-    }
-    ZOR_LEVEL_LIST(BORDER_REGISTER)
-#undef BORDER_REGISTER
+    zorbench::register_levels("border/replicate_8u/", benchmark::kMicrosecond, replicate_8u);
+    zorbench::register_levels("border/const_32f/", benchmark::kMicrosecond, const_32f);
     benchmark::RegisterBenchmark("border/replicate_8u/memcpy", memcpy_frame, (size_t)1)
         ->Unit(benchmark::kMicrosecond);
     benchmark::RegisterBenchmark("border/const_32f/memcpy", memcpy_frame, (size_t)4)

@@ -12,8 +12,7 @@
 
 #include <vector>
 
-#include "zor.h"
-#include "zor_levels.h"
+#include "bench_support.h"
 
 #ifdef ZOR_BENCH_OPENCV
 #include <opencv2/core.hpp>
@@ -24,12 +23,6 @@ namespace {
 
 constexpr int kW = 1920, kH = 1080, kK = 5, kB = kK / 2;
 constexpr int kFW = kW + 2 * kB, kFH = kH + 2 * kB;
-
-uint64_t detected() {
-    uint64_t features = 0;
-    zorGetCpuFeatures(&features, nullptr);
-    return features;
-}
 
 struct Images {
     std::vector<double> framed, dst, kernel;
@@ -80,12 +73,7 @@ void opencv_5x5(benchmark::State& state) {
 #endif
 
 int register_all() {
-#define FILTER64F_REGISTER(index, name, select, need)                                   \
-    if ((detected() & (need)) == (need))                                                \
-        benchmark::RegisterBenchmark("filter64f/5x5/zor_" #name, zor_5x5, select)       \
-            ->Unit(benchmark::kMicrosecond);
-    ZOR_LEVEL_LIST(FILTER64F_REGISTER)
-#undef FILTER64F_REGISTER
+    zorbench::register_levels("filter64f/5x5/", benchmark::kMicrosecond, zor_5x5);
 #ifdef ZOR_BENCH_OPENCV
     benchmark::RegisterBenchmark("filter64f/5x5/opencv", opencv_5x5)->Unit(benchmark::kMicrosecond);
 #endif

@@ -11,8 +11,7 @@
 
 #include <vector>
 
-#include "zor.h"
-#include "zor_levels.h"
+#include "bench_support.h"
 
 #ifdef ZOR_BENCH_OPENCV
 #include <opencv2/core.hpp>
@@ -22,12 +21,6 @@
 namespace {
 
 constexpr int kW = 1920, kH = 1080;
-
-uint64_t detected() {
-    uint64_t features = 0;
-    zorGetCpuFeatures(&features, nullptr);
-    return features;
-}
 
 std::vector<float> kernel(int k) {
     std::vector<float> t((size_t)k * k);
@@ -110,17 +103,10 @@ template <typename T> void opencv_filter(benchmark::State& state, int k) {
 int register_all() {
     for (int k : {3, 5, 11}) {
         const std::string size = std::to_string(k) + "x" + std::to_string(k);
-#define FILTER_REGISTER(index, name, select, need)                                             \
-    if ((detected() & (need)) == (need)) {                                                     \
-        benchmark::RegisterBenchmark(("filter/8u/" + size + "/zor_" #name).c_str(),            \
-                                     zor_filter<Zor8u>, select, k)                             \
-            ->Unit(benchmark::kMicrosecond);                                                   \
-        benchmark::RegisterBenchmark(("filter/32f/" + size + "/zor_" #name).c_str(),           \
-                                     zor_filter<Zor32f>, select, k)                            \
-            ->Unit(benchmark::kMicrosecond);                                                   \
-    }
-        ZOR_LEVEL_LIST(FILTER_REGISTER)
-#undef FILTER_REGISTER
+        zorbench::register_levels("filter/8u/" + size + "/", benchmark::kMicrosecond,
+                                  zor_filter<Zor8u>, k);
+        zorbench::register_levels("filter/32f/" + size + "/", benchmark::kMicrosecond,
+                                  zor_filter<Zor32f>, k);
 #ifdef ZOR_BENCH_OPENCV
         benchmark::RegisterBenchmark(("filter/8u/" + size + "/opencv").c_str(),
                                      opencv_filter<Zor8u>, k)

@@ -10,8 +10,7 @@
 #include <random>
 #include <vector>
 
-#include "zor.h"
-#include "zor_levels.h"
+#include "bench_support.h"
 
 #ifdef ZOR_BENCH_OPENCV
 #include <opencv2/core.hpp>
@@ -21,12 +20,6 @@
 namespace {
 
 constexpr int kW = 1920, kH = 1080;
-
-uint64_t detected() {
-    uint64_t features = 0;
-    zorGetCpuFeatures(&features, nullptr);
-    return features;
-}
 
 template <typename T>
 std::vector<T> noise() {
@@ -95,12 +88,7 @@ int register_all() {
     const int masks32f[] = {3, 5};
     for (int m : masks8u) {
         const std::string name = "median/8u_" + std::to_string(m) + "x" + std::to_string(m) + "/";
-#define MEDIAN_8U(index, level, select, need)                                              \
-    if ((detected() & (need)) == (need))                                                   \
-        benchmark::RegisterBenchmark((name + "zor_" #level).c_str(), median_8u, select, m) \
-            ->Unit(benchmark::kMillisecond);
-        ZOR_LEVEL_LIST(MEDIAN_8U)
-#undef MEDIAN_8U
+        zorbench::register_levels(name, benchmark::kMillisecond, median_8u, m);
 #ifdef ZOR_BENCH_OPENCV
         benchmark::RegisterBenchmark((name + "opencv").c_str(), opencv_median, CV_8U, m)
             ->Unit(benchmark::kMillisecond);
@@ -108,12 +96,7 @@ int register_all() {
     }
     for (int m : masks32f) {
         const std::string name = "median/32f_" + std::to_string(m) + "x" + std::to_string(m) + "/";
-#define MEDIAN_32F(index, level, select, need)                                              \
-    if ((detected() & (need)) == (need))                                                    \
-        benchmark::RegisterBenchmark((name + "zor_" #level).c_str(), median_32f, select, m) \
-            ->Unit(benchmark::kMillisecond);
-        ZOR_LEVEL_LIST(MEDIAN_32F)
-#undef MEDIAN_32F
+        zorbench::register_levels(name, benchmark::kMillisecond, median_32f, m);
 #ifdef ZOR_BENCH_OPENCV
         benchmark::RegisterBenchmark((name + "opencv").c_str(), opencv_median, CV_32F, m)
             ->Unit(benchmark::kMillisecond);

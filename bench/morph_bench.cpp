@@ -9,8 +9,7 @@
 
 #include <vector>
 
-#include "zor.h"
-#include "zor_levels.h"
+#include "bench_support.h"
 
 #ifdef ZOR_BENCH_OPENCV
 #include <opencv2/core.hpp>
@@ -20,12 +19,6 @@
 namespace {
 
 constexpr int kW = 1920, kH = 1080;
-
-uint64_t detected() {
-    uint64_t features = 0;
-    zorGetCpuFeatures(&features, nullptr);
-    return features;
-}
 
 struct Shape {
     const char* name;
@@ -135,19 +128,12 @@ int register_all() {
             for (int f = 0; f < 2; ++f) {
                 const std::string base = std::string("morph/") + (erode ? "erode_" : "dilate_") +
                                          (f ? "32f/" : "8u/") + kShapes[shape].name + "/";
-#define MORPH_REGISTER(index, name, select, need)                                               \
-    if ((detected() & (need)) == (need)) {                                                      \
-        if (f)                                                                                  \
-            benchmark::RegisterBenchmark((base + "zor_" #name).c_str(), zor_morph<Zor32f>,      \
-                                         (uint64_t)(select), shape, erode != 0)                 \
-                ->Unit(benchmark::kMicrosecond);                                                \
-        else                                                                                    \
-            benchmark::RegisterBenchmark((base + "zor_" #name).c_str(), zor_morph<Zor8u>,       \
-                                         (uint64_t)(select), shape, erode != 0)                 \
-                ->Unit(benchmark::kMicrosecond);                                                \
-    }
-                ZOR_LEVEL_LIST(MORPH_REGISTER)
-#undef MORPH_REGISTER
+                if (f)
+                    zorbench::register_levels(base, benchmark::kMicrosecond, zor_morph<Zor32f>,
+                                              shape, erode != 0);
+                else
+                    zorbench::register_levels(base, benchmark::kMicrosecond, zor_morph<Zor8u>,
+                                              shape, erode != 0);
 #ifdef ZOR_BENCH_OPENCV
                 if (f)
                     benchmark::RegisterBenchmark((base + "opencv").c_str(), opencv_morph<Zor32f>,
