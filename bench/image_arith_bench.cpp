@@ -60,10 +60,11 @@ struct Image {
     }
 };
 
-enum Op { kCopy, kSet, kThreshold, kMinMax, kMul, kDiv };
-const char* const kOpNames[] = {"copy_32f", "set_32f", "threshold_gt_32f", "minmax_32f",
-                                "mul_8u_sfs", "div_8u_sfs"};
-size_t elem_of(int op) { return op >= kMul ? 1 : 4; }
+enum Op { kCopy, kSet, kThreshold, kMinMax, kAdd, kMulC, kAbsDiff, kMul, kDiv, kOpCount };
+const char* const kOpNames[] = {"copy_32f",  "set_32f",       "threshold_gt_32f",
+                                "minmax_32f", "add_32f",      "mulc_32f",
+                                "absdiff_8u", "mul_8u_sfs",   "div_8u_sfs"};
+size_t elem_of(int op) { return op >= kAbsDiff ? 1 : 4; }
 
 void zor_op(benchmark::State& state, int op, Size s, uint64_t select) {
     zorSetCpuFeatures(select);
@@ -84,6 +85,17 @@ void zor_op(benchmark::State& state, int op, Size s, uint64_t select) {
             st = zoriMinMax_32f_C1R(a.as<Zor32f>(), step, roi, &mn, &mx);
             benchmark::DoNotOptimize(mn);
             benchmark::DoNotOptimize(mx);
+            break;
+        case kAdd:
+            st = zoriAdd_32f_C1R(a.as<Zor32f>(), step, b.as<Zor32f>(), step, d.as<Zor32f>(), step,
+                                 roi);
+            break;
+        case kMulC:
+            st = zoriMulC_32f_C1R(a.as<Zor32f>(), step, d.as<Zor32f>(), step, roi, 0.37f);
+            break;
+        case kAbsDiff:
+            st = zoriAbsDiff_8u_C1R(a.as<Zor8u>(), step, b.as<Zor8u>(), step, d.as<Zor8u>(), step,
+                                    roi);
             break;
         case kMul:
             st = zoriMul_8u_C1RSfs(a.as<Zor8u>(), step, b.as<Zor8u>(), step, d.as<Zor8u>(), step,
@@ -129,6 +141,9 @@ void opencv_op(benchmark::State& state, int op, Size s) {
             benchmark::DoNotOptimize(mn);
             benchmark::DoNotOptimize(mx);
             break;
+        case kAdd: cv::add(A, B, D); break;
+        case kMulC: cv::multiply(A, cv::Scalar(0.37), D); break;
+        case kAbsDiff: cv::absdiff(A, B, D); break;
         case kMul: cv::multiply(A, B, D, 1.0 / 256); break;
         default: cv::divide(B, A, D, 1.0); break;  // the second by the first, as zor
         }
@@ -141,7 +156,7 @@ void opencv_op(benchmark::State& state, int op, Size s) {
 int register_all() {
     for (const Size& s : kSizes) {
         const std::string size = std::to_string(s.w) + "x" + std::to_string(s.h);
-        for (int op = kCopy; op <= kDiv; ++op) {
+        for (int op = kCopy; op < kOpCount; ++op) {
             const std::string base = std::string("image_arith/") + kOpNames[op] + "/" + size + "/";
 #define ARITH_REGISTER(index, name, select, need)                                       \
     if ((detected() & (need)) == (need))                                                \

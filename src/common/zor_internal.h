@@ -15,6 +15,11 @@ extern "C" {
 
 ZorStatus zorsAbs_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len);
 ZorStatus zorsSqr_32f(const Zor32f* pSrc, Zor32f* pDst, int32_t len);
+/* pDst = pSrc2 / pSrc1 element by element, in the level's own arithmetic
+ * (reciprocal estimate on the SSE levels and e9, refined with FMA on l9,
+ * true division on the AVX-512 levels); zorStsDivByZero (2) when a divisor
+ * counted as zero, with its lanes set to a signed infinity or NaN. */
+ZorStatus zorsDiv_32f(const Zor32f* pSrc1, const Zor32f* pSrc2, Zor32f* pDst, int32_t len);
 /* value == 0 (or -0) returns at once. */
 ZorStatus zorsAddC_32f_I(Zor32f* pSrcDst, int32_t len, Zor32f value);
 /* value == 1 returns at once; value == 0 zero-fills. */
