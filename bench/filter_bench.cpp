@@ -36,11 +36,11 @@ template <typename T> struct Images {
     }
 };
 
-ZorStatus filter(const Zor8u* s, Zor8u* d, const ZoriFilterBorderSpec* spec, Zor8u* buf) {
-    return zoriFilterBorder_8u_C1R(s, kW, d, kW, {kW, kH}, zorBorderRepl, nullptr, spec, buf);
+ZorStatus filter(const Zor8u* s, Zor8u* d, const ZoriFilterBorderSpec* rec, Zor8u* buf) {
+    return zoriFilterBorder_8u_C1R(s, kW, d, kW, {kW, kH}, zorBorderRepl, nullptr, rec, buf);
 }
-ZorStatus filter(const Zor32f* s, Zor32f* d, const ZoriFilterBorderSpec* spec, Zor8u* buf) {
-    return zoriFilterBorder_32f_C1R(s, kW * 4, d, kW * 4, {kW, kH}, zorBorderRepl, nullptr, spec,
+ZorStatus filter(const Zor32f* s, Zor32f* d, const ZoriFilterBorderSpec* rec, Zor8u* buf) {
+    return zoriFilterBorder_32f_C1R(s, kW * 4, d, kW * 4, {kW, kH}, zorBorderRepl, nullptr, rec,
                                     buf);
 }
 
@@ -54,11 +54,11 @@ template <typename T> void zor_filter(benchmark::State& state, uint64_t select, 
     const std::vector<float> taps = kernel(k);
     int32_t specSize = 0, bufSize = 0;
     zoriFilterBorderGetSize({k, k}, {kW, kH}, type_of<T>(), zor32f, 1, &specSize, &bufSize);
-    std::vector<Zor8u> spec(specSize), buf(bufSize);
+    std::vector<Zor8u> rec(specSize), buf(bufSize);
     zoriFilterBorderInit_32f(taps.data(), {k, k}, type_of<T>(), 1, 1,
-                             (ZoriFilterBorderSpec*)spec.data());
+                             (ZoriFilterBorderSpec*)rec.data());
     for (auto _ : state) {
-        ZorStatus s = filter(im.src.data(), im.dst.data(), (ZoriFilterBorderSpec*)spec.data(),
+        ZorStatus s = filter(im.src.data(), im.dst.data(), (ZoriFilterBorderSpec*)rec.data(),
                              buf.data());
         benchmark::DoNotOptimize(s);
         benchmark::ClobberMemory();
@@ -80,10 +80,10 @@ template <typename T> void opencv_filter(benchmark::State& state, int k) {
     cv::filter2D(src, dst, -1, ker, cv::Point(-1, -1), 0, cv::BORDER_REPLICATE);
     int32_t specSize = 0, bufSize = 0;
     zoriFilterBorderGetSize({k, k}, {kW, kH}, type_of<T>(), zor32f, 1, &specSize, &bufSize);
-    std::vector<Zor8u> spec(specSize), buf(bufSize);
+    std::vector<Zor8u> rec(specSize), buf(bufSize);
     zoriFilterBorderInit_32f(taps.data(), {k, k}, type_of<T>(), 1, 1,
-                             (ZoriFilterBorderSpec*)spec.data());
-    filter(im.src.data(), im.dst.data(), (ZoriFilterBorderSpec*)spec.data(), buf.data());
+                             (ZoriFilterBorderSpec*)rec.data());
+    filter(im.src.data(), im.dst.data(), (ZoriFilterBorderSpec*)rec.data(), buf.data());
     for (int y = 0; y < kH; ++y)
         for (int x = 0; x < kW; ++x) {
             const double a = (double)dst.at<T>(y, x), b = (double)im.dst[(size_t)y * kW + x];

@@ -86,12 +86,12 @@ void zor_morph(benchmark::State& state, uint64_t select, int shape, bool erode) 
     const std::vector<Zor8u> mask = cells(sh);
     int32_t specSize = 0, bufSize = 0;
     Ops<T>::size({kW, kH}, {sh.w, sh.h}, &specSize, &bufSize);
-    std::vector<Zor8u> spec(specSize), buf(bufSize);
-    Ops<T>::init({kW, kH}, mask.data(), {sh.w, sh.h}, (ZoriMorphState*)spec.data(), buf.data());
+    std::vector<Zor8u> rec(specSize), buf(bufSize);
+    Ops<T>::init({kW, kH}, mask.data(), {sh.w, sh.h}, (ZoriMorphState*)rec.data(), buf.data());
     T* src = picture<T>();
     T* dst = (T*)aligned_alloc(64, (size_t)kW * kH * sizeof(T));
     for (auto _ : state) {
-        ZorStatus s = Ops<T>::run(erode, src, dst, (const ZoriMorphState*)spec.data(), buf.data());
+        ZorStatus s = Ops<T>::run(erode, src, dst, (const ZoriMorphState*)rec.data(), buf.data());
         benchmark::DoNotOptimize(s);
         benchmark::ClobberMemory();
     }

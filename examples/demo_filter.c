@@ -15,7 +15,7 @@ typedef struct {
     const char* name;
     const Zor8u* src;
     Zor8u* dst;
-    const ZoriFilterBorderSpec* spec;
+    const ZoriFilterBorderSpec* rec;
     Zor8u* buffer;
     ZorStatus status;
 } FilterRun;
@@ -40,7 +40,7 @@ static void make_card(Zor8u* img) {
 static void run_filter(void* ctx) {
     FilterRun* f = (FilterRun*)ctx;
     f->status = zoriFilterBorder_8u_C1R(f->src, kW, f->dst, kW, (ZoriSize){kW, kH},
-                                        zorBorderRepl, NULL, f->spec, f->buffer);
+                                        zorBorderRepl, NULL, f->rec, f->buffer);
 }
 
 static void report_filter(void* ctx, const char* level) {
@@ -61,19 +61,19 @@ static void one_kernel(const char* title, const char* file, const float* taps, i
     int32_t specSize = 0, bufSize = 0;
     ZorStatus st = zoriFilterBorderGetSize((ZoriSize){k, k}, (ZoriSize){kW, kH}, zor8u, zor32f,
                                            1, &specSize, &bufSize);
-    Zor8u* spec = st == zorStsNoErr ? (Zor8u*)zorMalloc(specSize) : NULL;
+    Zor8u* rec = st == zorStsNoErr ? (Zor8u*)zorMalloc(specSize) : NULL;
     Zor8u* buffer = st == zorStsNoErr ? (Zor8u*)zorMalloc(bufSize) : NULL;
-    if (!spec || !buffer) {
+    if (!rec || !buffer) {
         printf("%s: no memory (%s)\n", title, zorGetStatusString(st));
     } else if ((st = zoriFilterBorderInit_32f(taps, (ZoriSize){k, k}, zor8u, 1, 1,
-                                              (ZoriFilterBorderSpec*)spec)) != zorStsNoErr) {
+                                              (ZoriFilterBorderSpec*)rec)) != zorStsNoErr) {
         printf("%s: %s\n", title, zorGetStatusString(st));
     } else {
-        FilterRun f = {title, src, dst, (const ZoriFilterBorderSpec*)spec, buffer, 0};
+        FilterRun f = {title, src, dst, (const ZoriFilterBorderSpec*)rec, buffer, 0};
         on_every_level(title, run_filter, report_filter, &f);
         write_pgm(file, dst, kW, kW, kH);
     }
-    zorFree(spec);
+    zorFree(rec);
     zorFree(buffer);
 }
 

@@ -270,13 +270,13 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriFilterBorderGetSize)(ZoriSize kernelSize, ZoriS
             *pBufferSize = 0;
             return zorStsExceededSizeErr;
         }
-        const big spec = round64(S * 8) + 191;
+        const big rec = round64(S * 8) + 191;
         const big buf = border_bytes(kw, kh, w, h, 8, 1) + buf64 + 126;
-        if (buf > kMaxSize || spec > kMaxSize) {
+        if (buf > kMaxSize || rec > kMaxSize) {
             *pBufferSize = 0;
             return zorStsExceededSizeErr;
         }
-        *pSpecSize = (int32_t)spec;
+        *pSpecSize = (int32_t)rec;
         *pBufferSize = (int32_t)buf;
         return zorStsNoErr;
     }
@@ -302,13 +302,13 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriFilterBorderGetSize)(ZoriSize kernelSize, ZoriS
         return zorStsExceededSizeErr;
     }
     const big e = kt == zor16s ? 2 : 4;
-    big spec = round64(S * e) + 191 + round64((((big)kw + 1) & ~(big)1) * 5 * kh * 16);
-    if (kt == zor32f && numChannels != 2) spec += round64(S * 16);
-    if (spec > kMaxSize) {
+    big rec = round64(S * e) + 191 + round64((((big)kw + 1) & ~(big)1) * 5 * kh * 16);
+    if (kt == zor32f && numChannels != 2) rec += round64(S * 16);
+    if (rec > kMaxSize) {
         *pBufferSize = 0;
         return zorStsExceededSizeErr;
     }
-    *pSpecSize = (int32_t)spec;
+    *pSpecSize = (int32_t)rec;
     *pBufferSize = (int32_t)buf;
     return zorStsNoErr;
 }

@@ -48,19 +48,19 @@ ZorStatus get_size(ZoriSize roi, ZoriSize mask, int32_t e, int32_t* pSpecSize,
         return zorStsSizeErr;
     if (mask.width > kMaxMaskSide || mask.height > kMaxMaskSide) return zorStsMaskSizeErr;
     const int64_t w = mask.width | 1, h = mask.height | 1;
-    const int64_t spec = h * ((w + 1) * 2 + w) + 136 + (w + 1) * h * 2;
+    const int64_t rec = h * ((w + 1) * 2 + w) + 136 + (w + 1) * h * 2;
     const int64_t a =
         frame_elems((int32_t)w, (int32_t)h, mask.width >> 1, mask.height >> 1, roi.width,
                     roi.height) *
         e;
     const int64_t ring = round32((int64_t)roi.width * e) * h + round32(w * e) + 16 * e;
     const int64_t buf = round32(a) + ring + 64;
-    if (spec > kMaxSize || buf > kMaxSize) {
+    if (rec > kMaxSize || buf > kMaxSize) {
         *pSpecSize = 0;
         *pBufferSize = 0;
         return zorStsExceededSizeErr;
     }
-    *pSpecSize = (int32_t)spec;
+    *pSpecSize = (int32_t)rec;
     *pBufferSize = (int32_t)buf;
     return zorStsNoErr;
 }

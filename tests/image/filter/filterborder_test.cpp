@@ -253,15 +253,15 @@ bool guards_intact(const std::vector<uint8_t>& mem, size_t from) {
 // blocks with guard bytes behind them.
 template <typename T>
 void make_record(const Case& c, const std::vector<float>& k, std::vector<uint8_t>& specMem,
-                 ZoriFilterBorderSpec** spec, std::vector<uint8_t>& bufMem, Zor8u** buf,
+                 ZoriFilterBorderSpec** rec, std::vector<uint8_t>& bufMem, Zor8u** buf,
                  int* bufSize) {
     int32_t specSize = 0, bufferSize = 0;
     ASSERT_EQ(zoriFilterBorderGetSize({c.kw, c.kh}, {c.W, c.H}, Type<T>::id, zor32f, 1, &specSize,
                                       &bufferSize),
               zorStsNoErr);
     specMem.assign(specSize + 3 + 64, kGuard);
-    *spec = (ZoriFilterBorderSpec*)(specMem.data() + 3);
-    ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {c.kw, c.kh}, Type<T>::id, 1, c.roundMode, *spec),
+    *rec = (ZoriFilterBorderSpec*)(specMem.data() + 3);
+    ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {c.kw, c.kh}, Type<T>::id, 1, c.roundMode, *rec),
               zorStsNoErr);
     ASSERT_TRUE(guards_intact(specMem, specSize + 3)) << "Init wrote past the record";
     bufMem.assign(bufferSize + 5 + 64, kGuard);
@@ -287,11 +287,11 @@ void check_case(int level, const Case& c, const std::vector<float>& k, bool exac
     Source<T> src(c.W, c.H, pad, offset, g);
 
     std::vector<uint8_t> specMem, bufMem;
-    ZoriFilterBorderSpec* spec = nullptr;
+    ZoriFilterBorderSpec* rec = nullptr;
     Zor8u* buf = nullptr;
     int bufSize = 0;
-    ASSERT_NO_FATAL_FAILURE(make_record<T>(c, k, specMem, &spec, bufMem, &buf, &bufSize));
-    const ZoriFilterBorderSpec* use = given ? given : spec;
+    ASSERT_NO_FATAL_FAILURE(make_record<T>(c, k, specMem, &rec, bufMem, &buf, &bufSize));
+    const ZoriFilterBorderSpec* use = given ? given : rec;
 
     const int G = 3;  // guard pixels around the destination ROI
     const int32_t dstStep = (int32_t)((c.W + 2 * G) * sizeof(T)) + (sizeof(T) == 1 ? 1 : 0);
@@ -481,15 +481,15 @@ std::vector<T> run_plain(const std::vector<T>& img, int W, int H, const std::vec
     EXPECT_EQ(zoriFilterBorderGetSize({kw, kh}, {outW, outH}, Type<T>::id, zor32f, 1, &specSize,
                                       &bufSize),
               zorStsNoErr);
-    std::vector<uint8_t> spec(specSize), buf(bufSize);
+    std::vector<uint8_t> rec(specSize), buf(bufSize);
     EXPECT_EQ(zoriFilterBorderInit_32f(k.data(), {kw, kh}, Type<T>::id, 1, roundMode,
-                                       (ZoriFilterBorderSpec*)spec.data()),
+                                       (ZoriFilterBorderSpec*)rec.data()),
               zorStsNoErr);
     std::vector<T> out((size_t)outW * outH);
     const int ax = (kw - 1) / 2, ay = (kh - 1) / 2;
     EXPECT_EQ(Type<T>::filter(img.data() + ay * W + ax, W * sizeof(T), out.data(),
                               outW * sizeof(T), {outW, outH}, zorBorderInMem, nullptr,
-                              (const ZoriFilterBorderSpec*)spec.data(), buf.data()),
+                              (const ZoriFilterBorderSpec*)rec.data(), buf.data()),
               zorStsNoErr);
     return out;
 }
@@ -541,9 +541,9 @@ TEST_P(FilterBorder, SeamBetweenTruncatedEdgesAndRoundedCentre) {
     k[4] = 0.25f;
     int32_t specSize = 0, bufSize = 0;
     ASSERT_EQ(zoriFilterBorderGetSize({3, 3}, {W, H}, zor8u, zor32f, 1, &specSize, &bufSize), 0);
-    std::vector<uint8_t> spec(specSize), buf(bufSize);
+    std::vector<uint8_t> rec(specSize), buf(bufSize);
     ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {3, 3}, zor8u, 1, 0,
-                                       (ZoriFilterBorderSpec*)spec.data()),
+                                       (ZoriFilterBorderSpec*)rec.data()),
               0);
     // Nearest is nearest whatever the caller's rounding control says.
     for (int rc : {FE_TONEAREST, FE_TOWARDZERO, FE_DOWNWARD}) {
@@ -552,7 +552,7 @@ TEST_P(FilterBorder, SeamBetweenTruncatedEdgesAndRoundedCentre) {
         fesetround(rc);
         const ZorStatus st = zoriFilterBorder_8u_C1R(img.data() + (W + 2) + 1, W + 2, out.data(),
                                                      W, {W, H}, zorBorderRepl, nullptr,
-                                                     (ZoriFilterBorderSpec*)spec.data(),
+                                                     (ZoriFilterBorderSpec*)rec.data(),
                                                      buf.data());
         fesetround(FE_TONEAREST);
         ASSERT_EQ(st, 0);
@@ -599,28 +599,28 @@ TEST_P(FilterBorder, NoReadsPastTheRoiWhereNothingIsInMemory) {
                 ASSERT_EQ(zoriFilterBorderGetSize({kw, kh}, {W, H}, zor32f, zor32f, 1, &specSize,
                                                   &bufSize),
                           0);
-                std::vector<uint8_t> spec(specSize), buf(bufSize);
+                std::vector<uint8_t> rec(specSize), buf(bufSize);
                 ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {kw, kh}, zor32f, 1, 1,
-                                                   (ZoriFilterBorderSpec*)spec.data()),
+                                                   (ZoriFilterBorderSpec*)rec.data()),
                           0);
                 std::vector<float> out(W * H);
                 const float v32 = 1.0f;
                 EXPECT_EQ(zoriFilterBorder_32f_C1R(img32, W * 4, out.data(), W * 4, {W, H}, kind,
-                                                   &v32, (ZoriFilterBorderSpec*)spec.data(),
+                                                   &v32, (ZoriFilterBorderSpec*)rec.data(),
                                                    buf.data()),
                           0);
                 ASSERT_EQ(zoriFilterBorderGetSize({kw, kh}, {W, H}, zor8u, zor32f, 1, &specSize,
                                                   &bufSize),
                           0);
-                spec.assign(specSize, 0);
+                rec.assign(specSize, 0);
                 buf.assign(bufSize, 0);
                 ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {kw, kh}, zor8u, 1, 1,
-                                                   (ZoriFilterBorderSpec*)spec.data()),
+                                                   (ZoriFilterBorderSpec*)rec.data()),
                           0);
                 std::vector<Zor8u> out8(W * H);
                 const Zor8u v8 = 1;
                 EXPECT_EQ(zoriFilterBorder_8u_C1R(img8, W, out8.data(), W, {W, H}, kind, &v8,
-                                                  (ZoriFilterBorderSpec*)spec.data(), buf.data()),
+                                                  (ZoriFilterBorderSpec*)rec.data(), buf.data()),
                           0);
             }
             munmap(m, span + 2 * page);
@@ -635,8 +635,8 @@ TEST_P(FilterBorder, FilterChecksInOrderAndWritesNothing) {
     int32_t specSize = 0, bufSize = 0;
     ASSERT_EQ(zoriFilterBorderGetSize({3, 3}, {8, 8}, zor8u, zor32f, 1, &specSize, &bufSize), 0);
     std::vector<uint8_t> specMem(specSize), buf(bufSize);
-    const ZoriFilterBorderSpec* spec = (ZoriFilterBorderSpec*)specMem.data();
-    ASSERT_EQ(zoriFilterBorderInit_32f(k, {3, 3}, zor8u, 1, 1, (ZoriFilterBorderSpec*)spec), 0);
+    const ZoriFilterBorderSpec* rec = (ZoriFilterBorderSpec*)specMem.data();
+    ASSERT_EQ(zoriFilterBorderInit_32f(k, {3, 3}, zor8u, 1, 1, (ZoriFilterBorderSpec*)rec), 0);
     Zor8u big[256] = {1}, dst[64];
     const Zor8u* src = big + 100;
     memset(dst, 0xEE, sizeof dst);
@@ -648,65 +648,65 @@ TEST_P(FilterBorder, FilterChecksInOrderAndWritesNothing) {
     const ZoriSize roi{8, 8};
     // Each line breaks one more rule than the next, so the status shows
     // which test came first.
-    EXPECT_EQ(call(nullptr, 0, dst, 0, {0, 0}, 2, nullptr, spec, buf.data()), zorStsNullPtrErr);
-    EXPECT_EQ(call(src, 0, nullptr, 0, {0, 0}, 2, nullptr, spec, buf.data()), zorStsNullPtrErr);
+    EXPECT_EQ(call(nullptr, 0, dst, 0, {0, 0}, 2, nullptr, rec, buf.data()), zorStsNullPtrErr);
+    EXPECT_EQ(call(src, 0, nullptr, 0, {0, 0}, 2, nullptr, rec, buf.data()), zorStsNullPtrErr);
     EXPECT_EQ(call(src, 0, dst, 0, {0, 0}, 2, nullptr, nullptr, buf.data()), zorStsNullPtrErr);
-    EXPECT_EQ(call(src, 0, dst, 0, {0, 0}, 2, nullptr, spec, nullptr), zorStsNullPtrErr);
-    EXPECT_EQ(call(src, 0, dst, 0, {0, 0}, zorBorderConst, nullptr, spec, buf.data()),
+    EXPECT_EQ(call(src, 0, dst, 0, {0, 0}, 2, nullptr, rec, nullptr), zorStsNullPtrErr);
+    EXPECT_EQ(call(src, 0, dst, 0, {0, 0}, zorBorderConst, nullptr, rec, buf.data()),
               zorStsNullPtrErr);
-    EXPECT_EQ(call(src, 0, dst, 0, {0, 0}, zorBorderConst | 0x100, nullptr, spec, buf.data()),
+    EXPECT_EQ(call(src, 0, dst, 0, {0, 0}, zorBorderConst | 0x100, nullptr, rec, buf.data()),
               zorStsNullPtrErr);
-    EXPECT_EQ(call(src, 0, dst, 0, {0, 8}, 2, &v, spec, buf.data()), zorStsSizeErr);
-    EXPECT_EQ(call(src, 0, dst, 0, {8, -1}, 2, &v, spec, buf.data()), zorStsSizeErr);
-    EXPECT_EQ(call(src, 0, dst, 8, roi, 2, &v, spec, buf.data()), zorStsStepErr);
-    EXPECT_EQ(call(src, -8, dst, 8, roi, 2, &v, spec, buf.data()), zorStsStepErr);
-    EXPECT_EQ(call(src, 8, dst, 7, roi, 2, &v, spec, buf.data()), zorStsStepErr);
+    EXPECT_EQ(call(src, 0, dst, 0, {0, 8}, 2, &v, rec, buf.data()), zorStsSizeErr);
+    EXPECT_EQ(call(src, 0, dst, 0, {8, -1}, 2, &v, rec, buf.data()), zorStsSizeErr);
+    EXPECT_EQ(call(src, 0, dst, 8, roi, 2, &v, rec, buf.data()), zorStsStepErr);
+    EXPECT_EQ(call(src, -8, dst, 8, roi, 2, &v, rec, buf.data()), zorStsStepErr);
+    EXPECT_EQ(call(src, 8, dst, 7, roi, 2, &v, rec, buf.data()), zorStsStepErr);
     // The source step is not compared with the width.
-    EXPECT_EQ(call(src, 1, dst, 8, {8, 1}, zorBorderInMem, nullptr, spec, buf.data()), 0);
+    EXPECT_EQ(call(src, 1, dst, 8, {8, 1}, zorBorderInMem, nullptr, rec, buf.data()), 0);
     memset(dst, 0xEE, sizeof dst);
     for (int bt : {0, 2, 4, 5, 7, 8, 15, 16 | 2, 240 | 4, 256, 256 + 1, -1, 0x7fffffff})
-        EXPECT_EQ(call(src, 8, dst, 8, roi, bt, &v, spec, buf.data()), zorStsBorderErr) << bt;
+        EXPECT_EQ(call(src, 8, dst, 8, roi, bt, &v, rec, buf.data()), zorStsBorderErr) << bt;
     for (int i = 0; i < 64; ++i) ASSERT_EQ(dst[i], 0xEE) << "written on an error";
     for (int bt : {1, 3, 6, 240, 1 | 240, 3 | 16, 6 | 128 | 64, 6 | 240})
-        EXPECT_EQ(call(src, 8, dst, 8, roi, bt, &v, spec, buf.data()), zorStsNoErr) << bt;
+        EXPECT_EQ(call(src, 8, dst, 8, roi, bt, &v, rec, buf.data()), zorStsNoErr) << bt;
     // The value pointer is read for the constant kind only.
-    EXPECT_EQ(call(src, 8, dst, 8, roi, zorBorderRepl, nullptr, spec, buf.data()), zorStsNoErr);
+    EXPECT_EQ(call(src, 8, dst, 8, roi, zorBorderRepl, nullptr, rec, buf.data()), zorStsNoErr);
     Zor16u s16[64] = {}, d16[64];
     Zor16s t16[64] = {}, e16[64];
     Zor32f s32[64] = {}, d32[64];
-    EXPECT_EQ(zoriFilterBorder_16u_C1R(s16, 16, d16, 15, roi, 1, nullptr, spec, buf.data()),
+    EXPECT_EQ(zoriFilterBorder_16u_C1R(s16, 16, d16, 15, roi, 1, nullptr, rec, buf.data()),
               zorStsStepErr);
-    EXPECT_EQ(zoriFilterBorder_16s_C1R(t16, 16, e16, 15, roi, 1, nullptr, spec, buf.data()),
+    EXPECT_EQ(zoriFilterBorder_16s_C1R(t16, 16, e16, 15, roi, 1, nullptr, rec, buf.data()),
               zorStsStepErr);
-    EXPECT_EQ(zoriFilterBorder_32f_C1R(s32, 32, d32, 31, roi, 1, nullptr, spec, buf.data()),
+    EXPECT_EQ(zoriFilterBorder_32f_C1R(s32, 32, d32, 31, roi, 1, nullptr, rec, buf.data()),
               zorStsStepErr);
-    EXPECT_EQ(zoriFilterBorder_32f_C1R(s32, 32, d32, 32, roi, 6, nullptr, spec, buf.data()),
+    EXPECT_EQ(zoriFilterBorder_32f_C1R(s32, 32, d32, 32, roi, 6, nullptr, rec, buf.data()),
               zorStsNullPtrErr);
 }
 
 TEST_P(FilterBorder, InitChecksInOrder) {
     const float k[4] = {1, 2, 3, 4};
     std::vector<uint8_t> block(4096);
-    ZoriFilterBorderSpec* spec = (ZoriFilterBorderSpec*)block.data();
-    EXPECT_EQ(zoriFilterBorderInit_32f(nullptr, {0, 0}, (ZorDataType)0, 0, 9, spec),
+    ZoriFilterBorderSpec* rec = (ZoriFilterBorderSpec*)block.data();
+    EXPECT_EQ(zoriFilterBorderInit_32f(nullptr, {0, 0}, (ZorDataType)0, 0, 9, rec),
               zorStsNullPtrErr);
     EXPECT_EQ(zoriFilterBorderInit_32f(k, {0, 0}, (ZorDataType)0, 0, 9, nullptr),
               zorStsNullPtrErr);
-    EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 0}, (ZorDataType)0, 0, 9, spec), zorStsSizeErr);
+    EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 0}, (ZorDataType)0, 0, 9, rec), zorStsSizeErr);
     for (int t : {0, 2, 3, 6, 19})
-        EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 2}, (ZorDataType)t, 0, 9, spec),
+        EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 2}, (ZorDataType)t, 0, 9, rec),
                   zorStsDataTypeErr)
             << t;
     for (int c : {0, 5, -1})
-        EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 2}, zor16u, c, 9, spec), zorStsChannelErr) << c;
+        EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 2}, zor16u, c, 9, rec), zorStsChannelErr) << c;
     for (int m : {3, 9, -1, 0x10003, 0x20000})
-        EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 2}, zor16u, 4, m, spec),
+        EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 2}, zor16u, 4, m, rec),
                   zorStsRoundModeNotSupportedErr)
             << m;
     for (int c = 1; c <= 4; ++c)
         for (int m : {0, 1, 2})
-            EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 2}, zor16u, c, m, spec), zorStsNoErr);
-    EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 2}, zor8u, 1, 0x10002, spec),
+            EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 2}, zor16u, c, m, rec), zorStsNoErr);
+    EXPECT_EQ(zoriFilterBorderInit_32f(k, {2, 2}, zor8u, 1, 0x10002, rec),
               zorStsAccurateModeNotSupported);
 }
 
@@ -716,14 +716,14 @@ TEST_P(FilterBorder, HintBitWarnsAndIsRemoved) {
     const float k[1] = {0.75f};
     int32_t specSize = 0, bufSize = 0;
     ASSERT_EQ(zoriFilterBorderGetSize({1, 1}, {3, 1}, zor8u, zor32f, 1, &specSize, &bufSize), 0);
-    std::vector<uint8_t> spec(specSize), buf(bufSize);
+    std::vector<uint8_t> rec(specSize), buf(bufSize);
     ASSERT_EQ(zoriFilterBorderInit_32f(k, {1, 1}, zor8u, 1, 0x10000,
-                                       (ZoriFilterBorderSpec*)spec.data()),
+                                       (ZoriFilterBorderSpec*)rec.data()),
               zorStsAccurateModeNotSupported);
     const Zor8u src[3] = {3, 5, 7};
     Zor8u dst[3];
     ASSERT_EQ(zoriFilterBorder_8u_C1R(src, 3, dst, 3, {3, 1}, zorBorderRepl, nullptr,
-                                      (ZoriFilterBorderSpec*)spec.data(), buf.data()),
+                                      (ZoriFilterBorderSpec*)rec.data(), buf.data()),
               0);
     EXPECT_EQ(dst[0], 2);  // 2.25
     EXPECT_EQ(dst[1], 3);  // 3.75
@@ -755,7 +755,7 @@ TEST_P(FilterBorder, KernelInsideTheRecord) {
 
 // Values worked out by hand from the size rules for a table of cases.
 struct SizeCase {
-    int kw, kh, W, H, dataType, kernelType, channels, spec, buffer;
+    int kw, kh, W, H, dataType, kernelType, channels, rec, buffer;
 };
 const SizeCase kSizes[] = {
     {3, 3, 100, 50, 1, 13, 1, 1407, 2335},
@@ -793,11 +793,11 @@ const SizeCase kSizes[] = {
 
 TEST_P(FilterBorder, SizesFollowTheRules) {
     for (const SizeCase& s : kSizes) {
-        int32_t spec = -1, buf = -1;
+        int32_t rec = -1, buf = -1;
         EXPECT_EQ(zoriFilterBorderGetSize({s.kw, s.kh}, {s.W, s.H}, (ZorDataType)s.dataType,
-                                          (ZorDataType)s.kernelType, s.channels, &spec, &buf),
+                                          (ZorDataType)s.kernelType, s.channels, &rec, &buf),
                   zorStsNoErr);
-        EXPECT_EQ(spec, s.spec) << s.kw << "x" << s.kh << " " << s.W << "x" << s.H << " types "
+        EXPECT_EQ(rec, s.rec) << s.kw << "x" << s.kh << " " << s.W << "x" << s.H << " types "
                                 << s.dataType << "/" << s.kernelType << " c" << s.channels;
         EXPECT_EQ(buf, s.buffer) << s.kw << "x" << s.kh << " " << s.W << "x" << s.H << " types "
                                  << s.dataType << "/" << s.kernelType << " c" << s.channels;
@@ -805,7 +805,7 @@ TEST_P(FilterBorder, SizesFollowTheRules) {
 }
 
 TEST_P(FilterBorder, SizeChecksInOrder) {
-    int32_t spec = 0, buf = 0;
+    int32_t rec = 0, buf = 0;
     auto gs = [&](ZoriSize k, ZoriSize r, int dt, int kt, int c, int32_t* ps, int32_t* pb) {
         return zoriFilterBorderGetSize(k, r, (ZorDataType)dt, (ZorDataType)kt, c, ps, pb);
     };
@@ -814,7 +814,7 @@ TEST_P(FilterBorder, SizeChecksInOrder) {
     // Double branch: data type, channels, then pointers.
     EXPECT_EQ(gs({3, 3}, {5, 5}, 13, 19, 0, nullptr, nullptr), zorStsDataTypeErr);
     EXPECT_EQ(gs({3, 3}, {5, 5}, 19, 19, 2, nullptr, nullptr), zorStsChannelErr);
-    EXPECT_EQ(gs({3, 3}, {5, 5}, 19, 19, 1, &spec, nullptr), zorStsNullPtrErr);
+    EXPECT_EQ(gs({3, 3}, {5, 5}, 19, 19, 1, &rec, nullptr), zorStsNullPtrErr);
     EXPECT_EQ(gs({3, 3}, {5, 5}, 19, 19, 1, nullptr, &buf), zorStsNullPtrErr);
     // Others.
     EXPECT_EQ(gs({3, 3}, {5, 5}, 19, 13, 0, nullptr, nullptr), zorStsDataTypeErr);
@@ -824,25 +824,25 @@ TEST_P(FilterBorder, SizeChecksInOrder) {
     EXPECT_EQ(gs({3, 3}, {5, 5}, 1, 7, 0, nullptr, nullptr), zorStsChannelErr);
     EXPECT_EQ(gs({3, 3}, {5, 5}, 13, 13, 5, nullptr, nullptr), zorStsChannelErr);
     EXPECT_EQ(gs({3, 3}, {5, 5}, 13, 13, 4, nullptr, &buf), zorStsNullPtrErr);
-    EXPECT_EQ(gs({3, 3}, {5, 5}, 13, 13, 4, &spec, nullptr), zorStsNullPtrErr);
-    EXPECT_EQ(gs({3, 3}, {5, 5}, 13, 13, 4, &spec, &buf), zorStsNoErr);
+    EXPECT_EQ(gs({3, 3}, {5, 5}, 13, 13, 4, &rec, nullptr), zorStsNullPtrErr);
+    EXPECT_EQ(gs({3, 3}, {5, 5}, 13, 13, 4, &rec, &buf), zorStsNoErr);
 }
 
 TEST_P(FilterBorder, SizesBeyond32BitsAreRefused) {
-    int32_t spec = 7, buf = 7;
+    int32_t rec = 7, buf = 7;
     // The frame buffer follows the perimeter: a huge square ROI still fits.
-    EXPECT_EQ(zoriFilterBorderGetSize({3, 3}, {100000, 100000}, zor32f, zor32f, 1, &spec, &buf),
+    EXPECT_EQ(zoriFilterBorderGetSize({3, 3}, {100000, 100000}, zor32f, zor32f, 1, &rec, &buf),
               zorStsNoErr);
     // Lines of 2^28 floats do not; nor does one frame of 2^31 rows.
-    EXPECT_EQ(zoriFilterBorderGetSize({3, 3}, {1 << 28, 10}, zor8u, zor32f, 1, &spec, &buf),
+    EXPECT_EQ(zoriFilterBorderGetSize({3, 3}, {1 << 28, 10}, zor8u, zor32f, 1, &rec, &buf),
               zorStsExceededSizeErr);
     EXPECT_EQ(buf, 0);
     buf = 7;
-    EXPECT_EQ(zoriFilterBorderGetSize({3, 3}, {2, 0x7fffffff}, zor32f, zor32f, 4, &spec, &buf),
+    EXPECT_EQ(zoriFilterBorderGetSize({3, 3}, {2, 0x7fffffff}, zor32f, zor32f, 4, &rec, &buf),
               zorStsExceededSizeErr);
     EXPECT_EQ(buf, 0);
     buf = 7;
-    EXPECT_EQ(zoriFilterBorderGetSize({0x7fffffff, 0x7fffffff}, {1, 1}, zor64f, zor64f, 1, &spec,
+    EXPECT_EQ(zoriFilterBorderGetSize({0x7fffffff, 0x7fffffff}, {1, 1}, zor64f, zor64f, 1, &rec,
                                       &buf),
               zorStsExceededSizeErr);
     EXPECT_EQ(buf, 0);

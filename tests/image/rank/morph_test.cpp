@@ -250,12 +250,12 @@ constexpr int kGuard = 64;
 constexpr uint8_t kFill = 0xA5;
 
 struct Record {
-    std::vector<uint8_t> spec, buf;
+    std::vector<uint8_t> rec, buf;
     int32_t specSize = 0, bufSize = 0;
-    ZoriMorphState* state() { return (ZoriMorphState*)spec.data(); }
+    ZoriMorphState* state() { return (ZoriMorphState*)rec.data(); }
     bool guards_intact() const {
         for (int i = 0; i < kGuard; ++i)
-            if (spec[specSize + i] != kFill || buf[bufSize + i] != kFill) return false;
+            if (rec[specSize + i] != kFill || buf[bufSize + i] != kFill) return false;
         return true;
     }
 };
@@ -263,7 +263,7 @@ struct Record {
 template <typename T> Record make_record(ZoriSize roi, const Mask& m) {
     Record r;
     EXPECT_EQ(Api<T>::size(roi, {m.w, m.h}, &r.specSize, &r.bufSize), zorStsNoErr);
-    r.spec.assign(r.specSize + kGuard, kFill);
+    r.rec.assign(r.specSize + kGuard, kFill);
     r.buf.assign(r.bufSize + kGuard, kFill);
     EXPECT_EQ(Api<T>::init(roi, m.cells.data(), {m.w, m.h}, r.state(), r.buf.data()), zorStsNoErr);
     return r;
@@ -511,7 +511,7 @@ struct HeadView {
 
 HeadView head_of(const Record& r) {
     HeadView h;
-    memcpy(&h, r.spec.data(), sizeof h);
+    memcpy(&h, r.rec.data(), sizeof h);
     return h;
 }
 
@@ -530,12 +530,12 @@ TEST_P(Morph, RecordStoresTheTurnedMaskAndItsTables) {
     const Mask m = make_mask(4, 3, "asym", "110001111010");
     Record r = make_record<Zor8u>({8, 8}, m);
     const HeadView h = head_of(r);
-    EXPECT_EQ(h.pMask, (uint64_t)(uintptr_t)(r.spec.data() + 136));
+    EXPECT_EQ(h.pMask, (uint64_t)(uintptr_t)(r.rec.data() + 136));
     EXPECT_EQ(h.maskWidth, 5);
     EXPECT_EQ(h.maskHeight, 3);
     EXPECT_EQ(h.anchorX, 2);
     EXPECT_EQ(h.anchorY, 1);
-    const uint8_t* stored = r.spec.data() + 136;
+    const uint8_t* stored = r.rec.data() + 136;
     for (int sr = 0; sr < 3; ++sr)
         for (int sc = 0; sc < 5; ++sc) {
             const int cc = 4 - sc, cr = 2 - sr;
@@ -563,7 +563,7 @@ TEST_P(Morph, TwoByTwoIsStoredAsThreeByThree) {
     EXPECT_EQ(h.anchorX, 1);
     EXPECT_EQ(h.anchorY, 1);
     const uint8_t want[9] = {0, 0, 0, 0, 255, 255, 0, 255, 255};
-    EXPECT_EQ(memcmp(r.spec.data() + 136, want, 9), 0);
+    EXPECT_EQ(memcmp(r.rec.data() + 136, want, 9), 0);
     EXPECT_EQ(h.maskFeature, 8u | 16u);
 }
 
@@ -599,7 +599,7 @@ TEST_P(Morph, MaskFeatureBits) {
     // A cross keeps its full row and column (stored indices) at the head of
     // the run table: caller row 0, column 6 of a 7x5 mask.
     Record r = make_record<Zor8u>({6, 6}, cross(7, 5, 0, 6));
-    const std::vector<int> runs = u16s(r.spec.data() + 136 + 35 + 5 * 8 * 2, 2);
+    const std::vector<int> runs = u16s(r.rec.data() + 136 + 35 + 5 * 8 * 2, 2);
     EXPECT_EQ(runs, (std::vector<int>{4, 0}));
 }
 
@@ -631,11 +631,11 @@ template <typename T> void sizes_match() {
                                         {{64, 48}, {27, 26}}};
     for (const auto& c : roisAndMasks) {
         const ZoriSize roi = c[0], mask = c[1];
-        int32_t spec = -1, buf = -1;
-        ASSERT_EQ(Api<T>::size(roi, mask, &spec, &buf), zorStsNoErr);
+        int32_t rec = -1, buf = -1;
+        ASSERT_EQ(Api<T>::size(roi, mask, &rec, &buf), zorStsNoErr);
         const int w = mask.width | 1, h = mask.height | 1;
         // head, stored mask, row lists, and the run table's share
-        EXPECT_EQ(spec, 136 + w * h + h * (w + 1) * 2 + (w + 1) * h * 2);
+        EXPECT_EQ(rec, 136 + w * h + h * (w + 1) * 2 + (w + 1) * h * 2);
         EXPECT_EQ(buf, want_buffer(roi.width, roi.height, mask.width, mask.height, e))
             << roi.width << "x" << roi.height << " mask " << mask.width << "x" << mask.height;
     }
@@ -662,8 +662,8 @@ TEST_P(Morph, SizeAndInitChecks) {
     EXPECT_EQ(b, 0);
 
     const Zor8u mask[9] = {1, 1, 1, 1, 1, 1, 1, 1, 1};
-    std::vector<uint8_t> spec(4096, kFill), buf(16, 0);
-    ZoriMorphState* st = (ZoriMorphState*)spec.data();
+    std::vector<uint8_t> rec(4096, kFill), buf(16, 0);
+    ZoriMorphState* st = (ZoriMorphState*)rec.data();
     EXPECT_EQ(zoriMorphologyBorderInit_8u_C1R({0, 5}, nullptr, {3, 3}, st, buf.data()),
               zorStsNullPtrErr);
     EXPECT_EQ(zoriMorphologyBorderInit_16u_C1R({5, 5}, mask, {3, 3}, nullptr, buf.data()),
@@ -676,7 +676,7 @@ TEST_P(Morph, SizeAndInitChecks) {
               zorStsSizeErr);
     EXPECT_EQ(zoriMorphologyBorderInit_8u_C1R({5, 5}, mask, {1, 40000}, st, buf.data()),
               zorStsMaskSizeErr);
-    for (uint8_t v : spec) ASSERT_EQ(v, kFill);
+    for (uint8_t v : rec) ASSERT_EQ(v, kFill);
 }
 
 // Each check against the next one failing too, so that the order shows;
