@@ -12,7 +12,7 @@
 ZOR_BEGIN
 namespace filt {
 
-struct Spec {
+struct Record {
     int32_t specId;         // 3 8u, 5 16u, 4 16s, 6 32f; 0 and 1 mark integer-tap records
     int32_t kernelWidth;
     int32_t kernelHeight;
@@ -28,8 +28,8 @@ struct Spec {
     int32_t numChannels;
     uint8_t reserved[128 - 68];
 };
-static_assert(sizeof(Spec) == 128, "record head is 128 bytes");
-static_assert(offsetof(Spec, pTaps) == 48 && offsetof(Spec, numChannels) == 64,
+static_assert(sizeof(Record) == 128, "record head is 128 bytes");
+static_assert(offsetof(Record, pTaps) == 48 && offsetof(Record, numChannels) == 64,
               "record layout is shared by all levels");
 
 constexpr int32_t kHeadBytes = 128;
@@ -38,15 +38,15 @@ template <typename P> inline P* align_up(P* p, uintptr_t a) {
     return (P*)(((uintptr_t)p + (a - 1)) & ~(uintptr_t)(a - 1));
 }
 
-inline const Spec* spec_of(const void* p) { return align_up((const Spec*)p, 64); }
+inline const Record* record_of(const void* p) { return align_up((const Record*)p, 64); }
 
 // Tap (j, i) of the caller's kernel, from the reversed store.
-inline float tap(const Spec& s, int32_t j, int32_t i) {
+inline float tap(const Record& s, int32_t j, int32_t i) {
     const int32_t n = s.kernelWidth * s.kernelHeight;
     return s.pTaps[n - 1 - (j * s.kernelWidth + i)];
 }
 
-inline float bias_of(const Spec& s) {
+inline float bias_of(const Record& s) {
     float b;
     __builtin_memcpy(&b, &s.bias[0], sizeof b);
     return b;
@@ -59,35 +59,35 @@ inline float bias_of(const Spec& s) {
 
 // The entry per element type: chooses the level's path (pifilterkern.cpp).
 void run(const Zor8u* src, int32_t srcStep, Zor8u* dst, int32_t dstStep, int32_t w, int32_t h,
-         const Spec& s, float* work);
+         const Record& s, float* work);
 void run(const Zor16u* src, int32_t srcStep, Zor16u* dst, int32_t dstStep, int32_t w, int32_t h,
-         const Spec& s, float* work);
+         const Record& s, float* work);
 void run(const Zor16s* src, int32_t srcStep, Zor16s* dst, int32_t dstStep, int32_t w, int32_t h,
-         const Spec& s, float* work);
+         const Record& s, float* work);
 void run(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w, int32_t h,
-         const Spec& s, float* work);
+         const Record& s, float* work);
 
 // SSE levels (pifiltersse.cpp): integer rows two at a time through float
 // lines, converted to nearest; the 32f vector kernel of n8 and y8.
 void rowacc(const Zor8u* src, int32_t srcStep, Zor8u* dst, int32_t dstStep, int32_t w, int32_t h,
-            const Spec& s, float* work);
+            const Record& s, float* work);
 void rowacc(const Zor16u* src, int32_t srcStep, Zor16u* dst, int32_t dstStep, int32_t w,
-            int32_t h, const Spec& s, float* work);
+            int32_t h, const Record& s, float* work);
 void rowacc(const Zor16s* src, int32_t srcStep, Zor16s* dst, int32_t dstStep, int32_t w,
-            int32_t h, const Spec& s, float* work);
+            int32_t h, const Record& s, float* work);
 void vec_32f_sse(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
-                 int32_t h, const Spec& s);
+                 int32_t h, const Record& s);
 
 // AVX levels (pifilterrow32fg9e9.cpp): sums in registers or through float
 // lines; integers convert to nearest.
 void vec_avx(const Zor8u* src, int32_t srcStep, Zor8u* dst, int32_t dstStep, int32_t w, int32_t h,
-             const Spec& s, float* work);
+             const Record& s, float* work);
 void vec_avx(const Zor16u* src, int32_t srcStep, Zor16u* dst, int32_t dstStep, int32_t w,
-             int32_t h, const Spec& s, float* work);
+             int32_t h, const Record& s, float* work);
 void vec_avx(const Zor16s* src, int32_t srcStep, Zor16s* dst, int32_t dstStep, int32_t w,
-             int32_t h, const Spec& s, float* work);
+             int32_t h, const Record& s, float* work);
 void vec_avx(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
-             int32_t h, const Spec& s, float* work);
+             int32_t h, const Record& s, float* work);
 
 }  // namespace filt
 ZOR_END

@@ -137,7 +137,7 @@ template <typename T> inline T* at(T* p, int32_t step, int32_t dy, int32_t dx) {
 
 template <typename T>
 void drive(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t W, int32_t H,
-           int32_t borderType, T value, const Spec& s, Zor8u* buffer) {
+           int32_t borderType, T value, const Record& s, Zor8u* buffer) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
     const int32_t ax = (kw - 1) >> 1, ay = (kh - 1) >> 1;
     const int32_t kind = zorBorderKind(borderType);
@@ -243,7 +243,7 @@ ZorStatus filter_entry(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep,
         return zorStsBorderErr;
     const T value = zorBorderKind(borderType) == zorBorderConst ? *pBorderValue : T();
     drive(pSrc, srcStep, pDst, dstStep, roi.width, roi.height, borderType, value,
-          *spec_of(pSpec), pBuffer);
+          *record_of(pSpec), pBuffer);
     return zorStsNoErr;
 }
 
@@ -326,7 +326,7 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriFilterBorderInit_32f)(const Zor32f* pKernel, Zo
     const int32_t mode = roundMode & ~hint;
     if ((uint32_t)mode > 2) return zorStsRoundModeNotSupportedErr;
 
-    Spec* s = (Spec*)align_up((Zor8u*)pSpec, 64);
+    Record* s = (Record*)align_up((Zor8u*)pSpec, 64);
     const int32_t kw = kernelSize.width, kh = kernelSize.height;
     const ptrdiff_t n = (ptrdiff_t)kw * kh;
     float* taps = (float*)((Zor8u*)s + kHeadBytes);

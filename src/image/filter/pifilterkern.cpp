@@ -60,7 +60,7 @@ template <typename T> inline T* row_at(T* p, int32_t step, int32_t y) {
 // One output pixel: kernel rows in order, taps left to right (the reversed
 // store read backwards). m7 keeps even and odd taps of a row apart for 32f.
 template <typename T, bool kSplit>
-inline float window_sum(const T* src, int32_t srcStep, int32_t x, const Spec& s) {
+inline float window_sum(const T* src, int32_t srcStep, int32_t x, const Record& s) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
     const float* t = s.pTaps + kw * kh - 1;
     float sum = 0.0f;
@@ -89,7 +89,7 @@ inline void put(Zor32f* o, float v, int32_t) { *o = v; }  // stored as summed
 
 template <typename T, bool kSplit = false>
 void scalar(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
-            const Spec& s) {
+            const Record& s) {
     const float bias = bias_of(s);
     const int32_t mode = s.roundMode;
     for (int32_t y = 0; y < h; ++y) {
@@ -110,7 +110,7 @@ void scalar(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, i
 
 template <typename T>
 inline void run_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
-                    const Spec& s, float* work) {
+                    const Record& s, float* work) {
     if (s.kernelWidth <= 2 || w <= 16)
         scalar(src, srcStep, dst, dstStep, w, h, s);
     else
@@ -118,7 +118,7 @@ inline void run_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int3
 }
 
 inline void run_flt(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
-                    int32_t h, const Spec& s, float*) {
+                    int32_t h, const Record& s, float*) {
 #if defined(ZOR_LEVEL_m7)
     scalar<Zor32f, true>(src, srcStep, dst, dstStep, w, h, s);
 #else
@@ -133,7 +133,7 @@ inline void run_flt(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dst
 
 template <typename T>
 inline void run_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
-                    const Spec& s, float* work) {
+                    const Record& s, float* work) {
     if (w < 8)
         scalar(src, srcStep, dst, dstStep, w, h, s);
     else
@@ -141,7 +141,7 @@ inline void run_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int3
 }
 
 inline void run_flt(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
-                    int32_t h, const Spec& s, float* work) {
+                    int32_t h, const Record& s, float* work) {
 #if defined(ZOR_LEVEL_n0) || defined(ZOR_LEVEL_k0)
     // One masked kernel for every width.
     vec_avx(src, srcStep, dst, dstStep, w, h, s, work);
@@ -158,19 +158,19 @@ inline void run_flt(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dst
 }  // namespace
 
 void run(const Zor8u* src, int32_t srcStep, Zor8u* dst, int32_t dstStep, int32_t w, int32_t h,
-         const Spec& s, float* work) {
+         const Record& s, float* work) {
     run_int(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void run(const Zor16u* src, int32_t srcStep, Zor16u* dst, int32_t dstStep, int32_t w, int32_t h,
-         const Spec& s, float* work) {
+         const Record& s, float* work) {
     run_int(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void run(const Zor16s* src, int32_t srcStep, Zor16s* dst, int32_t dstStep, int32_t w, int32_t h,
-         const Spec& s, float* work) {
+         const Record& s, float* work) {
     run_int(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void run(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w, int32_t h,
-         const Spec& s, float* work) {
+         const Record& s, float* work) {
     run_flt(src, srcStep, dst, dstStep, w, h, s, work);
 }
 

@@ -210,17 +210,17 @@ template <int S> struct Walk {
 };
 typedef Walk<-1> Reversed;
 
-inline Reversed reversed_taps(const Spec& s) {
+inline Reversed reversed_taps(const Record& s) {
     return Reversed{s.pTaps + s.kernelWidth * s.kernelHeight - 1};
 }
 
 template <typename T> struct TapsOf {
     typedef Reversed type;
-    static type get(const Spec& s) { return reversed_taps(s); }
+    static type get(const Record& s) { return reversed_taps(s); }
 };
 template <> struct TapsOf<Zor16s> {
     typedef Walk<kScaled16s ? 4 : -1> type;
-    static type get(const Spec& s) { return type{kScaled16s ? s.pBroadcastTaps : reversed_taps(s).base}; }
+    static type get(const Record& s) { return type{kScaled16s ? s.pBroadcastTaps : reversed_taps(s).base}; }
 };
 
 // 32f records carry no broadcast table: every level reads the reversed store.
@@ -316,7 +316,7 @@ void pass(const float* in, const Line<T>* ln, int32_t kw, int32_t lw, int32_t w)
 // r - 1 for the lower one).
 template <typename T>
 void filter_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
-                const Spec& s, float* work) {
+                const Record& s, float* work) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
     const typename TapsOf<T>::type c = TapsOf<T>::get(s);
     // Work area: two lines of lw floats and the float row of lw + kw - 1,
@@ -499,7 +499,7 @@ constexpr int32_t kRegsTaps = 9;
 
 template <typename T>
 void filter_any(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
-                const Spec& s, float* work) {
+                const Record& s, float* work) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
     if (kw == 1 || kw * kh <= kRegsTaps)
         filter_regs(src, srcStep, dst, dstStep, w, h, TapsOf<T>::get(s), kw, kh);
@@ -510,19 +510,19 @@ void filter_any(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t 
 }  // namespace
 
 void vec_avx(const Zor8u* src, int32_t srcStep, Zor8u* dst, int32_t dstStep, int32_t w, int32_t h,
-             const Spec& s, float* work) {
+             const Record& s, float* work) {
     filter_any(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void vec_avx(const Zor16u* src, int32_t srcStep, Zor16u* dst, int32_t dstStep, int32_t w,
-             int32_t h, const Spec& s, float* work) {
+             int32_t h, const Record& s, float* work) {
     filter_any(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void vec_avx(const Zor16s* src, int32_t srcStep, Zor16s* dst, int32_t dstStep, int32_t w,
-             int32_t h, const Spec& s, float* work) {
+             int32_t h, const Record& s, float* work) {
     filter_any(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void vec_avx(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
-             int32_t h, const Spec& s, float*) {
+             int32_t h, const Record& s, float*) {
     filter_regs(src, srcStep, dst, dstStep, w, h, reversed_taps(s), s.kernelWidth,
                 s.kernelHeight);
 }

@@ -87,7 +87,7 @@ inline void to_pixels(float* line, Zor16s* out, int32_t w, float bias) {
 // ---- the line passes -------------------------------------------------------------
 
 // Taps of kernel row j in the caller's order: t[-i] is tap i.
-inline const float* taps_row(const Spec& s, int32_t j) {
+inline const float* taps_row(const Record& s, int32_t j) {
     return s.pTaps + s.kernelWidth * s.kernelHeight - 1 - j * s.kernelWidth;
 }
 
@@ -136,7 +136,7 @@ void pass2(const float* in, float* l0, const float* t0, float* l1, const float* 
 
 template <typename T>
 void rowacc_t(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
-              const Spec& s, float* work) {
+              const Record& s, float* work) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
     const int32_t lw = (w + 7) & ~7;  // lines in whole blocks of 8
     const int32_t inLen = w + kw - 1;
@@ -181,7 +181,7 @@ void rowacc_t(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w,
 // ---- 32f ---------------------------------------------------------------------
 
 template <int NB>
-inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* out, int32_t x, const Spec& s) {
+inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* out, int32_t x, const Record& s) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
     __m128 acc[NB];
 #pragma GCC unroll 16
@@ -203,22 +203,22 @@ inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* out, int32_t x
 }  // namespace
 
 void rowacc(const Zor8u* src, int32_t srcStep, Zor8u* dst, int32_t dstStep, int32_t w, int32_t h,
-            const Spec& s, float* work) {
+            const Record& s, float* work) {
     rowacc_t(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void rowacc(const Zor16u* src, int32_t srcStep, Zor16u* dst, int32_t dstStep, int32_t w,
-            int32_t h, const Spec& s, float* work) {
+            int32_t h, const Record& s, float* work) {
     rowacc_t(src, srcStep, dst, dstStep, w, h, s, work);
 }
 void rowacc(const Zor16s* src, int32_t srcStep, Zor16s* dst, int32_t dstStep, int32_t w,
-            int32_t h, const Spec& s, float* work) {
+            int32_t h, const Record& s, float* work) {
     rowacc_t(src, srcStep, dst, dstStep, w, h, s, work);
 }
 
 // w > kw + 8 here, so a last block that overlaps the previous one stays
 // inside the row.
 void vec_32f_sse(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
-                 int32_t h, const Spec& s) {
+                 int32_t h, const Record& s) {
     for (int32_t y = 0; y < h; ++y) {
         const Zor32f* in = row_at(src, srcStep, y);
         Zor32f* out = row_at(dst, dstStep, y);

@@ -234,7 +234,7 @@ Expect model(const Source<T>& src, const Case& c, const std::vector<float>& k, i
 
 // ---- running one case ----------------------------------------------------------
 
-struct Spec {
+struct Record {
     std::vector<uint8_t> block;
     const ZoriFilterBorderSpec* get(int offset) const {
         return (const ZoriFilterBorderSpec*)(block.data() + offset);
