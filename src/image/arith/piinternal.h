@@ -54,19 +54,6 @@ inline const Zor8u* row(const void* p, int32_t step, int32_t y) {
 }
 inline Zor8u* row(void* p, int32_t step, int32_t y) { return (Zor8u*)p + (ptrdiff_t)y * step; }
 
-// Store one vector past the caches; p is vector aligned.
-inline void stream_store(void* p, simd::vu8 v) {
-#if ZOR_VECTOR_BYTES == 16
-    _mm_stream_si128((__m128i*)p, (__m128i)v);
-#elif ZOR_VECTOR_BYTES == 32
-    _mm256_stream_si256((__m256i*)p, (__m256i)v);
-#else
-    _mm512_stream_si512((__m512i*)p, (__m512i)v);
-#endif
-}
-
-inline void store_fence() { _mm_sfence(); }
-
 // Round to nearest integer in the rounding mode in force (the conversion
 // instruction, not a truncation); out-of-range lanes give 0x80000000.
 inline simd::vs32 round_to_int(simd::vf32 v) {

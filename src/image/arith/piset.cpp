@@ -24,10 +24,10 @@ void fill_body(Zor8u* a, Zor8u* end, vu8 v) {
     // Four stores a round while a whole round fits.
     for (; a + 4 * VB <= end; a += 4 * VB) {
         if (NT) {
-            arith::stream_store(a, v);
-            arith::stream_store(a + VB, v);
-            arith::stream_store(a + 2 * VB, v);
-            arith::stream_store(a + 3 * VB, v);
+            simd::stream(a, v);
+            simd::stream(a + VB, v);
+            simd::stream(a + 2 * VB, v);
+            simd::stream(a + 3 * VB, v);
         } else {
             simd::store(a, v);
             simd::store(a + VB, v);
@@ -37,7 +37,7 @@ void fill_body(Zor8u* a, Zor8u* end, vu8 v) {
     }
     for (; a + VB <= end; a += VB) {
         if (NT)
-            arith::stream_store(a, v);
+            simd::stream(a, v);
         else
             simd::store(a, v);
     }
@@ -58,7 +58,7 @@ void owniSet_8u_C4_M7(const Zor8u pattern[16], Zor8u* dst, size_t len, int nt) {
     const vu8 v = pattern_at(pattern, (size_t)(a - dst));
     if (nt) {
         fill_body<true>(a, end, v);
-        arith::store_fence();
+        simd::store_fence();
     } else {
         fill_body<false>(a, end, v);
     }
