@@ -198,10 +198,55 @@ template <int MW, int MH, typename T, typename Op> void separable(const Job<T>& 
     }
 }
 
+// Integer rectangles, columns first: a pair of output rows shares the fold
+// of the mh - 1 source rows they have in common, the two column results go
+// to two lines in the ring area, and a fold along each line gives the
+// outputs. Fewer loads than the ring of row results; integers only, as
+// the order of a float fold decides which NaN comes out.
+template <int MW, int MH, typename T, typename Op> bool columns_first(const Job<T>& j) {
+    const int32_t W = j.width, H = j.height, n = W + MW - 1;
+    const ptrdiff_t e = (ptrdiff_t)sizeof(T);
+    const ptrdiff_t lineBytes = (n * e + 63) & ~(ptrdiff_t)63;
+    const ptrdiff_t ringBytes = MH * ((W * e + 31) & ~(ptrdiff_t)31) + ((MW * e + 31) & ~31);
+    if (2 * lineBytes > ringBytes) return false;
+    T* const line0 = (T*)j.ring;
+    T* const line1 = (T*)(j.ring + lineBytes);
+    for (int32_t y = 0; y < H; y += 2) {
+        const bool pair = y + 1 < H;
+        const T* rows[MH + 1];
+        for (int i = 0; i < MH + (pair ? 1 : 0); ++i) rows[i] = row_at(j.src, j.srcStep, y + i);
+        for_row<T>(0, n, true, line0, [&](auto tag, int32_t x) MORPH_LAMBDA {
+            typedef typename decltype(tag)::type U;
+            U mid = ld<U>(rows[1] + x);
+#pragma GCC unroll 8
+            for (int k = 2; k < MH; ++k) mid = Op::f(mid, ld<U>(rows[k] + x));
+            st(line0 + x, Op::f(ld<U>(rows[0] + x), mid));
+            if (pair) st(line1 + x, Op::f(mid, ld<U>(rows[MH] + x)));
+        });
+        T* d0 = row_at(j.dst, j.dstStep, y);
+        for_row<T>(0, W, true, d0, [&](auto tag, int32_t x) MORPH_LAMBDA {
+            typedef typename decltype(tag)::type U;
+            row_only<MW, U, Op>(line0, MW, x, d0);
+        });
+        if (!pair) break;
+        T* d1 = row_at(j.dst, j.dstStep, y + 1);
+        for_row<T>(0, W, true, d1, [&](auto tag, int32_t x) MORPH_LAMBDA {
+            typedef typename decltype(tag)::type U;
+            row_only<MW, U, Op>(line1, MW, x, d1);
+        });
+    }
+    return true;
+}
+
 }  // namespace
 
 template <typename T, typename Op> void rect_separable(const Job<T>& j) {
     const int32_t mw = j.head->maskWidth, mh = j.head->maskHeight;
+    // On the 16-byte levels the ring measured faster.
+    if constexpr (sizeof(T) < 4 && ZOR_VECTOR_BYTES >= 32) {
+        if (mw == 5 && mh == 5 && columns_first<5, 5, T, Op>(j)) return;
+        if (mw == 7 && mh == 7 && columns_first<7, 7, T, Op>(j)) return;
+    }
     if (mw == 5 && mh == 5) separable<5, 5, T, Op>(j);
     else if (mw == 7 && mh == 7) separable<7, 7, T, Op>(j);
     else separable<0, 0, T, Op>(j);
