@@ -7,6 +7,7 @@
 
 #include "morph_internal.h"
 
+
 ZOR_BEGIN
 namespace morph {
 namespace {
@@ -198,11 +199,12 @@ template <int MW, int MH, typename T, typename Op> void separable(const Job<T>& 
     }
 }
 
-// Integer rectangles, columns first: a pair of output rows shares the fold
-// of the mh - 1 source rows they have in common, the two column results go
-// to two lines in the ring area, and a fold along each line gives the
-// outputs. Fewer loads than the ring of row results; integers only, as
-// the order of a float fold decides which NaN comes out.
+// Columns first: a pair of output rows shares the fold of the mh - 1
+// source rows they have in common, the two column results go to two lines
+// in the ring area, and a fold along each line gives the outputs. Fewer
+// loads than the ring of row results. (Keeping the column results in
+// registers and shifting them into place measured 40% slower on k0 for
+// 32f: the lines let the source rows stream on their own.)
 template <int MW, int MH, typename T, typename Op> bool columns_first(const Job<T>& j) {
     const int32_t W = j.width, H = j.height, n = W + MW - 1;
     const ptrdiff_t e = (ptrdiff_t)sizeof(T);
@@ -242,8 +244,10 @@ template <int MW, int MH, typename T, typename Op> bool columns_first(const Job<
 
 template <typename T, typename Op> void rect_separable(const Job<T>& j) {
     const int32_t mw = j.head->maskWidth, mh = j.head->maskHeight;
-    // On the 16-byte levels the ring measured faster.
-    if constexpr (sizeof(T) < 4 && ZOR_VECTOR_BYTES >= 32) {
+    // Integers on the 16-byte levels measured faster with the ring. Floats
+    // take the same path on every level: the order of the folds decides
+    // which of two equal zeros comes out.
+    if constexpr (ZOR_VECTOR_BYTES >= 32 || sizeof(T) == 4) {
         if (mw == 5 && mh == 5 && columns_first<5, 5, T, Op>(j)) return;
         if (mw == 7 && mh == 7 && columns_first<7, 7, T, Op>(j)) return;
     }
@@ -480,76 +484,140 @@ template <typename Op> void general_8u(const Job<Zor8u>& j) { mask_8u<Op, kindLi
 // The set cells become byte offsets from the window's corner, at most
 // kBatch at a time. The first batch starts from the neutral value, later
 // ones from what the destination holds, so that any number of cells folds
-// in list order without a buffer. Four vectors go side by side to hide the
-// latency of the float comparisons.
+// in list order without a buffer.
+//
+// Blocks of kRows output rows share their loads: a source pixel at window
+// row i, column c serves output row o of the block where (i - o, c) is in
+// the batch. The batch becomes a list of loads in (i, c) order, each with
+// the set of output rows it feeds. Each output still folds its cells in
+// list order, so the block size never shows in a result.
 
 namespace {
 
 constexpr int kBatch = 128;
+// Output rows per block and vectors side by side: as many accumulators as
+// the level's registers hold (16 below AVX-512, 32 with it).
+constexpr int kBlockRows = ZOR_VECTOR_BYTES == 64 ? 4 : 2;
+constexpr int kSideBySide = 4;
 
-template <typename V, typename Op, int U, typename T>
-MORPH_INLINE void batch_step(const T* s, T* d, const ptrdiff_t* off, int32_t n, bool first) {
-    V acc[U];
-#pragma GCC unroll 4
-    for (int u = 0; u < U; ++u)
-        acc[u] = first ? V{} + Neutral<T, Op>::v : ld<V>(d + u * (int)(sizeof(V) / sizeof(T)));
-    for (int32_t k = 0; k < n; ++k) {
-        const T* p = (const T*)((const uint8_t*)s + off[k]);
-#pragma GCC unroll 4
-        for (int u = 0; u < U; ++u)
-            acc[u] = Op::f(acc[u], ld<V>(p + u * (int)(sizeof(V) / sizeof(T))));
+struct Load {
+    ptrdiff_t off;  // bytes from the block's window corner
+    uint32_t rows;  // bit o: output row o of the block takes it
+};
+
+// The loads of a block of R rows for cells k0 .. k1 - 1 of (row, column),
+// which are in list order. At most R * kBatch entries.
+int32_t block_loads(const int32_t* cellRow, const int32_t* cellCol, int32_t n, int R,
+                    ptrdiff_t srcStep, ptrdiff_t elem, Load* out) {
+    int32_t at[8] = {0, 0, 0, 0, 0, 0, 0, 0};  // next cell of each output row
+    int32_t count = 0;
+    for (;;) {
+        // Smallest (window row, column) among the rows' next cells.
+        int32_t bi = -1, bc = 0;
+        for (int o = 0; o < R; ++o) {
+            if (at[o] == n) continue;
+            const int32_t i = cellRow[at[o]] + o, c = cellCol[at[o]];
+            if (bi < 0 || i < bi || (i == bi && c < bc)) bi = i, bc = c;
+        }
+        if (bi < 0) return count;
+        uint32_t rows = 0;
+        for (int o = 0; o < R; ++o)
+            if (at[o] < n && cellRow[at[o]] + o == bi && cellCol[at[o]] == bc) {
+                rows |= 1u << o;
+                ++at[o];
+            }
+        out[count].off = bi * srcStep + bc * elem;
+        out[count].rows = rows;
+        ++count;
     }
-#pragma GCC unroll 4
-    for (int u = 0; u < U; ++u) st(d + u * (int)(sizeof(V) / sizeof(T)), acc[u]);
 }
 
-template <typename T, typename Op>
-void run_batch(const Job<T>& j, const ptrdiff_t* off, int32_t n, bool first) {
+template <typename V, typename Op, int R, int U, typename T>
+MORPH_INLINE void block_step(const T* s, T* d, ptrdiff_t dstStep, const Load* loads, int32_t n,
+                             bool first) {
+    constexpr int N = (int)(sizeof(V) / sizeof(T));
+    V acc[R][U];
+#pragma GCC unroll 8
+    for (int o = 0; o < R; ++o)
+#pragma GCC unroll 4
+        for (int u = 0; u < U; ++u)
+            acc[o][u] = first ? V{} + Neutral<T, Op>::v : ld<V>(row_at(d, dstStep, o) + u * N);
+    for (int32_t k = 0; k < n; ++k) {
+        const T* p = (const T*)((const uint8_t*)s + loads[k].off);
+        const uint32_t rows = loads[k].rows;
+        V v[U];
+#pragma GCC unroll 4
+        for (int u = 0; u < U; ++u) v[u] = ld<V>(p + u * N);
+#pragma GCC unroll 8
+        for (int o = 0; o < R; ++o)
+            if (rows & (1u << o))
+#pragma GCC unroll 4
+                for (int u = 0; u < U; ++u) acc[o][u] = Op::f(acc[o][u], v[u]);
+    }
+#pragma GCC unroll 8
+    for (int o = 0; o < R; ++o)
+#pragma GCC unroll 4
+        for (int u = 0; u < U; ++u) st(row_at(d, dstStep, o) + u * N, acc[o][u]);
+}
+
+// Output rows y .. y + R - 1 over the whole width.
+template <typename T, typename Op, int R>
+void block_rows(const Job<T>& j, int32_t y, const Load* loads, int32_t n, bool first) {
     typedef typename VecOf<T>::type V;
     constexpr int N = lanes<T>();
-    for (int32_t y = 0; y < j.height; ++y) {
-        const T* s = row_at(j.src, j.srcStep, y);
-        T* d = row_at(j.dst, j.dstStep, y);
-        // A later batch folds into the destination: no pixel twice.
-        auto one = [&](auto tag, int32_t x) MORPH_LAMBDA {
-            typedef typename decltype(tag)::type U;
-            batch_step<U, Op, 1>(s + x, d + x, off, n, first);
-        };
-        int32_t x = 0;
-        if (j.width >= 8 * N && ((uintptr_t)d % sizeof(T)) == 0) {
-            // Stores on vector boundaries from here on (see for_row).
-            const int32_t a = (int32_t)(((0 - (uintptr_t)d) & (sizeof(V) - 1)) / sizeof(T));
-            if (a) {
-                if (first) one(Tag<V>(), 0);
-                else for_part<T>(0, a, one);
-                x = a;
-            }
+    constexpr int U = kSideBySide;
+    const T* s = row_at(j.src, j.srcStep, y);
+    T* d = row_at(j.dst, j.dstStep, y);
+    // A later batch folds into the destination: no pixel twice.
+    auto one = [&](auto tag, int32_t x) MORPH_LAMBDA {
+        typedef typename decltype(tag)::type W;
+        block_step<W, Op, R, 1>(s + x, d + x, j.dstStep, loads, n, first);
+    };
+    int32_t x = 0;
+    if (j.width >= 2 * U * N && ((uintptr_t)d % sizeof(T)) == 0) {
+        // Stores on vector boundaries from here on (see for_row).
+        const int32_t a = (int32_t)(((0 - (uintptr_t)d) & (sizeof(V) - 1)) / sizeof(T));
+        if (a) {
+            if (first) one(Tag<V>(), 0);
+            else for_part<T>(0, a, one);
+            x = a;
         }
-        for (; x + 4 * N <= j.width; x += 4 * N) batch_step<V, Op, 4>(s + x, d + x, off, n, first);
-        for_row<T>(x, j.width, first, d, one);
     }
+    for (; x + U * N <= j.width; x += U * N)
+        block_step<V, Op, R, U>(s + x, d + x, j.dstStep, loads, n, first);
+    for_row<T>(x, j.width, first, d, one);
 }
 
 }  // namespace
 
 template <typename T, typename Op> void offsets(const Job<T>& j) {
+    constexpr int R = kBlockRows;
     const Head& h = *j.head;
-    ptrdiff_t off[kBatch];
+    int32_t cellRow[kBatch], cellCol[kBatch];
+    Load loads[R * kBatch];
     int32_t n = 0;
     bool first = true;
+    auto run = [&]() {
+        const int32_t nb = block_loads(cellRow, cellCol, n, R, j.srcStep, sizeof(T), loads);
+        int32_t y = 0;
+        for (; y + R <= j.height; y += R) block_rows<T, Op, R>(j, y, loads, nb, first);
+        if (y < j.height) {
+            const int32_t n1 = block_loads(cellRow, cellCol, n, 1, j.srcStep, sizeof(T), loads);
+            for (; y < j.height; ++y) block_rows<T, Op, 1>(j, y, loads, n1, first);
+        }
+        first = false;
+        n = 0;
+    };
     for (int32_t r = 0; r < h.maskHeight; ++r) {
         const uint8_t* list = h.pRowLists + (ptrdiff_t)r * (h.maskWidth + 1) * 2;
         const int32_t count = rd16u(list, 0);
         for (int32_t k = 1; k <= count; ++k) {
-            off[n++] = r * j.srcStep + rd16u(list, k) * (ptrdiff_t)sizeof(T);
-            if (n == kBatch) {
-                run_batch<T, Op>(j, off, n, first);
-                first = false;
-                n = 0;
-            }
+            cellRow[n] = r;
+            cellCol[n] = rd16u(list, k);
+            if (++n == kBatch) run();
         }
     }
-    if (n > 0) run_batch<T, Op>(j, off, n, first);
+    if (n > 0) run();
 }
 
 // ---- instances -------------------------------------------------------------------
