@@ -213,29 +213,42 @@ template <int MW, int MH, typename T, typename Op> bool columns_first(const Job<
     if (2 * lineBytes > ringBytes) return false;
     T* const line0 = (T*)j.ring;
     T* const line1 = (T*)(j.ring + lineBytes);
-    for (int32_t y = 0; y < H; y += 2) {
-        const bool pair = y + 1 < H;
-        const T* rows[MH + 1];
-        for (int i = 0; i < MH + (pair ? 1 : 0); ++i) rows[i] = row_at(j.src, j.srcStep, y + i);
-        for_row<T>(0, n, true, line0, [&](auto tag, int32_t x) MORPH_LAMBDA {
-            typedef typename decltype(tag)::type U;
-            U mid = ld<U>(rows[1] + x);
+    // Outputs x0 .. x1 - 1 of every row; the lines are indexed like the row.
+    auto strip = [&](int32_t x0, int32_t x1) {
+        for (int32_t y = 0; y < H; y += 2) {
+            const bool pair = y + 1 < H;
+            const T* rows[MH + 1];
+            for (int i = 0; i < MH + (pair ? 1 : 0); ++i)
+                rows[i] = row_at(j.src, j.srcStep, y + i);
+            for_row<T>(x0, x1 + MW - 1, true, line0, [&](auto tag, int32_t x) MORPH_LAMBDA {
+                typedef typename decltype(tag)::type U;
+                U mid = ld<U>(rows[1] + x);
 #pragma GCC unroll 8
-            for (int k = 2; k < MH; ++k) mid = Op::f(mid, ld<U>(rows[k] + x));
-            st(line0 + x, Op::f(ld<U>(rows[0] + x), mid));
-            if (pair) st(line1 + x, Op::f(mid, ld<U>(rows[MH] + x)));
-        });
-        T* d0 = row_at(j.dst, j.dstStep, y);
-        for_row<T>(0, W, true, d0, [&](auto tag, int32_t x) MORPH_LAMBDA {
-            typedef typename decltype(tag)::type U;
-            row_only<MW, U, Op>(line0, MW, x, d0);
-        });
-        if (!pair) break;
-        T* d1 = row_at(j.dst, j.dstStep, y + 1);
-        for_row<T>(0, W, true, d1, [&](auto tag, int32_t x) MORPH_LAMBDA {
-            typedef typename decltype(tag)::type U;
-            row_only<MW, U, Op>(line1, MW, x, d1);
-        });
+                for (int k = 2; k < MH; ++k) mid = Op::f(mid, ld<U>(rows[k] + x));
+                st(line0 + x, Op::f(ld<U>(rows[0] + x), mid));
+                if (pair) st(line1 + x, Op::f(mid, ld<U>(rows[MH] + x)));
+            });
+            T* d0 = row_at(j.dst, j.dstStep, y);
+            for_row<T>(x0, x1, true, d0, [&](auto tag, int32_t x) MORPH_LAMBDA {
+                typedef typename decltype(tag)::type U;
+                row_only<MW, U, Op>(line0, MW, x, d0);
+            });
+            if (!pair) break;
+            T* d1 = row_at(j.dst, j.dstStep, y + 1);
+            for_row<T>(x0, x1, true, d1, [&](auto tag, int32_t x) MORPH_LAMBDA {
+                typedef typename decltype(tag)::type U;
+                row_only<MW, U, Op>(line1, MW, x, d1);
+            });
+        }
+    };
+    // Strips of 4 KiB keep the source rows of a pass and the two lines in
+    // L1 (k0 32f 5x5: 1.07 -> 0.94 ms); the last strip takes up to one and
+    // a half strips.
+    constexpr int32_t S = 4096 / (int32_t)sizeof(T);
+    for (int32_t x0 = 0; x0 < W;) {
+        const int32_t x1 = W - x0 < S + S / 2 ? W : x0 + S;
+        strip(x0, x1);
+        x0 = x1;
     }
     return true;
 }

@@ -368,6 +368,18 @@ TEST_P(Morph, BothOperationsOnEveryMaskClass8u) {
                 ASSERT_NO_FATAL_FAILURE(run_case<Zor8u>(m, 200, 13, b, erode, ++seed));
 }
 
+// Rectangles wider than a strip of the columns-first kernel (4 KiB of a
+// row): the strips and the wider last strip must meet without a seam.
+TEST_P(Morph, WideRectanglesMatchTheModelAcrossStrips) {
+    uint32_t seed = 200000;
+    for (const Mask& m : {full(5, 5), full(7, 7)})
+        for (bool erode : {true, false}) {
+            ASSERT_NO_FATAL_FAILURE(run_case<Zor32f>(m, 3500, 6, 3, erode, ++seed));
+            ASSERT_NO_FATAL_FAILURE(run_case<Zor16s>(m, 3500, 5, 1, erode, ++seed));
+            ASSERT_NO_FATAL_FAILURE(run_case<Zor8u>(m, 7000, 5, 6, erode, ++seed));
+        }
+}
+
 // ---- borders with a meaning of their own ---------------------------------------------
 
 template <typename T>
