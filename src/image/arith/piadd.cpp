@@ -93,12 +93,31 @@ void add_product_row(const Zor32f* a, const Zor32f* b, const Zor8u* m, Zor32f* d
     for (; i < w; ++i) d[i] = d[i] + masked(a[i], m[i]) * b[i];
 }
 
+#if ZOR_VECTOR_BYTES >= 32
+// The wide levels keep the row loop of the image sum here, in blocks of 16
+// elements; rows of fewer than 29 elements go element by element.
+void add_row(const Zor32f* a, const Zor32f* b, Zor32f* d, int32_t w) {
+    int32_t i = 0;
+    if (w >= 29) {
+        for (; i + 16 <= w; i += 16)
+#pragma GCC unroll 2
+            for (int k = 0; k < 16; k += L)
+                simd::store(d + i + k, simd::load<vf32>(a + i + k) + simd::load<vf32>(b + i + k));
+    }
+    for (; i < w; ++i) d[i] = a[i] + b[i];
+}
+#endif
+
 }  // namespace
 
 ZOR_ENTRY ZorStatus ZOR_NAME(zoriAdd_32f_C1R)(const Zor32f* pSrc1, int32_t src1Step,
                                               const Zor32f* pSrc2, int32_t src2Step, Zor32f* pDst,
                                               int32_t dstStep, ZoriSize roiSize) {
+#if ZOR_VECTOR_BYTES >= 32
+    return binary(add_row, pSrc1, src1Step, pSrc2, src2Step, pDst, dstStep, roiSize);
+#else
     return binary(ZOR_NAME(ownsAdd_32f), pSrc1, src1Step, pSrc2, src2Step, pDst, dstStep, roiSize);
+#endif
 }
 ZOR_ENTRY ZorStatus ZOR_NAME(zoriSub_32f_C1R)(const Zor32f* pSrc1, int32_t src1Step,
                                               const Zor32f* pSrc2, int32_t src2Step, Zor32f* pDst,
