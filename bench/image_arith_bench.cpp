@@ -11,6 +11,7 @@
 #include <string>
 
 #include "zor.h"
+#include "bench_support.h"
 #include "zor_levels.h"
 
 #ifdef ZOR_BENCH_OPENCV
@@ -19,12 +20,6 @@
 #endif
 
 namespace {
-
-uint64_t detected() {
-    uint64_t features = 0;
-    zorGetCpuFeatures(&features, nullptr);
-    return features;
-}
 
 struct Size {
     int w, h;
@@ -66,7 +61,7 @@ const char* const kOpNames[] = {"copy_32f",  "set_32f",       "threshold_gt_32f"
                                 "absdiff_8u", "mul_8u_sfs",   "div_8u_sfs"};
 size_t elem_of(int op) { return op >= kAbsDiff ? 1 : 4; }
 
-void zor_op(benchmark::State& state, int op, Size s, uint64_t select) {
+void zor_op(benchmark::State& state, uint64_t select, int op, Size s) {
     zorSetCpuFeatures(select);
     const size_t elem = elem_of(op);
     Image a(s, elem, 1), b(s, elem, 2), d(s, elem, 3);
@@ -158,12 +153,7 @@ int register_all() {
         const std::string size = std::to_string(s.w) + "x" + std::to_string(s.h);
         for (int op = kCopy; op < kOpCount; ++op) {
             const std::string base = std::string("image_arith/") + kOpNames[op] + "/" + size + "/";
-#define ARITH_REGISTER(index, name, select, need)                                       \
-    if ((detected() & (need)) == (need))                                                \
-        benchmark::RegisterBenchmark((base + "zor_" #name).c_str(), zor_op, op, s, select) \
-            ->Unit(benchmark::kMicrosecond);
-            ZOR_LEVEL_LIST(ARITH_REGISTER)
-#undef ARITH_REGISTER
+            zorbench::register_levels(base, benchmark::kMicrosecond, zor_op, op, s);
 #ifdef ZOR_BENCH_OPENCV
             benchmark::RegisterBenchmark((base + "opencv").c_str(), opencv_op, op, s)
                 ->Unit(benchmark::kMicrosecond);
