@@ -38,7 +38,10 @@
  * Floats are compared as the processor's min and max instructions do, the
  * running result first: a NaN is not propagated reliably, and the general
  * mask path (any mask but a full rectangle) starts from the largest finite
- * value, so an infinity comes out as +-3.4028235e38 there. */
+ * value, so an infinity comes out as +-3.4028235e38 there. Which of +0
+ * and -0 (or which NaN) comes out depends on the mask's class and the
+ * order of its comparisons, never on the processor level: every level
+ * gives the same bits. */
 #ifndef ZORIMORPH_H
 #define ZORIMORPH_H
 
