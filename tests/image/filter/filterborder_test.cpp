@@ -21,6 +21,7 @@
 #include <string>
 #include <vector>
 
+#include "image_support.h"
 #include "zortest.h"
 
 namespace {
@@ -30,56 +31,22 @@ constexpr int kLevelsSse = 3;  // m7, n8, y8 come first in level order
 // ---- element types -----------------------------------------------------------
 
 template <typename T> struct Type;
-template <> struct Type<Zor8u> {
-    static constexpr ZorDataType id = zor8u;
-    static constexpr bool isInt = true;
-    static constexpr double lo = 0, hi = 255;
-    static Zor8u random(std::mt19937& g) { return (Zor8u)(g() & 255); }
-    static constexpr Zor8u border = 77;
-    static ZorStatus filter(const Zor8u* s, int32_t ss, Zor8u* d, int32_t ds, ZoriSize r,
-                            int32_t bt, const Zor8u* v, const ZoriFilterBorderSpec* sp,
-                            Zor8u* b) {
-        return zoriFilterBorder_8u_C1R(s, ss, d, ds, r, bt, v, sp, b);
-    }
-};
-template <> struct Type<Zor16u> {
-    static constexpr ZorDataType id = zor16u;
-    static constexpr bool isInt = true;
-    static constexpr double lo = 0, hi = 65535;
-    static Zor16u random(std::mt19937& g) { return (Zor16u)(g() & 4095); }
-    static constexpr Zor16u border = 1234;
-    static ZorStatus filter(const Zor16u* s, int32_t ss, Zor16u* d, int32_t ds, ZoriSize r,
-                            int32_t bt, const Zor16u* v, const ZoriFilterBorderSpec* sp,
-                            Zor8u* b) {
-        return zoriFilterBorder_16u_C1R(s, ss, d, ds, r, bt, v, sp, b);
-    }
-};
-template <> struct Type<Zor16s> {
-    static constexpr ZorDataType id = zor16s;
-    static constexpr bool isInt = true;
-    static constexpr double lo = -32768, hi = 32767;
-    static Zor16s random(std::mt19937& g) { return (Zor16s)((int)(g() & 8191) - 4096); }
-    static constexpr Zor16s border = -321;
-    static ZorStatus filter(const Zor16s* s, int32_t ss, Zor16s* d, int32_t ds, ZoriSize r,
-                            int32_t bt, const Zor16s* v, const ZoriFilterBorderSpec* sp,
-                            Zor8u* b) {
-        return zoriFilterBorder_16s_C1R(s, ss, d, ds, r, bt, v, sp, b);
-    }
-};
-template <> struct Type<Zor32f> {
-    static constexpr ZorDataType id = zor32f;
-    static constexpr bool isInt = false;
-    static constexpr double lo = 0, hi = 0;
-    static Zor32f random(std::mt19937& g) {
-        return std::uniform_real_distribution<float>(-100.0f, 100.0f)(g);
-    }
-    static constexpr Zor32f border = 2.5f;
-    static ZorStatus filter(const Zor32f* s, int32_t ss, Zor32f* d, int32_t ds, ZoriSize r,
-                            int32_t bt, const Zor32f* v, const ZoriFilterBorderSpec* sp,
-                            Zor8u* b) {
-        return zoriFilterBorder_32f_C1R(s, ss, d, ds, r, bt, v, sp, b);
-    }
-};
+// Type id, integer or not, saturation range, random pixel, border value.
+#define FB_TYPE(T, sfx, idv, intv, lov, hiv, rnd, bv)                 \
+    template <> struct Type<T> {                                       \
+        static constexpr ZorDataType id = idv;                         \
+        static constexpr bool isInt = intv;                            \
+        static constexpr double lo = lov, hi = hiv;                    \
+        static T random(std::mt19937& g) { return rnd; }               \
+        static constexpr T border = bv;                                \
+        static constexpr auto filter = zoriFilterBorder_##sfx##_C1R;   \
+    };
+FB_TYPE(Zor8u, 8u, zor8u, true, 0, 255, (Zor8u)(g() & 255), 77)
+FB_TYPE(Zor16u, 16u, zor16u, true, 0, 65535, (Zor16u)(g() & 4095), 1234)
+FB_TYPE(Zor16s, 16s, zor16s, true, -32768, 32767, (Zor16s)((int)(g() & 8191) - 4096), -321)
+FB_TYPE(Zor32f, 32f, zor32f, false, 0, 0,
+        std::uniform_real_distribution<float>(-100.0f, 100.0f)(g), 2.5f)
+#undef FB_TYPE
 
 // ---- the model ---------------------------------------------------------------
 
@@ -241,12 +208,23 @@ struct Record {
     }
 };
 
-constexpr uint8_t kGuard = 0xA5;
+constexpr uint8_t kGuard = zortest::kGuardByte;
+using zortest::guard_intact;
 
-bool guards_intact(const std::vector<uint8_t>& mem, size_t from) {
-    for (size_t i = from; i < mem.size(); ++i)
-        if (mem[i] != kGuard) return false;
-    return true;
+// A record of the kernel for data type t on roi and its work buffer, both
+// of the sizes GetSize asks for; Init's status is checked against want.
+struct Made {
+    std::vector<uint8_t> rec, buf;
+    ZoriFilterBorderSpec* spec() { return (ZoriFilterBorderSpec*)rec.data(); }
+};
+
+Made make(const float* k, ZoriSize ks, ZoriSize roi, ZorDataType t, int mode,
+          ZorStatus want = zorStsNoErr) {
+    int32_t specSize = 0, bufSize = 0;
+    EXPECT_EQ(zoriFilterBorderGetSize(ks, roi, t, zor32f, 1, &specSize, &bufSize), zorStsNoErr);
+    Made m{std::vector<uint8_t>(specSize), std::vector<uint8_t>(bufSize)};
+    EXPECT_EQ(zoriFilterBorderInit_32f(k, ks, t, 1, mode, m.spec()), want);
+    return m;
 }
 
 // Record and buffer sized by GetSize for this case, at odd offsets inside
@@ -263,7 +241,7 @@ void make_record(const Case& c, const std::vector<float>& k, std::vector<uint8_t
     *rec = (ZoriFilterBorderSpec*)(specMem.data() + 3);
     ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {c.kw, c.kh}, Type<T>::id, 1, c.roundMode, *rec),
               zorStsNoErr);
-    ASSERT_TRUE(guards_intact(specMem, specSize + 3)) << "Init wrote past the record";
+    ASSERT_TRUE(guard_intact(specMem, specSize + 3)) << "Init wrote past the record";
     bufMem.assign(bufferSize + 5 + 64, kGuard);
     *buf = bufMem.data() + 5;
     *bufSize = bufferSize;
@@ -301,7 +279,7 @@ void check_case(int level, const Case& c, const std::vector<float>& k, bool exac
     ASSERT_EQ(Type<T>::filter(src.roi, src.step, dst, dstStep, {c.W, c.H}, c.borderType, &value,
                               use, buf),
               zorStsNoErr);
-    ASSERT_TRUE(guards_intact(bufMem, (size_t)bufSize + 5)) << "work buffer overrun";
+    ASSERT_TRUE(guard_intact(bufMem, (size_t)bufSize + 5)) << "work buffer overrun";
 
     int bad = 0;
     for (int y = -G; y < c.H + G && bad < 5; ++y)
@@ -391,10 +369,10 @@ template <typename T> void sweep(int level) {
 
 using FilterBorder = zortest::LevelTest;
 
-TEST_P(FilterBorder, Sweep8u) { sweep<Zor8u>(GetParam().index); }
-TEST_P(FilterBorder, Sweep16u) { sweep<Zor16u>(GetParam().index); }
-TEST_P(FilterBorder, Sweep16s) { sweep<Zor16s>(GetParam().index); }
-TEST_P(FilterBorder, Sweep32f) { sweep<Zor32f>(GetParam().index); }
+TEST_P(FilterBorder, Sweep) {
+    const int level = GetParam().index;
+    zortest::for_each_type([level](auto t) { sweep<decltype(t)>(level); });
+}
 
 // Every kind with every combination of the four flags, on a few kernel
 // shapes (even ones included) and on ROIs that take the single frame and
@@ -430,10 +408,7 @@ TEST_P(FilterBorder, ArbitraryTapsWithinBound) {
         const std::vector<float> k = real_kernel(s[0], s[1], g);
         const Case c{61, 17, s[0], s[1], kBorders[n % 11], n % 3};
         ++n;
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor8u>(level, c, k, false, n));
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor16u>(level, c, k, false, n));
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor16s>(level, c, k, false, n));
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor32f>(level, c, k, false, n));
+        zortest::for_each_type([&](auto t) { check_case<decltype(t)>(level, c, k, false, n); });
     }
 }
 
@@ -448,25 +423,11 @@ TEST_P(FilterBorder, RecordFromAnotherLevel) {
         if (!zortest::runnable(maker)) continue;
         SCOPED_TRACE(std::string("record made under ") + maker.name);
         zorSetCpuFeatures(maker.select);
-        int32_t specSize = 0, bufSize = 0;
-        ASSERT_EQ(zoriFilterBorderGetSize({c.kw, c.kh}, {c.W, c.H}, zor16s, zor32f, 1, &specSize,
-                                          &bufSize),
-                  zorStsNoErr);
-        std::vector<uint8_t> block(specSize);
-        ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {c.kw, c.kh}, zor16s, 1, c.roundMode,
-                                           (ZoriFilterBorderSpec*)block.data()),
-                  zorStsNoErr);
+        Made m16 = make(k.data(), {c.kw, c.kh}, {c.W, c.H}, zor16s, c.roundMode);
+        Made m32 = make(k.data(), {c.kw, c.kh}, {c.W, c.H}, zor32f, 0);
         zorSetCpuFeatures(GetParam().select);
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor16s>(level, c, k, true, 3,
-                                                   (ZoriFilterBorderSpec*)block.data()));
-        std::vector<uint8_t> block32(specSize + 64);
-        zorSetCpuFeatures(maker.select);
-        ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {c.kw, c.kh}, zor32f, 1, 0,
-                                           (ZoriFilterBorderSpec*)block32.data()),
-                  zorStsNoErr);
-        zorSetCpuFeatures(GetParam().select);
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor32f>(level, c, k, true, 3,
-                                                   (ZoriFilterBorderSpec*)block32.data()));
+        ASSERT_NO_FATAL_FAILURE(check_case<Zor16s>(level, c, k, true, 3, m16.spec()));
+        ASSERT_NO_FATAL_FAILURE(check_case<Zor32f>(level, c, k, true, 3, m32.spec()));
     }
 }
 
@@ -477,19 +438,12 @@ TEST_P(FilterBorder, RecordFromAnotherLevel) {
 template <typename T>
 std::vector<T> run_plain(const std::vector<T>& img, int W, int H, const std::vector<float>& k,
                          int kw, int kh, int roundMode, int outW, int outH) {
-    int32_t specSize = 0, bufSize = 0;
-    EXPECT_EQ(zoriFilterBorderGetSize({kw, kh}, {outW, outH}, Type<T>::id, zor32f, 1, &specSize,
-                                      &bufSize),
-              zorStsNoErr);
-    std::vector<uint8_t> rec(specSize), buf(bufSize);
-    EXPECT_EQ(zoriFilterBorderInit_32f(k.data(), {kw, kh}, Type<T>::id, 1, roundMode,
-                                       (ZoriFilterBorderSpec*)rec.data()),
-              zorStsNoErr);
+    Made m = make(k.data(), {kw, kh}, {outW, outH}, Type<T>::id, roundMode);
     std::vector<T> out((size_t)outW * outH);
     const int ax = (kw - 1) / 2, ay = (kh - 1) / 2;
     EXPECT_EQ(Type<T>::filter(img.data() + ay * W + ax, W * sizeof(T), out.data(),
-                              outW * sizeof(T), {outW, outH}, zorBorderInMem, nullptr,
-                              (const ZoriFilterBorderSpec*)rec.data(), buf.data()),
+                              outW * sizeof(T), {outW, outH}, zorBorderInMem, nullptr, m.spec(),
+                              m.buf.data()),
               zorStsNoErr);
     return out;
 }
@@ -539,21 +493,15 @@ TEST_P(FilterBorder, SeamBetweenTruncatedEdgesAndRoundedCentre) {
     // Centre tap 1/4, the rest 0: pixel p = 4m + 3 gives m + 0.75.
     std::vector<float> k(9, 0.0f);
     k[4] = 0.25f;
-    int32_t specSize = 0, bufSize = 0;
-    ASSERT_EQ(zoriFilterBorderGetSize({3, 3}, {W, H}, zor8u, zor32f, 1, &specSize, &bufSize), 0);
-    std::vector<uint8_t> rec(specSize), buf(bufSize);
-    ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {3, 3}, zor8u, 1, 0,
-                                       (ZoriFilterBorderSpec*)rec.data()),
-              0);
+    Made m = make(k.data(), {3, 3}, {W, H}, zor8u, 0);
     // Nearest is nearest whatever the caller's rounding control says.
     for (int rc : {FE_TONEAREST, FE_TOWARDZERO, FE_DOWNWARD}) {
         SCOPED_TRACE("rounding control " + std::to_string(rc));
         std::vector<Zor8u> out(W * H);
         fesetround(rc);
         const ZorStatus st = zoriFilterBorder_8u_C1R(img.data() + (W + 2) + 1, W + 2, out.data(),
-                                                     W, {W, H}, zorBorderRepl, nullptr,
-                                                     (ZoriFilterBorderSpec*)rec.data(),
-                                                     buf.data());
+                                                     W, {W, H}, zorBorderRepl, nullptr, m.spec(),
+                                                     m.buf.data());
         fesetround(FE_TONEAREST);
         ASSERT_EQ(st, 0);
         for (int y = 0; y < H; ++y)
@@ -594,33 +542,18 @@ TEST_P(FilterBorder, NoReadsPastTheRoiWhereNothingIsInMemory) {
             }
             std::mt19937 g(kw);
             const std::vector<float> k = dyadic_kernel(kw, kh, g);
+            Made m32 = make(k.data(), {kw, kh}, {W, H}, zor32f, 1);
+            Made m8 = make(k.data(), {kw, kh}, {W, H}, zor8u, 1);
             for (int kind : {zorBorderRepl, zorBorderMirror, zorBorderConst}) {
-                int32_t specSize = 0, bufSize = 0;
-                ASSERT_EQ(zoriFilterBorderGetSize({kw, kh}, {W, H}, zor32f, zor32f, 1, &specSize,
-                                                  &bufSize),
-                          0);
-                std::vector<uint8_t> rec(specSize), buf(bufSize);
-                ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {kw, kh}, zor32f, 1, 1,
-                                                   (ZoriFilterBorderSpec*)rec.data()),
-                          0);
                 std::vector<float> out(W * H);
                 const float v32 = 1.0f;
                 EXPECT_EQ(zoriFilterBorder_32f_C1R(img32, W * 4, out.data(), W * 4, {W, H}, kind,
-                                                   &v32, (ZoriFilterBorderSpec*)rec.data(),
-                                                   buf.data()),
-                          0);
-                ASSERT_EQ(zoriFilterBorderGetSize({kw, kh}, {W, H}, zor8u, zor32f, 1, &specSize,
-                                                  &bufSize),
-                          0);
-                rec.assign(specSize, 0);
-                buf.assign(bufSize, 0);
-                ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {kw, kh}, zor8u, 1, 1,
-                                                   (ZoriFilterBorderSpec*)rec.data()),
+                                                   &v32, m32.spec(), m32.buf.data()),
                           0);
                 std::vector<Zor8u> out8(W * H);
                 const Zor8u v8 = 1;
                 EXPECT_EQ(zoriFilterBorder_8u_C1R(img8, W, out8.data(), W, {W, H}, kind, &v8,
-                                                  (ZoriFilterBorderSpec*)rec.data(), buf.data()),
+                                                  m8.spec(), m8.buf.data()),
                           0);
             }
             munmap(m, span + 2 * page);
@@ -632,11 +565,9 @@ TEST_P(FilterBorder, NoReadsPastTheRoiWhereNothingIsInMemory) {
 
 TEST_P(FilterBorder, FilterChecksInOrderAndWritesNothing) {
     const float k[9] = {0, 0, 0, 0, 1, 0, 0, 0, 0};
-    int32_t specSize = 0, bufSize = 0;
-    ASSERT_EQ(zoriFilterBorderGetSize({3, 3}, {8, 8}, zor8u, zor32f, 1, &specSize, &bufSize), 0);
-    std::vector<uint8_t> specMem(specSize), buf(bufSize);
-    const ZoriFilterBorderSpec* rec = (ZoriFilterBorderSpec*)specMem.data();
-    ASSERT_EQ(zoriFilterBorderInit_32f(k, {3, 3}, zor8u, 1, 1, (ZoriFilterBorderSpec*)rec), 0);
+    Made made = make(k, {3, 3}, {8, 8}, zor8u, 1);
+    const ZoriFilterBorderSpec* rec = made.spec();
+    std::vector<uint8_t>& buf = made.buf;
     Zor8u big[256] = {1}, dst[64];
     const Zor8u* src = big + 100;
     memset(dst, 0xEE, sizeof dst);
@@ -714,16 +645,11 @@ TEST_P(FilterBorder, InitChecksInOrder) {
 // truncates on the scalar path.
 TEST_P(FilterBorder, HintBitWarnsAndIsRemoved) {
     const float k[1] = {0.75f};
-    int32_t specSize = 0, bufSize = 0;
-    ASSERT_EQ(zoriFilterBorderGetSize({1, 1}, {3, 1}, zor8u, zor32f, 1, &specSize, &bufSize), 0);
-    std::vector<uint8_t> rec(specSize), buf(bufSize);
-    ASSERT_EQ(zoriFilterBorderInit_32f(k, {1, 1}, zor8u, 1, 0x10000,
-                                       (ZoriFilterBorderSpec*)rec.data()),
-              zorStsAccurateModeNotSupported);
+    Made m = make(k, {1, 1}, {3, 1}, zor8u, 0x10000, zorStsAccurateModeNotSupported);
     const Zor8u src[3] = {3, 5, 7};
     Zor8u dst[3];
-    ASSERT_EQ(zoriFilterBorder_8u_C1R(src, 3, dst, 3, {3, 1}, zorBorderRepl, nullptr,
-                                      (ZoriFilterBorderSpec*)rec.data(), buf.data()),
+    ASSERT_EQ(zoriFilterBorder_8u_C1R(src, 3, dst, 3, {3, 1}, zorBorderRepl, nullptr, m.spec(),
+                                      m.buf.data()),
               0);
     EXPECT_EQ(dst[0], 2);  // 2.25
     EXPECT_EQ(dst[1], 3);  // 3.75
