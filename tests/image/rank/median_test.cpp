@@ -23,22 +23,16 @@ constexpr int kLeft = zorBorderInMemLeft, kRight = zorBorderInMemRight;
 // ---- calling the four forms ------------------------------------------------
 
 template <typename T> struct Form;
-template <> struct Form<Zor8u> {
-    static constexpr ZorDataType type = zor8u;
-    static constexpr auto fn = zoriFilterMedianBorder_8u_C1R;
-};
-template <> struct Form<Zor16u> {
-    static constexpr ZorDataType type = zor16u;
-    static constexpr auto fn = zoriFilterMedianBorder_16u_C1R;
-};
-template <> struct Form<Zor16s> {
-    static constexpr ZorDataType type = zor16s;
-    static constexpr auto fn = zoriFilterMedianBorder_16s_C1R;
-};
-template <> struct Form<Zor32f> {
-    static constexpr ZorDataType type = zor32f;
-    static constexpr auto fn = zoriFilterMedianBorder_32f_C1R;
-};
+#define MEDIAN_FORM(T, t)                                          \
+    template <> struct Form<T> {                                   \
+        static constexpr ZorDataType type = zor##t;                \
+        static constexpr auto fn = zoriFilterMedianBorder_##t##_C1R; \
+    };
+MEDIAN_FORM(Zor8u, 8u)
+MEDIAN_FORM(Zor16u, 16u)
+MEDIAN_FORM(Zor16s, 16s)
+MEDIAN_FORM(Zor32f, 32f)
+#undef MEDIAN_FORM
 
 template <typename T>
 ZorStatus call(const T* src, int32_t srcStep, T* dst, int32_t dstStep, ZoriSize roi, ZoriSize mask,
