@@ -272,11 +272,6 @@ TEST_P(Sfs, DivisionStatusAndLaterRows) {
             for (int x = 0; x < 20; ++x)
                 ASSERT_EQ(d[y][x], div_model<Zor8u>(a[y][x], b[y][x], 0)) << y << "," << x;
     }
-    const Zor16s a[2] = {-3, 1}, b[2] = {7, -7};
-    Zor16s d[2];
-    EXPECT_EQ(zoriDiv_16s_C1RSfs(a, 4, b, 4, d, 4, {2, 1}, 0), zorStsNoErr);
-    EXPECT_EQ(d[0], -2);
-    EXPECT_EQ(d[1], -7);
 }
 
 // Pointers, ROI, then steps where the operation tests them; nothing written
