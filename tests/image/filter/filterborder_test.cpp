@@ -201,50 +201,30 @@ Expect model(const Source<T>& src, const Case& c, const std::vector<float>& k, i
 
 // ---- running one case ----------------------------------------------------------
 
-struct Record {
-    std::vector<uint8_t> block;
-    const ZoriFilterBorderSpec* get(int offset) const {
-        return (const ZoriFilterBorderSpec*)(block.data() + offset);
-    }
-};
-
 constexpr uint8_t kGuard = zortest::kGuardByte;
 using zortest::guard_intact;
 
 // A record of the kernel for data type t on roi and its work buffer, both
-// of the sizes GetSize asks for; Init's status is checked against want.
+// of the sizes GetSize asks for, at odd offsets (3 and 5 bytes) inside
+// blocks with guard bytes behind them; Init's status is checked against want.
 struct Made {
     std::vector<uint8_t> rec, buf;
-    ZoriFilterBorderSpec* spec() { return (ZoriFilterBorderSpec*)rec.data(); }
+    int32_t specSize = 0, bufSize = 0;
+    ZoriFilterBorderSpec* spec() { return (ZoriFilterBorderSpec*)(rec.data() + 3); }
+    Zor8u* buffer() { return buf.data() + 5; }
+    bool buffer_intact() const { return guard_intact(buf, 5 + (size_t)bufSize); }
 };
 
 Made make(const float* k, ZoriSize ks, ZoriSize roi, ZorDataType t, int mode,
           ZorStatus want = zorStsNoErr) {
-    int32_t specSize = 0, bufSize = 0;
-    EXPECT_EQ(zoriFilterBorderGetSize(ks, roi, t, zor32f, 1, &specSize, &bufSize), zorStsNoErr);
-    Made m{std::vector<uint8_t>(specSize), std::vector<uint8_t>(bufSize)};
+    Made m;
+    EXPECT_EQ(zoriFilterBorderGetSize(ks, roi, t, zor32f, 1, &m.specSize, &m.bufSize),
+              zorStsNoErr);
+    m.rec = zortest::guarded(3 + (size_t)m.specSize);
+    m.buf = zortest::guarded(5 + (size_t)m.bufSize);
     EXPECT_EQ(zoriFilterBorderInit_32f(k, ks, t, 1, mode, m.spec()), want);
+    EXPECT_TRUE(guard_intact(m.rec, 3 + (size_t)m.specSize)) << "Init wrote past the record";
     return m;
-}
-
-// Record and buffer sized by GetSize for this case, at odd offsets inside
-// blocks with guard bytes behind them.
-template <typename T>
-void make_record(const Case& c, const std::vector<float>& k, std::vector<uint8_t>& specMem,
-                 ZoriFilterBorderSpec** rec, std::vector<uint8_t>& bufMem, Zor8u** buf,
-                 int* bufSize) {
-    int32_t specSize = 0, bufferSize = 0;
-    ASSERT_EQ(zoriFilterBorderGetSize({c.kw, c.kh}, {c.W, c.H}, Type<T>::id, zor32f, 1, &specSize,
-                                      &bufferSize),
-              zorStsNoErr);
-    specMem.assign(specSize + 3 + 64, kGuard);
-    *rec = (ZoriFilterBorderSpec*)(specMem.data() + 3);
-    ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {c.kw, c.kh}, Type<T>::id, 1, c.roundMode, *rec),
-              zorStsNoErr);
-    ASSERT_TRUE(guard_intact(specMem, specSize + 3)) << "Init wrote past the record";
-    bufMem.assign(bufferSize + 5 + 64, kGuard);
-    *buf = bufMem.data() + 5;
-    *bufSize = bufferSize;
 }
 
 std::string describe(const Case& c) {
@@ -264,12 +244,8 @@ void check_case(int level, const Case& c, const std::vector<float>& k, bool exac
     const int offset = (seed % 4) * (int)sizeof(T);
     Source<T> src(c.W, c.H, pad, offset, g);
 
-    std::vector<uint8_t> specMem, bufMem;
-    ZoriFilterBorderSpec* rec = nullptr;
-    Zor8u* buf = nullptr;
-    int bufSize = 0;
-    ASSERT_NO_FATAL_FAILURE(make_record<T>(c, k, specMem, &rec, bufMem, &buf, &bufSize));
-    const ZoriFilterBorderSpec* use = given ? given : rec;
+    Made m = make(k.data(), {c.kw, c.kh}, {c.W, c.H}, Type<T>::id, c.roundMode);
+    const ZoriFilterBorderSpec* use = given ? given : m.spec();
 
     const int G = 3;  // guard pixels around the destination ROI
     const int32_t dstStep = (int32_t)((c.W + 2 * G) * sizeof(T)) + (sizeof(T) == 1 ? 1 : 0);
@@ -277,9 +253,9 @@ void check_case(int level, const Case& c, const std::vector<float>& k, bool exac
     T* dst = (T*)(dstMem.data() + (size_t)G * dstStep + G * sizeof(T));
     const T value = Type<T>::border;
     ASSERT_EQ(Type<T>::filter(src.roi, src.step, dst, dstStep, {c.W, c.H}, c.borderType, &value,
-                              use, buf),
+                              use, m.buffer()),
               zorStsNoErr);
-    ASSERT_TRUE(guard_intact(bufMem, (size_t)bufSize + 5)) << "work buffer overrun";
+    ASSERT_TRUE(m.buffer_intact()) << "work buffer overrun";
 
     int bad = 0;
     for (int y = -G; y < c.H + G && bad < 5; ++y)
@@ -443,7 +419,7 @@ std::vector<T> run_plain(const std::vector<T>& img, int W, int H, const std::vec
     const int ax = (kw - 1) / 2, ay = (kh - 1) / 2;
     EXPECT_EQ(Type<T>::filter(img.data() + ay * W + ax, W * sizeof(T), out.data(),
                               outW * sizeof(T), {outW, outH}, zorBorderInMem, nullptr, m.spec(),
-                              m.buf.data()),
+                              m.buffer()),
               zorStsNoErr);
     return out;
 }
@@ -498,7 +474,7 @@ TEST_P(FilterBorder, SeamBetweenTruncatedEdgesAndRoundedCentre) {
         fesetround(rc);
         const ZorStatus st = zoriFilterBorder_8u_C1R(img.data() + (W + 2) + 1, W + 2, out.data(),
                                                      W, {W, H}, zorBorderRepl, nullptr, m.spec(),
-                                                     m.buf.data());
+                                                     m.buffer());
         fesetround(FE_TONEAREST);
         ASSERT_EQ(st, 0);
         for (int y = 0; y < H; ++y)
@@ -545,12 +521,12 @@ TEST_P(FilterBorder, NoReadsPastTheRoiWhereNothingIsInMemory) {
                 std::vector<float> out(W * H);
                 const float v32 = 1.0f;
                 EXPECT_EQ(zoriFilterBorder_32f_C1R(img32, W * 4, out.data(), W * 4, {W, H}, kind,
-                                                   &v32, m32.spec(), m32.buf.data()),
+                                                   &v32, m32.spec(), m32.buffer()),
                           0);
                 std::vector<Zor8u> out8(W * H);
                 const Zor8u v8 = 1;
                 EXPECT_EQ(zoriFilterBorder_8u_C1R(img8, W, out8.data(), W, {W, H}, kind, &v8,
-                                                  m8.spec(), m8.buf.data()),
+                                                  m8.spec(), m8.buffer()),
                           0);
             }
             munmap(m, span + 2 * page);
@@ -646,7 +622,7 @@ TEST_P(FilterBorder, HintBitWarnsAndIsRemoved) {
     const Zor8u src[3] = {3, 5, 7};
     Zor8u dst[3];
     ASSERT_EQ(zoriFilterBorder_8u_C1R(src, 3, dst, 3, {3, 1}, zorBorderRepl, nullptr, m.spec(),
-                                      m.buf.data()),
+                                      m.buffer()),
               0);
     EXPECT_EQ(dst[0], 2);  // 2.25
     EXPECT_EQ(dst[1], 3);  // 3.75
