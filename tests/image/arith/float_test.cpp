@@ -22,11 +22,14 @@ enum StepRule {
     kRow,      // at least a row, multiple of the element size
 };
 
+// The last argument is the constant of the C forms, ignored by the others.
 typedef std::function<ZorStatus(const void*, int32_t, const void*, int32_t, void*, int32_t,
-                                ZoriSize)>
+                                ZoriSize, float)>
     Call;
 // want(x, y) from a(x, y) and b(x, y) (b unused by one-source operations).
 typedef std::function<void(Plane&, Plane&, Plane&, int32_t, int32_t)> Model;
+
+const float kC = 0.37f;
 
 struct Op {
     const char* name;
@@ -35,6 +38,7 @@ struct Op {
     bool nanSign;  // a NaN result's sign is defined (cleared), not only its NaN-ness
     Call call;
     Model model;
+    float value = kC;  // the constant of the C forms
 };
 
 template <typename F>
@@ -52,19 +56,16 @@ Model int_absdiff() {
 }
 inline float clear_sign(float v) { return bits_f(f_bits(v) & 0x7fffffffu); }
 
-#define ZT_BIN(fn, T)                                                                   \
-    [](const void* a, int32_t sa, const void* b, int32_t sb, void* d, int32_t sd,       \
-       ZoriSize r) { return fn((const T*)a, sa, (const T*)b, sb, (T*)d, sd, r); }
-#define ZT_CONST(fn, v)                                                                   \
-    [](const void* a, int32_t sa, const void*, int32_t, void* d, int32_t sd, ZoriSize r) { \
-        return fn((const Zor32f*)a, sa, (Zor32f*)d, sd, r, v);                            \
-    }
-#define ZT_UN(fn)                                                                         \
-    [](const void* a, int32_t sa, const void*, int32_t, void* d, int32_t sd, ZoriSize r) { \
-        return fn((const Zor32f*)a, sa, (Zor32f*)d, sd, r);                               \
-    }
+#define ZT_BIN(fn, T)                                                             \
+    [](const void* a, int32_t sa, const void* b, int32_t sb, void* d, int32_t sd, \
+       ZoriSize r, float) { return fn((const T*)a, sa, (const T*)b, sb, (T*)d, sd, r); }
+#define ZT_CONST(fn)                                                                   \
+    [](const void* a, int32_t sa, const void*, int32_t, void* d, int32_t sd, ZoriSize r, \
+       float v) { return fn((const Zor32f*)a, sa, (Zor32f*)d, sd, r, v); }
+#define ZT_UN(fn)                                                                      \
+    [](const void* a, int32_t sa, const void*, int32_t, void* d, int32_t sd, ZoriSize r, \
+       float) { return fn((const Zor32f*)a, sa, (Zor32f*)d, sd, r); }
 
-const float kC = 0.37f;
 
 std::vector<Op> ops() {
     return {
@@ -74,26 +75,27 @@ std::vector<Op> ops() {
          float_model([](float a, float b) { return b - a; })},
         {"Mul", 4, kFree, false, ZT_BIN(zoriMul_32f_C1R, Zor32f),
          float_model([](float a, float b) { return a * b; })},
-        {"AddC", 4, kFree, false, ZT_CONST(zoriAddC_32f_C1R, kC),
+        {"AddC", 4, kFree, false, ZT_CONST(zoriAddC_32f_C1R),
          float_model([](float a, float) { return a + kC; })},
-        {"SubC", 4, kFree, false, ZT_CONST(zoriSubC_32f_C1R, kC),
+        {"SubC", 4, kFree, false, ZT_CONST(zoriSubC_32f_C1R),
          float_model([](float a, float) { return a - kC; })},
-        {"MulC", 4, kFree, false, ZT_CONST(zoriMulC_32f_C1R, kC),
+        {"MulC", 4, kFree, false, ZT_CONST(zoriMulC_32f_C1R),
          float_model([](float a, float) { return a * kC; })},
         // By 3: the rounded third differs from a true division for many
         // sources, so a division would show.
-        {"DivC", 4, kPositive, false, ZT_CONST(zoriDivC_32f_C1R, 3.0f),
+        {"DivC", 4, kPositive, false, ZT_CONST(zoriDivC_32f_C1R),
          float_model([](float a, float) {
              volatile float r = 1.0f / 3.0f;
              return a * r;
-         })},
+         }),
+         3.0f},
         {"Abs", 4, kRounded, true, ZT_UN(zoriAbs_32f_C1R),
          float_model([](float a, float) { return clear_sign(a); })},
         {"Sqr", 4, kRounded, false, ZT_UN(zoriSqr_32f_C1R),
          float_model([](float a, float) { return a * a; })},
         {"AbsDiff_32f", 4, kRow, true, ZT_BIN(zoriAbsDiff_32f_C1R, Zor32f),
          float_model([](float a, float b) { return clear_sign(a - b); })},
-        {"AbsDiffC_32f", 4, kRow, true, ZT_CONST(zoriAbsDiffC_32f_C1R, kC),
+        {"AbsDiffC_32f", 4, kRow, true, ZT_CONST(zoriAbsDiffC_32f_C1R),
          float_model([](float a, float) { return clear_sign(a - kC); })},
         {"AbsDiff_8u", 1, kRow, false, ZT_BIN(zoriAbsDiff_8u_C1R, Zor8u), int_absdiff<Zor8u>()},
         {"AbsDiff_16u", 2, kRow, false, ZT_BIN(zoriAbsDiff_16u_C1R, Zor16u),
@@ -153,7 +155,7 @@ void run_op(const Op& op, uint64_t seed) {
             for (int32_t y = 0; y < g.h; ++y)
                 for (int32_t x = 0; x < g.w; ++x) op.model(a, b, want, x, y);
             const ZorStatus st =
-                op.call(a.ptr<void>(), s[0], b.ptr<void>(), s[1], d.ptr<void>(), s[2], {g.w, g.h});
+                op.call(a.ptr<void>(), s[0], b.ptr<void>(), s[1], d.ptr<void>(), s[2], {g.w, g.h}, op.value);
             ASSERT_EQ(st, zorStsNoErr) << op.name << " " << where(d);
             if (op.esize == 4) accept_nan_payloads(want, d, op.nanSign);
             ASSERT_TRUE(same_bytes(d.mem, want.mem, d)) << op.name;
@@ -178,30 +180,17 @@ TEST_P(FloatArith, LargeImages) {
             Plane a(roi.width, roi.height, 4, step, pad, r), b = a, d = a;
             fill(a, 4, r);
             fill(b, 4, r);
-            Plane sq = d, sum = d, ad = d;
-            for (int32_t y = 0; y < roi.height; ++y)
-                for (int32_t x = 0; x < roi.width; ++x) {
-                    const float u = a.get<float>(x, y), v = b.get<float>(x, y);
-                    sq.put<float>(x, y, u * u);
-                    sum.put<float>(x, y, u + v);
-                    ad.put<float>(x, y, clear_sign(u - v));
-                }
-            Plane got = d;
-            ASSERT_EQ(zoriSqr_32f_C1R(a.ptr<Zor32f>(), step, got.ptr<Zor32f>(), step, roi), 0);
-            accept_nan_payloads(sq, got, false);
-            ASSERT_TRUE(same_bytes(got.mem, sq.mem, got)) << "Sqr";
-            got = d;
-            ASSERT_EQ(zoriAdd_32f_C1R(a.ptr<Zor32f>(), step, b.ptr<Zor32f>(), step,
-                                      got.ptr<Zor32f>(), step, roi),
-                      0);
-            accept_nan_payloads(sum, got, false);
-            ASSERT_TRUE(same_bytes(got.mem, sum.mem, got)) << "Add";
-            got = d;
-            ASSERT_EQ(zoriAbsDiff_32f_C1R(a.ptr<Zor32f>(), step, b.ptr<Zor32f>(), step,
-                                          got.ptr<Zor32f>(), step, roi),
-                      0);
-            accept_nan_payloads(ad, got, true);
-            ASSERT_TRUE(same_bytes(got.mem, ad.mem, got)) << "AbsDiff";
+            for (const Op& op : ops()) {
+                const std::string name = op.name;
+                if (name != "Sqr" && name != "Add" && name != "AbsDiff_32f") continue;
+                Plane want = d, got = d;
+                for (int32_t y = 0; y < roi.height; ++y)
+                    for (int32_t x = 0; x < roi.width; ++x) op.model(a, b, want, x, y);
+                ASSERT_EQ(op.call(a.at(0, 0), step, b.at(0, 0), step, got.at(0, 0), step, roi, op.value), 0)
+                    << name;
+                accept_nan_payloads(want, got, op.nanSign);
+                ASSERT_TRUE(same_bytes(got.mem, want.mem, got)) << name;
+            }
         }
     }
 }
@@ -415,20 +404,8 @@ struct Checked {
     StepRule rule;
     int extra;  // 1: division by a value that must not be 0; 2: AddProduct
     bool twoImages;
-    std::function<ZorStatus(const void*, int32_t, const void*, int32_t, void*, int32_t, ZoriSize,
-                            float)>
-        call;
+    Call call;
 };
-
-#define ZT_CHK_BIN(fn, T)                                                                 \
-    [](const void* a, int32_t sa, const void* b, int32_t sb, void* d, int32_t sd,         \
-       ZoriSize r, float) { return fn((const T*)a, sa, (const T*)b, sb, (T*)d, sd, r); }
-#define ZT_CHK_CONST(fn)                                                             \
-    [](const void* a, int32_t sa, const void*, int32_t, void* d, int32_t sd, ZoriSize r, \
-       float v) { return fn((const Zor32f*)a, sa, (Zor32f*)d, sd, r, v); }
-#define ZT_CHK_UN(fn)                                                                \
-    [](const void* a, int32_t sa, const void*, int32_t, void* d, int32_t sd, ZoriSize r, \
-       float) { return fn((const Zor32f*)a, sa, (Zor32f*)d, sd, r); }
 
 TEST_P(FloatArith, ChecksInOrder) {
     // AddProduct: src1 and src2 share the first pointer and step; the mask
@@ -439,20 +416,20 @@ TEST_P(FloatArith, ChecksInOrder) {
                                         (const Zor8u*)m, sm, (Zor32f*)d, sd, r);
     };
     const std::vector<Checked> all = {
-        {"Add", 4, kFree, 0, true, ZT_CHK_BIN(zoriAdd_32f_C1R, Zor32f)},
-        {"Sub", 4, kFree, 0, true, ZT_CHK_BIN(zoriSub_32f_C1R, Zor32f)},
-        {"Mul", 4, kFree, 0, true, ZT_CHK_BIN(zoriMul_32f_C1R, Zor32f)},
-        {"Div", 4, kPositive, 0, true, ZT_CHK_BIN(zoriDiv_32f_C1R, Zor32f)},
-        {"AddC", 4, kFree, 0, false, ZT_CHK_CONST(zoriAddC_32f_C1R)},
-        {"SubC", 4, kFree, 0, false, ZT_CHK_CONST(zoriSubC_32f_C1R)},
-        {"MulC", 4, kFree, 0, false, ZT_CHK_CONST(zoriMulC_32f_C1R)},
-        {"DivC", 4, kPositive, 1, false, ZT_CHK_CONST(zoriDivC_32f_C1R)},
-        {"Abs", 4, kRounded, 0, false, ZT_CHK_UN(zoriAbs_32f_C1R)},
-        {"Sqr", 4, kRounded, 0, false, ZT_CHK_UN(zoriSqr_32f_C1R)},
-        {"AbsDiff_8u", 1, kRow, 0, true, ZT_CHK_BIN(zoriAbsDiff_8u_C1R, Zor8u)},
-        {"AbsDiff_16u", 2, kRow, 0, true, ZT_CHK_BIN(zoriAbsDiff_16u_C1R, Zor16u)},
-        {"AbsDiff_32f", 4, kRow, 0, true, ZT_CHK_BIN(zoriAbsDiff_32f_C1R, Zor32f)},
-        {"AbsDiffC_32f", 4, kRow, 0, false, ZT_CHK_CONST(zoriAbsDiffC_32f_C1R)},
+        {"Add", 4, kFree, 0, true, ZT_BIN(zoriAdd_32f_C1R, Zor32f)},
+        {"Sub", 4, kFree, 0, true, ZT_BIN(zoriSub_32f_C1R, Zor32f)},
+        {"Mul", 4, kFree, 0, true, ZT_BIN(zoriMul_32f_C1R, Zor32f)},
+        {"Div", 4, kPositive, 0, true, ZT_BIN(zoriDiv_32f_C1R, Zor32f)},
+        {"AddC", 4, kFree, 0, false, ZT_CONST(zoriAddC_32f_C1R)},
+        {"SubC", 4, kFree, 0, false, ZT_CONST(zoriSubC_32f_C1R)},
+        {"MulC", 4, kFree, 0, false, ZT_CONST(zoriMulC_32f_C1R)},
+        {"DivC", 4, kPositive, 1, false, ZT_CONST(zoriDivC_32f_C1R)},
+        {"Abs", 4, kRounded, 0, false, ZT_UN(zoriAbs_32f_C1R)},
+        {"Sqr", 4, kRounded, 0, false, ZT_UN(zoriSqr_32f_C1R)},
+        {"AbsDiff_8u", 1, kRow, 0, true, ZT_BIN(zoriAbsDiff_8u_C1R, Zor8u)},
+        {"AbsDiff_16u", 2, kRow, 0, true, ZT_BIN(zoriAbsDiff_16u_C1R, Zor16u)},
+        {"AbsDiff_32f", 4, kRow, 0, true, ZT_BIN(zoriAbsDiff_32f_C1R, Zor32f)},
+        {"AbsDiffC_32f", 4, kRow, 0, false, ZT_CONST(zoriAbsDiffC_32f_C1R)},
         {"AddProduct", 4, kRow, 2, true, addProduct},
     };
     alignas(64) Zor32f src[64];

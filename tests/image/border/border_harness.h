@@ -117,48 +117,29 @@ struct Form {
 #define BORDER_ARGS_R(T) \
     (const T*)a.src, a.srcStep, a.srcRoi, (T*)a.dst, a.dstStep, a.dstRoi, a.top, a.left
 // CALL(fn) names the body to run; `level` is in scope where it expands.
-#define FORM_CONST1(CALL, fn, T)                                       \
-    bordertest::Form {                                                 \
-#fn, bordertest::kConst, (int)sizeof(T), 1,                          \
-                     [](int level, const bordertest::Args& a) -> ZorStatus {              \
-                         (void)level;                                                      \
-                         T v;                                                              \
-                         memcpy(&v, a.value, sizeof v);                                    \
-                         return CALL(fn)(BORDER_ARGS_R(T), v);                             \
-                     },                                                                    \
-                     nullptr \
+#define BORDER_FORM(kind, fn, T, C, copyBody, inPlace)                     \
+    bordertest::Form {                                                     \
+        #fn, kind, (int)sizeof(T), C,                                      \
+            [](int level, const bordertest::Args& a) -> ZorStatus {        \
+                (void)level;                                               \
+                copyBody;                                                  \
+            },                                                             \
+            inPlace                                                        \
     }
-#define FORM_CONSTN(CALL, fn, T, C)                                     \
-    bordertest::Form {                                                  \
-#fn, bordertest::kConst, (int)sizeof(T), C,                           \
-                     [](int level, const bordertest::Args& a) -> ZorStatus {              \
-                         (void)level;                                                      \
-                         return CALL(fn)(BORDER_ARGS_R(T), (const T*)a.value);             \
-                     },                                                                    \
-                     nullptr \
-    }
-#define FORM_COPY(CALL, kind, fn, T, C)                                 \
-    bordertest::Form {                                                  \
-#fn, kind, (int)sizeof(T), C,                                         \
-                     [](int level, const bordertest::Args& a) -> ZorStatus {              \
-                         (void)level;                                                      \
-                         return CALL(fn)(BORDER_ARGS_R(T));                                \
-                     },                                                                    \
-                     nullptr \
-    }
-#define FORM_BOTH(CALL, kind, fn, ifn, T, C)                            \
-    bordertest::Form {                                                  \
-#fn, kind, (int)sizeof(T), C,                                         \
-                     [](int level, const bordertest::Args& a) -> ZorStatus {              \
-                         (void)level;                                                      \
-                         return CALL(fn)(BORDER_ARGS_R(T));                                \
-                     },                                                                    \
-                     [](int level, void* p, int32_t step, ZoriSize s, ZoriSize d, int32_t t, \
-                        int32_t l) -> ZorStatus {                                          \
-                         (void)level;                                                      \
-                         return CALL(ifn)((T*)p, step, s, d, t, l);                        \
-                     } \
-    }
+#define FORM_CONST1(CALL, fn, T)                                                        \
+    BORDER_FORM(bordertest::kConst, fn, T, 1, T v; memcpy(&v, a.value, sizeof v);       \
+                return CALL(fn)(BORDER_ARGS_R(T), v), nullptr)
+#define FORM_CONSTN(CALL, fn, T, C) \
+    BORDER_FORM(bordertest::kConst, fn, T, C, return CALL(fn)(BORDER_ARGS_R(T), (const T*)a.value), nullptr)
+#define FORM_COPY(CALL, kind, fn, T, C) \
+    BORDER_FORM(kind, fn, T, C, return CALL(fn)(BORDER_ARGS_R(T)), nullptr)
+#define FORM_BOTH(CALL, kind, fn, ifn, T, C)                                                  \
+    BORDER_FORM(kind, fn, T, C, return CALL(fn)(BORDER_ARGS_R(T)),                           \
+                ([](int level, void* p, int32_t step, ZoriSize s, ZoriSize d, int32_t t,     \
+                    int32_t l) -> ZorStatus {                                                 \
+                    (void)level;                                                              \
+                    return CALL(ifn)((T*)p, step, s, d, t, l);                                \
+                }))
 
 // ---- buffers ---------------------------------------------------------------
 
@@ -217,10 +198,16 @@ inline std::vector<Geometry> geometries() {
     return out;
 }
 
-// One pixel of distinct bytes for the constant.
+// One pixel of distinct bytes for the constant; every 4-byte group is a
+// signalling NaN (alternating signs), which a float form must pass on as
+// bits without quieting it.
 inline std::vector<uint8_t> const_value(size_t P) {
     std::vector<uint8_t> v(P);
     for (size_t i = 0; i < P; ++i) v[i] = (uint8_t)(0xA1 + 13 * i);
+    for (size_t i = 3; i < P; i += 4) {
+        v[i - 1] = (uint8_t)(0x80 | (v[i - 1] & 0x3f));
+        v[i] = (uint8_t)(i & 4 ? 0xff : 0x7f);
+    }
     return v;
 }
 

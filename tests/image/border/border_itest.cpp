@@ -127,34 +127,6 @@ TEST_P(BorderPrivate, MirrorBeyondTheImageReflectsBackAndForth) {
     EXPECT_EQ(std::string((const char*)column, 8), "bcbababc");
 }
 
-// A one-pixel source has no period: its pixel everywhere, however wide.
-TEST_P(BorderPrivate, MirrorOfOnePixelRepeatsIt) {
-    const Zor32s one = 0x5eed;
-    std::vector<Zor32s> out(9 * 6, 0);
-    ASSERT_EQ(
-        ZOR_BODY(zoriCopyMirrorBorder_32s_C1R)(&one, 4, {1, 1}, out.data(), 9 * 4, {9, 6}, 2, 7),
-        zorStsNoErr);
-    for (Zor32s v : out) ASSERT_EQ(v, one);
-}
-
-// A NaN constant in the float forms arrives bit for bit.
-TEST_P(BorderPrivate, ConstFloatChannelsKeepTheirBits) {
-    const uint32_t bits[3] = {0x7f800001u, 0xffbfffffu, 0x80000000u};  // signalling NaNs, -0
-    Zor32f value[3];
-    memcpy(value, bits, sizeof value);
-    const Zor32f src[3] = {1, 2, 3};
-    uint32_t out[3 * 3 * 3];
-    ASSERT_EQ(ZOR_BODY(zoriCopyConstBorder_32f_C3R)(src, 12, {1, 1}, (Zor32f*)out, 36, {3, 3}, 1, 1,
-                                                    value),
-              zorStsNoErr);
-    for (int p = 0; p < 9; ++p)
-        for (int c = 0; c < 3; ++c) {
-            uint32_t want = bits[c];
-            if (p == 4) memcpy(&want, &src[c], 4);
-            EXPECT_EQ(out[3 * p + c], want) << p << " " << c;
-        }
-}
-
 ZOR_INSTANTIATE_LEVELS(BorderPrivate);
 
 }  // namespace

@@ -1,8 +1,6 @@
 // The exported border copies through the public stubs, every level forced
 // in turn, against the model of border_harness.h; and the shared test of
 // border-type values.
-#include <math.h>
-
 #include "border_harness.h"
 #include "border_type.h"
 #include "zortest.h"
@@ -61,24 +59,6 @@ TEST_P(BorderPublic, NoBorderIsAPlainCopy) {
     ASSERT_EQ(zoriCopyReplicateBorder_16u_C1R(&dst[0][0], 8, {3, 2}, &dst[0][0], 8, {3, 2}, 0, 0),
               zorStsNoErr);
     EXPECT_EQ(memcmp(dst, want, sizeof dst), 0);
-}
-
-// The float constant is stored as bits: signalling NaN and -0 arrive as given.
-TEST_P(BorderPublic, ConstFloatKeepsItsBits) {
-    for (uint32_t bits : {0x7f800001u, 0xff800123u, 0x80000000u, 0x00000001u}) {
-        Zor32f value;
-        memcpy(&value, &bits, 4);
-        const Zor32f src = 1.5f;
-        uint32_t out[3 * 4];
-        ASSERT_EQ(
-            zoriCopyConstBorder_32f_C1R(&src, 4, {1, 1}, (Zor32f*)out, 12, {3, 4}, 1, 1, value),
-            zorStsNoErr);
-        for (int p = 0; p < 12; ++p) {
-            uint32_t want = bits;
-            if (p == 4) memcpy(&want, &src, 4);
-            EXPECT_EQ(out[p], want) << std::hex << bits << " at " << p;
-        }
-    }
 }
 
 ZOR_INSTANTIATE_LEVELS(BorderPublic);

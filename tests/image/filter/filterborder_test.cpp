@@ -21,6 +21,7 @@
 #include <string>
 #include <vector>
 
+#include "image_support.h"
 #include "zortest.h"
 
 namespace {
@@ -30,56 +31,22 @@ constexpr int kLevelsSse = 3;  // m7, n8, y8 come first in level order
 // ---- element types -----------------------------------------------------------
 
 template <typename T> struct Type;
-template <> struct Type<Zor8u> {
-    static constexpr ZorDataType id = zor8u;
-    static constexpr bool isInt = true;
-    static constexpr double lo = 0, hi = 255;
-    static Zor8u random(std::mt19937& g) { return (Zor8u)(g() & 255); }
-    static constexpr Zor8u border = 77;
-    static ZorStatus filter(const Zor8u* s, int32_t ss, Zor8u* d, int32_t ds, ZoriSize r,
-                            int32_t bt, const Zor8u* v, const ZoriFilterBorderSpec* sp,
-                            Zor8u* b) {
-        return zoriFilterBorder_8u_C1R(s, ss, d, ds, r, bt, v, sp, b);
-    }
-};
-template <> struct Type<Zor16u> {
-    static constexpr ZorDataType id = zor16u;
-    static constexpr bool isInt = true;
-    static constexpr double lo = 0, hi = 65535;
-    static Zor16u random(std::mt19937& g) { return (Zor16u)(g() & 4095); }
-    static constexpr Zor16u border = 1234;
-    static ZorStatus filter(const Zor16u* s, int32_t ss, Zor16u* d, int32_t ds, ZoriSize r,
-                            int32_t bt, const Zor16u* v, const ZoriFilterBorderSpec* sp,
-                            Zor8u* b) {
-        return zoriFilterBorder_16u_C1R(s, ss, d, ds, r, bt, v, sp, b);
-    }
-};
-template <> struct Type<Zor16s> {
-    static constexpr ZorDataType id = zor16s;
-    static constexpr bool isInt = true;
-    static constexpr double lo = -32768, hi = 32767;
-    static Zor16s random(std::mt19937& g) { return (Zor16s)((int)(g() & 8191) - 4096); }
-    static constexpr Zor16s border = -321;
-    static ZorStatus filter(const Zor16s* s, int32_t ss, Zor16s* d, int32_t ds, ZoriSize r,
-                            int32_t bt, const Zor16s* v, const ZoriFilterBorderSpec* sp,
-                            Zor8u* b) {
-        return zoriFilterBorder_16s_C1R(s, ss, d, ds, r, bt, v, sp, b);
-    }
-};
-template <> struct Type<Zor32f> {
-    static constexpr ZorDataType id = zor32f;
-    static constexpr bool isInt = false;
-    static constexpr double lo = 0, hi = 0;
-    static Zor32f random(std::mt19937& g) {
-        return std::uniform_real_distribution<float>(-100.0f, 100.0f)(g);
-    }
-    static constexpr Zor32f border = 2.5f;
-    static ZorStatus filter(const Zor32f* s, int32_t ss, Zor32f* d, int32_t ds, ZoriSize r,
-                            int32_t bt, const Zor32f* v, const ZoriFilterBorderSpec* sp,
-                            Zor8u* b) {
-        return zoriFilterBorder_32f_C1R(s, ss, d, ds, r, bt, v, sp, b);
-    }
-};
+// Type id, integer or not, saturation range, random pixel, border value.
+#define FB_TYPE(T, sfx, idv, intv, lov, hiv, rnd, bv)                 \
+    template <> struct Type<T> {                                       \
+        static constexpr ZorDataType id = idv;                         \
+        static constexpr bool isInt = intv;                            \
+        static constexpr double lo = lov, hi = hiv;                    \
+        static T random(std::mt19937& g) { return rnd; }               \
+        static constexpr T border = bv;                                \
+        static constexpr auto filter = zoriFilterBorder_##sfx##_C1R;   \
+    };
+FB_TYPE(Zor8u, 8u, zor8u, true, 0, 255, (Zor8u)(g() & 255), 77)
+FB_TYPE(Zor16u, 16u, zor16u, true, 0, 65535, (Zor16u)(g() & 4095), 1234)
+FB_TYPE(Zor16s, 16s, zor16s, true, -32768, 32767, (Zor16s)((int)(g() & 8191) - 4096), -321)
+FB_TYPE(Zor32f, 32f, zor32f, false, 0, 0,
+        std::uniform_real_distribution<float>(-100.0f, 100.0f)(g), 2.5f)
+#undef FB_TYPE
 
 // ---- the model ---------------------------------------------------------------
 
@@ -234,39 +201,30 @@ Expect model(const Source<T>& src, const Case& c, const std::vector<float>& k, i
 
 // ---- running one case ----------------------------------------------------------
 
-struct Record {
-    std::vector<uint8_t> block;
-    const ZoriFilterBorderSpec* get(int offset) const {
-        return (const ZoriFilterBorderSpec*)(block.data() + offset);
-    }
+constexpr uint8_t kGuard = zortest::kGuardByte;
+using zortest::guard_intact;
+
+// A record of the kernel for data type t on roi and its work buffer, both
+// of the sizes GetSize asks for, at odd offsets (3 and 5 bytes) inside
+// blocks with guard bytes behind them; Init's status is checked against want.
+struct Made {
+    std::vector<uint8_t> rec, buf;
+    int32_t specSize = 0, bufSize = 0;
+    ZoriFilterBorderSpec* spec() { return (ZoriFilterBorderSpec*)(rec.data() + 3); }
+    Zor8u* buffer() { return buf.data() + 5; }
+    bool buffer_intact() const { return guard_intact(buf, 5 + (size_t)bufSize); }
 };
 
-constexpr uint8_t kGuard = 0xA5;
-
-bool guards_intact(const std::vector<uint8_t>& mem, size_t from) {
-    for (size_t i = from; i < mem.size(); ++i)
-        if (mem[i] != kGuard) return false;
-    return true;
-}
-
-// Record and buffer sized by GetSize for this case, at odd offsets inside
-// blocks with guard bytes behind them.
-template <typename T>
-void make_record(const Case& c, const std::vector<float>& k, std::vector<uint8_t>& specMem,
-                 ZoriFilterBorderSpec** rec, std::vector<uint8_t>& bufMem, Zor8u** buf,
-                 int* bufSize) {
-    int32_t specSize = 0, bufferSize = 0;
-    ASSERT_EQ(zoriFilterBorderGetSize({c.kw, c.kh}, {c.W, c.H}, Type<T>::id, zor32f, 1, &specSize,
-                                      &bufferSize),
+Made make(const float* k, ZoriSize ks, ZoriSize roi, ZorDataType t, int mode,
+          ZorStatus want = zorStsNoErr) {
+    Made m;
+    EXPECT_EQ(zoriFilterBorderGetSize(ks, roi, t, zor32f, 1, &m.specSize, &m.bufSize),
               zorStsNoErr);
-    specMem.assign(specSize + 3 + 64, kGuard);
-    *rec = (ZoriFilterBorderSpec*)(specMem.data() + 3);
-    ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {c.kw, c.kh}, Type<T>::id, 1, c.roundMode, *rec),
-              zorStsNoErr);
-    ASSERT_TRUE(guards_intact(specMem, specSize + 3)) << "Init wrote past the record";
-    bufMem.assign(bufferSize + 5 + 64, kGuard);
-    *buf = bufMem.data() + 5;
-    *bufSize = bufferSize;
+    m.rec = zortest::guarded(3 + (size_t)m.specSize);
+    m.buf = zortest::guarded(5 + (size_t)m.bufSize);
+    EXPECT_EQ(zoriFilterBorderInit_32f(k, ks, t, 1, mode, m.spec()), want);
+    EXPECT_TRUE(guard_intact(m.rec, 3 + (size_t)m.specSize)) << "Init wrote past the record";
+    return m;
 }
 
 std::string describe(const Case& c) {
@@ -286,12 +244,8 @@ void check_case(int level, const Case& c, const std::vector<float>& k, bool exac
     const int offset = (seed % 4) * (int)sizeof(T);
     Source<T> src(c.W, c.H, pad, offset, g);
 
-    std::vector<uint8_t> specMem, bufMem;
-    ZoriFilterBorderSpec* rec = nullptr;
-    Zor8u* buf = nullptr;
-    int bufSize = 0;
-    ASSERT_NO_FATAL_FAILURE(make_record<T>(c, k, specMem, &rec, bufMem, &buf, &bufSize));
-    const ZoriFilterBorderSpec* use = given ? given : rec;
+    Made m = make(k.data(), {c.kw, c.kh}, {c.W, c.H}, Type<T>::id, c.roundMode);
+    const ZoriFilterBorderSpec* use = given ? given : m.spec();
 
     const int G = 3;  // guard pixels around the destination ROI
     const int32_t dstStep = (int32_t)((c.W + 2 * G) * sizeof(T)) + (sizeof(T) == 1 ? 1 : 0);
@@ -299,9 +253,9 @@ void check_case(int level, const Case& c, const std::vector<float>& k, bool exac
     T* dst = (T*)(dstMem.data() + (size_t)G * dstStep + G * sizeof(T));
     const T value = Type<T>::border;
     ASSERT_EQ(Type<T>::filter(src.roi, src.step, dst, dstStep, {c.W, c.H}, c.borderType, &value,
-                              use, buf),
+                              use, m.buffer()),
               zorStsNoErr);
-    ASSERT_TRUE(guards_intact(bufMem, (size_t)bufSize + 5)) << "work buffer overrun";
+    ASSERT_TRUE(m.buffer_intact()) << "work buffer overrun";
 
     int bad = 0;
     for (int y = -G; y < c.H + G && bad < 5; ++y)
@@ -391,10 +345,10 @@ template <typename T> void sweep(int level) {
 
 using FilterBorder = zortest::LevelTest;
 
-TEST_P(FilterBorder, Sweep8u) { sweep<Zor8u>(GetParam().index); }
-TEST_P(FilterBorder, Sweep16u) { sweep<Zor16u>(GetParam().index); }
-TEST_P(FilterBorder, Sweep16s) { sweep<Zor16s>(GetParam().index); }
-TEST_P(FilterBorder, Sweep32f) { sweep<Zor32f>(GetParam().index); }
+TEST_P(FilterBorder, Sweep) {
+    const int level = GetParam().index;
+    zortest::for_each_type([level](auto t) { sweep<decltype(t)>(level); });
+}
 
 // Every kind with every combination of the four flags, on a few kernel
 // shapes (even ones included) and on ROIs that take the single frame and
@@ -430,10 +384,7 @@ TEST_P(FilterBorder, ArbitraryTapsWithinBound) {
         const std::vector<float> k = real_kernel(s[0], s[1], g);
         const Case c{61, 17, s[0], s[1], kBorders[n % 11], n % 3};
         ++n;
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor8u>(level, c, k, false, n));
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor16u>(level, c, k, false, n));
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor16s>(level, c, k, false, n));
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor32f>(level, c, k, false, n));
+        zortest::for_each_type([&](auto t) { check_case<decltype(t)>(level, c, k, false, n); });
     }
 }
 
@@ -448,25 +399,11 @@ TEST_P(FilterBorder, RecordFromAnotherLevel) {
         if (!zortest::runnable(maker)) continue;
         SCOPED_TRACE(std::string("record made under ") + maker.name);
         zorSetCpuFeatures(maker.select);
-        int32_t specSize = 0, bufSize = 0;
-        ASSERT_EQ(zoriFilterBorderGetSize({c.kw, c.kh}, {c.W, c.H}, zor16s, zor32f, 1, &specSize,
-                                          &bufSize),
-                  zorStsNoErr);
-        std::vector<uint8_t> block(specSize);
-        ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {c.kw, c.kh}, zor16s, 1, c.roundMode,
-                                           (ZoriFilterBorderSpec*)block.data()),
-                  zorStsNoErr);
+        Made m16 = make(k.data(), {c.kw, c.kh}, {c.W, c.H}, zor16s, c.roundMode);
+        Made m32 = make(k.data(), {c.kw, c.kh}, {c.W, c.H}, zor32f, 0);
         zorSetCpuFeatures(GetParam().select);
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor16s>(level, c, k, true, 3,
-                                                   (ZoriFilterBorderSpec*)block.data()));
-        std::vector<uint8_t> block32(specSize + 64);
-        zorSetCpuFeatures(maker.select);
-        ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {c.kw, c.kh}, zor32f, 1, 0,
-                                           (ZoriFilterBorderSpec*)block32.data()),
-                  zorStsNoErr);
-        zorSetCpuFeatures(GetParam().select);
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor32f>(level, c, k, true, 3,
-                                                   (ZoriFilterBorderSpec*)block32.data()));
+        ASSERT_NO_FATAL_FAILURE(check_case<Zor16s>(level, c, k, true, 3, m16.spec()));
+        ASSERT_NO_FATAL_FAILURE(check_case<Zor32f>(level, c, k, true, 3, m32.spec()));
     }
 }
 
@@ -477,19 +414,12 @@ TEST_P(FilterBorder, RecordFromAnotherLevel) {
 template <typename T>
 std::vector<T> run_plain(const std::vector<T>& img, int W, int H, const std::vector<float>& k,
                          int kw, int kh, int roundMode, int outW, int outH) {
-    int32_t specSize = 0, bufSize = 0;
-    EXPECT_EQ(zoriFilterBorderGetSize({kw, kh}, {outW, outH}, Type<T>::id, zor32f, 1, &specSize,
-                                      &bufSize),
-              zorStsNoErr);
-    std::vector<uint8_t> rec(specSize), buf(bufSize);
-    EXPECT_EQ(zoriFilterBorderInit_32f(k.data(), {kw, kh}, Type<T>::id, 1, roundMode,
-                                       (ZoriFilterBorderSpec*)rec.data()),
-              zorStsNoErr);
+    Made m = make(k.data(), {kw, kh}, {outW, outH}, Type<T>::id, roundMode);
     std::vector<T> out((size_t)outW * outH);
     const int ax = (kw - 1) / 2, ay = (kh - 1) / 2;
     EXPECT_EQ(Type<T>::filter(img.data() + ay * W + ax, W * sizeof(T), out.data(),
-                              outW * sizeof(T), {outW, outH}, zorBorderInMem, nullptr,
-                              (const ZoriFilterBorderSpec*)rec.data(), buf.data()),
+                              outW * sizeof(T), {outW, outH}, zorBorderInMem, nullptr, m.spec(),
+                              m.buffer()),
               zorStsNoErr);
     return out;
 }
@@ -505,24 +435,21 @@ TEST_P(FilterBorder, ScalarRoundingRules) {
         {254, 255, 1, 254}, {253, 254, 1, 254}, {0, 1, 1, 0},     {1, 2, 1, 2},
         {254, 255, 2, 255}, {2, 3, 2, 3},       {254, 255, 0, 254}, {0, 1, 2, 1},
     };
-    for (const Row& r : rows8u) {
+    auto check = [&](const Row& r, auto t) {
+        using T = decltype(t);
         SCOPED_TRACE(std::to_string(r.a) + "+" + std::to_string(r.b) + " mode " +
                      std::to_string(r.mode));
-        const std::vector<Zor8u> img = {(Zor8u)r.a, (Zor8u)r.b, 0, 0, 0};
-        EXPECT_EQ(run_plain(img, 5, 1, half, 2, 1, r.mode, 1, 1)[0], r.want);
-    }
+        const std::vector<T> img = {(T)r.a, (T)r.b, 0, 0};
+        EXPECT_EQ(run_plain(img, 4, 1, half, 2, 1, r.mode, 1, 1)[0], r.want);
+    };
+    for (const Row& r : rows8u) check(r, Zor8u());
     // 256.5 saturates.
     EXPECT_EQ(run_plain(std::vector<Zor8u>{171, 0}, 2, 1, {1.5f}, 1, 1, 1, 1, 1)[0], 255);
     const Row rows16s[] = {
         {-1, 0, 1, 0},   {0, 1, 1, 0},    {-3, -2, 1, -2}, {-5, -4, 1, -4}, {-3, -2, 2, -3},
         {-3, -2, 0, -2}, {2, 3, 0, 2},    {-6, -5, 1, -6}, {32766, 32767, 1, 32766},
     };
-    for (const Row& r : rows16s) {
-        SCOPED_TRACE(std::to_string(r.a) + "+" + std::to_string(r.b) + " mode " +
-                     std::to_string(r.mode));
-        const std::vector<Zor16s> img = {(Zor16s)r.a, (Zor16s)r.b, 0, 0};
-        EXPECT_EQ(run_plain(img, 4, 1, half, 2, 1, r.mode, 1, 1)[0], r.want);
-    }
+    for (const Row& r : rows16s) check(r, Zor16s());
     EXPECT_EQ(run_plain(std::vector<Zor16s>{-32768, -32768}, 2, 1, {2.0f}, 1, 1, 0, 1, 1)[0],
               -32768);
     EXPECT_EQ(run_plain(std::vector<Zor16u>{60000}, 1, 1, {2.0f}, 1, 1, 0, 1, 1)[0], 65535);
@@ -539,21 +466,15 @@ TEST_P(FilterBorder, SeamBetweenTruncatedEdgesAndRoundedCentre) {
     // Centre tap 1/4, the rest 0: pixel p = 4m + 3 gives m + 0.75.
     std::vector<float> k(9, 0.0f);
     k[4] = 0.25f;
-    int32_t specSize = 0, bufSize = 0;
-    ASSERT_EQ(zoriFilterBorderGetSize({3, 3}, {W, H}, zor8u, zor32f, 1, &specSize, &bufSize), 0);
-    std::vector<uint8_t> rec(specSize), buf(bufSize);
-    ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {3, 3}, zor8u, 1, 0,
-                                       (ZoriFilterBorderSpec*)rec.data()),
-              0);
+    Made m = make(k.data(), {3, 3}, {W, H}, zor8u, 0);
     // Nearest is nearest whatever the caller's rounding control says.
     for (int rc : {FE_TONEAREST, FE_TOWARDZERO, FE_DOWNWARD}) {
         SCOPED_TRACE("rounding control " + std::to_string(rc));
         std::vector<Zor8u> out(W * H);
         fesetround(rc);
         const ZorStatus st = zoriFilterBorder_8u_C1R(img.data() + (W + 2) + 1, W + 2, out.data(),
-                                                     W, {W, H}, zorBorderRepl, nullptr,
-                                                     (ZoriFilterBorderSpec*)rec.data(),
-                                                     buf.data());
+                                                     W, {W, H}, zorBorderRepl, nullptr, m.spec(),
+                                                     m.buffer());
         fesetround(FE_TONEAREST);
         ASSERT_EQ(st, 0);
         for (int y = 0; y < H; ++y)
@@ -594,33 +515,18 @@ TEST_P(FilterBorder, NoReadsPastTheRoiWhereNothingIsInMemory) {
             }
             std::mt19937 g(kw);
             const std::vector<float> k = dyadic_kernel(kw, kh, g);
+            Made m32 = make(k.data(), {kw, kh}, {W, H}, zor32f, 1);
+            Made m8 = make(k.data(), {kw, kh}, {W, H}, zor8u, 1);
             for (int kind : {zorBorderRepl, zorBorderMirror, zorBorderConst}) {
-                int32_t specSize = 0, bufSize = 0;
-                ASSERT_EQ(zoriFilterBorderGetSize({kw, kh}, {W, H}, zor32f, zor32f, 1, &specSize,
-                                                  &bufSize),
-                          0);
-                std::vector<uint8_t> rec(specSize), buf(bufSize);
-                ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {kw, kh}, zor32f, 1, 1,
-                                                   (ZoriFilterBorderSpec*)rec.data()),
-                          0);
                 std::vector<float> out(W * H);
                 const float v32 = 1.0f;
                 EXPECT_EQ(zoriFilterBorder_32f_C1R(img32, W * 4, out.data(), W * 4, {W, H}, kind,
-                                                   &v32, (ZoriFilterBorderSpec*)rec.data(),
-                                                   buf.data()),
-                          0);
-                ASSERT_EQ(zoriFilterBorderGetSize({kw, kh}, {W, H}, zor8u, zor32f, 1, &specSize,
-                                                  &bufSize),
-                          0);
-                rec.assign(specSize, 0);
-                buf.assign(bufSize, 0);
-                ASSERT_EQ(zoriFilterBorderInit_32f(k.data(), {kw, kh}, zor8u, 1, 1,
-                                                   (ZoriFilterBorderSpec*)rec.data()),
+                                                   &v32, m32.spec(), m32.buffer()),
                           0);
                 std::vector<Zor8u> out8(W * H);
                 const Zor8u v8 = 1;
                 EXPECT_EQ(zoriFilterBorder_8u_C1R(img8, W, out8.data(), W, {W, H}, kind, &v8,
-                                                  (ZoriFilterBorderSpec*)rec.data(), buf.data()),
+                                                  m8.spec(), m8.buffer()),
                           0);
             }
             munmap(m, span + 2 * page);
@@ -632,11 +538,9 @@ TEST_P(FilterBorder, NoReadsPastTheRoiWhereNothingIsInMemory) {
 
 TEST_P(FilterBorder, FilterChecksInOrderAndWritesNothing) {
     const float k[9] = {0, 0, 0, 0, 1, 0, 0, 0, 0};
-    int32_t specSize = 0, bufSize = 0;
-    ASSERT_EQ(zoriFilterBorderGetSize({3, 3}, {8, 8}, zor8u, zor32f, 1, &specSize, &bufSize), 0);
-    std::vector<uint8_t> specMem(specSize), buf(bufSize);
-    const ZoriFilterBorderSpec* rec = (ZoriFilterBorderSpec*)specMem.data();
-    ASSERT_EQ(zoriFilterBorderInit_32f(k, {3, 3}, zor8u, 1, 1, (ZoriFilterBorderSpec*)rec), 0);
+    Made made = make(k, {3, 3}, {8, 8}, zor8u, 1);
+    const ZoriFilterBorderSpec* rec = made.spec();
+    std::vector<uint8_t>& buf = made.buf;
     Zor8u big[256] = {1}, dst[64];
     const Zor8u* src = big + 100;
     memset(dst, 0xEE, sizeof dst);
@@ -714,16 +618,11 @@ TEST_P(FilterBorder, InitChecksInOrder) {
 // truncates on the scalar path.
 TEST_P(FilterBorder, HintBitWarnsAndIsRemoved) {
     const float k[1] = {0.75f};
-    int32_t specSize = 0, bufSize = 0;
-    ASSERT_EQ(zoriFilterBorderGetSize({1, 1}, {3, 1}, zor8u, zor32f, 1, &specSize, &bufSize), 0);
-    std::vector<uint8_t> rec(specSize), buf(bufSize);
-    ASSERT_EQ(zoriFilterBorderInit_32f(k, {1, 1}, zor8u, 1, 0x10000,
-                                       (ZoriFilterBorderSpec*)rec.data()),
-              zorStsAccurateModeNotSupported);
+    Made m = make(k, {1, 1}, {3, 1}, zor8u, 0x10000, zorStsAccurateModeNotSupported);
     const Zor8u src[3] = {3, 5, 7};
     Zor8u dst[3];
-    ASSERT_EQ(zoriFilterBorder_8u_C1R(src, 3, dst, 3, {3, 1}, zorBorderRepl, nullptr,
-                                      (ZoriFilterBorderSpec*)rec.data(), buf.data()),
+    ASSERT_EQ(zoriFilterBorder_8u_C1R(src, 3, dst, 3, {3, 1}, zorBorderRepl, nullptr, m.spec(),
+                                      m.buffer()),
               0);
     EXPECT_EQ(dst[0], 2);  // 2.25
     EXPECT_EQ(dst[1], 3);  // 3.75

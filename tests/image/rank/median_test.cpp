@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "image_support.h"
 #include "zortest.h"
 
 namespace {
@@ -22,22 +23,16 @@ constexpr int kLeft = zorBorderInMemLeft, kRight = zorBorderInMemRight;
 // ---- calling the four forms ------------------------------------------------
 
 template <typename T> struct Form;
-template <> struct Form<Zor8u> {
-    static constexpr ZorDataType type = zor8u;
-    static constexpr auto fn = zoriFilterMedianBorder_8u_C1R;
-};
-template <> struct Form<Zor16u> {
-    static constexpr ZorDataType type = zor16u;
-    static constexpr auto fn = zoriFilterMedianBorder_16u_C1R;
-};
-template <> struct Form<Zor16s> {
-    static constexpr ZorDataType type = zor16s;
-    static constexpr auto fn = zoriFilterMedianBorder_16s_C1R;
-};
-template <> struct Form<Zor32f> {
-    static constexpr ZorDataType type = zor32f;
-    static constexpr auto fn = zoriFilterMedianBorder_32f_C1R;
-};
+#define MEDIAN_FORM(T, t)                                          \
+    template <> struct Form<T> {                                   \
+        static constexpr ZorDataType type = zor##t;                \
+        static constexpr auto fn = zoriFilterMedianBorder_##t##_C1R; \
+    };
+MEDIAN_FORM(Zor8u, 8u)
+MEDIAN_FORM(Zor16u, 16u)
+MEDIAN_FORM(Zor16s, 16s)
+MEDIAN_FORM(Zor32f, 32f)
+#undef MEDIAN_FORM
 
 template <typename T>
 ZorStatus call(const T* src, int32_t srcStep, T* dst, int32_t dstStep, ZoriSize roi, ZoriSize mask,
@@ -121,19 +116,14 @@ std::vector<T> model(const Image<T>& src, int kw, int kh, int border, T value) {
 
 // ---- one call under guard ----------------------------------------------------
 
-constexpr int kGuard = 64;
-constexpr Zor8u kGuardByte = 0xA5;
-
 std::vector<Zor8u> buffer_for(ZoriSize roi, ZoriSize mask, ZorDataType type) {
     int32_t size = -1;
     EXPECT_EQ(zoriFilterMedianBorderGetBufferSize(roi, mask, type, 1, &size), zorStsNoErr);
-    return std::vector<Zor8u>((size_t)size + kGuard, kGuardByte);
+    return zortest::guarded((size_t)size);
 }
 
 bool guard_intact(const std::vector<Zor8u>& buffer) {
-    for (size_t i = buffer.size() - kGuard; i < buffer.size(); ++i)
-        if (buffer[i] != kGuardByte) return false;
-    return true;
+    return zortest::guard_intact(buffer, buffer.size() - 64);
 }
 
 std::string what(int kw, int kh, int w, int h, int border, const char* extra = "") {
@@ -159,42 +149,31 @@ void run_case(int kw, int kh, int w, int h, int border, int seed, int style = 0)
     const T value = random_value<T>(rng, 0);
     const std::vector<T> want = model(src, kw, kh, border, value);
 
-    // Out of place: the destination's pad and margin are its guard.
-    Image<T> dst(w, h, 2, 5);
-    fill(dst, rng, 0);
-    std::vector<T> expect = dst.data;
-    for (int y = 0; y < h; ++y)
-        for (int x = 0; x < w; ++x)
-            expect[(size_t)(y + 2) * dst.stride + x + 2] = want[(size_t)y * w + x];
-    std::vector<Zor8u> buffer = buffer_for({w, h}, {kw, kh}, Form<T>::type);
+    // Out of place the destination's pad and margin are its guard; in place
+    // the margin is read, never written.
     const Image<T> srcBefore = src;
-    ASSERT_EQ(call<T>(src.roi(), src.step(), dst.roi(), dst.step(), {w, h}, {kw, kh}, border,
-                      value, buffer.data()),
-              zorStsNoErr)
-        << where;
-    ASSERT_TRUE(guard_intact(buffer)) << where;
-    ASSERT_TRUE(src.data == srcBefore.data) << where;
-    for (size_t i = 0; i < expect.size(); ++i)
-        ASSERT_TRUE(same(dst.data[i], expect[i]))
-            << where << " at " << (int)(i % dst.stride) - 2 << "," << (int)(i / dst.stride) - 2
-            << ": " << +dst.data[i] << " want " << +expect[i];
-
-    // In place: the same pixels, and the margin (read, never written) unchanged.
-    Image<T> img = srcBefore;
-    std::vector<T> expectInPlace = img.data;
-    for (int y = 0; y < h; ++y)
-        for (int x = 0; x < w; ++x)
-            expectInPlace[(size_t)(y + margin) * img.stride + x + margin] = want[(size_t)y * w + x];
-    std::vector<Zor8u> buffer2 = buffer_for({w, h}, {kw, kh}, Form<T>::type);
-    ASSERT_EQ(call<T>(img.roi(), img.step(), img.roi(), img.step(), {w, h}, {kw, kh}, border,
-                      value, buffer2.data()),
-              zorStsNoErr)
-        << where << " in place";
-    ASSERT_TRUE(guard_intact(buffer2)) << where << " in place";
-    for (size_t i = 0; i < expectInPlace.size(); ++i)
-        ASSERT_TRUE(same(img.data[i], expectInPlace[i]))
-            << where << " in place at " << (int)(i % img.stride) - margin << ","
-            << (int)(i / img.stride) - margin;
+    for (bool inPlace : {false, true}) {
+        Image<T> dst = inPlace ? srcBefore : Image<T>(w, h, 2, 5);
+        if (!inPlace) fill(dst, rng, 0);
+        std::vector<T> expect = dst.data;
+        for (int y = 0; y < h; ++y)
+            for (int x = 0; x < w; ++x)
+                expect[(size_t)(y + dst.margin) * dst.stride + x + dst.margin] =
+                    want[(size_t)y * w + x];
+        std::vector<Zor8u> buffer = buffer_for({w, h}, {kw, kh}, Form<T>::type);
+        const std::string at = where + (inPlace ? " in place" : "");
+        ASSERT_EQ(call<T>(inPlace ? dst.roi() : src.roi(), inPlace ? dst.step() : src.step(),
+                          dst.roi(), dst.step(), {w, h}, {kw, kh}, border, value, buffer.data()),
+                  zorStsNoErr)
+            << at;
+        ASSERT_TRUE(guard_intact(buffer)) << at;
+        ASSERT_TRUE(src.data == srcBefore.data) << at;
+        for (size_t i = 0; i < expect.size(); ++i)
+            ASSERT_TRUE(same(dst.data[i], expect[i]))
+                << at << " at " << (int)(i % dst.stride) - dst.margin << ","
+                << (int)(i / dst.stride) - dst.margin << ": " << +dst.data[i] << " want "
+                << +expect[i];
+    }
 }
 
 struct Mask {
@@ -242,10 +221,9 @@ void all_small_cases() {
 
 using MedianFilter = zortest::LevelTest;
 
-TEST_P(MedianFilter, SmallMasks8u) { all_small_cases<Zor8u>(); }
-TEST_P(MedianFilter, SmallMasks16u) { all_small_cases<Zor16u>(); }
-TEST_P(MedianFilter, SmallMasks16s) { all_small_cases<Zor16s>(); }
-TEST_P(MedianFilter, SmallMasks32f) { all_small_cases<Zor32f>(); }
+TEST_P(MedianFilter, SmallMasks) {
+    zortest::for_each_type([](auto t) { all_small_cases<decltype(t)>(); });
+}
 
 // Large masks on small images: 11x11 (sorted window with a radix start for
 // floats), 25x23 (n = 575, the last size below the key histogram), 25x25
@@ -267,10 +245,9 @@ void large_cases() {
             }
 }
 
-TEST_P(MedianFilter, LargeMasks8u) { large_cases<Zor8u>(); }
-TEST_P(MedianFilter, LargeMasks16u) { large_cases<Zor16u>(); }
-TEST_P(MedianFilter, LargeMasks16s) { large_cases<Zor16s>(); }
-TEST_P(MedianFilter, LargeMasks32f) { large_cases<Zor32f>(); }
+TEST_P(MedianFilter, LargeMasks) {
+    zortest::for_each_type([](auto t) { large_cases<decltype(t)>(); });
+}
 
 // Negative steps walk the rows upwards: the same result as the image
 // stored the usual way round, with the top and bottom flags meaning the
@@ -378,10 +355,7 @@ void checks_in_order() {
 }
 
 TEST_P(MedianFilter, ChecksInOrderAndNothingWritten) {
-    checks_in_order<Zor8u>();
-    checks_in_order<Zor16u>();
-    checks_in_order<Zor16s>();
-    checks_in_order<Zor32f>();
+    zortest::for_each_type([](auto t) { checks_in_order<decltype(t)>(); });
 }
 
 // ---- the size query ------------------------------------------------------------
