@@ -4,15 +4,9 @@
 // little behind, level with and ahead of the source in page offset, and
 // overlapping moves in both directions. Whole buffers compared, guards
 // included.
-#include <gtest/gtest.h>
-
-#include <cstdint>
-#include <cstring>
-#include <vector>
 
 #include "vector_support.h"
 #include "zors.h"
-#include "zortest.h"
 
 namespace {
 

@@ -2,18 +2,9 @@
 // short dot products) bit for bit against models of those orders, the
 // level-dependent wide orders within an error bound, special values, and
 // the checks in their order.
-#include <gtest/gtest.h>
-
-#include <cmath>
-#include <cstdint>
-#include <cstring>
-#include <limits>
-#include <random>
-#include <vector>
 
 #include "vector_support.h"
 #include "zors.h"
-#include "zortest.h"
 
 namespace {
 
@@ -225,22 +216,6 @@ TEST_P(DotProd, ShortOrderExactWideOrderBounded) {
     check_form<double, Zor64fc, Zor64fc, Zor64fc, true>(zorsDotProd_64fc, 4);
     check_form<float, Zor32f, Zor32fc, Zor32fc, true>(zorsDotProd_32f32fc, 5);
     check_form<double, Zor64f, Zor64fc, Zor64fc, true>(zorsDotProd_64f64fc, 6);
-}
-
-TEST_P(DotProd, ComplexFormsDoNotConjugate) {
-    for (int len : {1, 15, 16, 17, 64}) {
-        std::vector<Zor32fc> a(len, Zor32fc{0, 1}), b(len, Zor32fc{0, 1});
-        std::vector<Zor64f> ra(len, 2.0);
-        std::vector<Zor64fc> rb(len, Zor64fc{0, 1});
-        Zor32fc r;
-        ASSERT_EQ(zorsDotProd_32fc(a.data(), b.data(), len, &r), zorStsNoErr);
-        EXPECT_EQ(r.re, -len);  // i * i = -1
-        EXPECT_EQ(r.im, 0);
-        Zor64fc q;
-        ASSERT_EQ(zorsDotProd_64f64fc(ra.data(), rb.data(), len, &q), zorStsNoErr);
-        EXPECT_EQ(q.re, 0);
-        EXPECT_EQ(q.im, 2.0 * len);
-    }
 }
 
 TEST_P(DotProd, SpecialValuesPassThrough) {
