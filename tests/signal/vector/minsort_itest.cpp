@@ -39,15 +39,6 @@ void min_model(const float* p, int len, float* value, int* index) {
     }
 }
 
-std::vector<int> min_lengths() {
-    std::vector<int> v;
-    for (int n = 1; n <= 70; ++n) v.push_back(n);
-    for (int k = 7; k <= 12; ++k) {
-        for (int d = -1; d <= 1; ++d) v.push_back((1 << k) + d);
-    }
-    return v;
-}
-
 void expect_like_model(const float* p, int len, const char* what, int level) {
     float mv, v = 1234, w = 5678;
     int mi, i = -7;
@@ -62,9 +53,9 @@ void expect_like_model(const float* p, int len, const char* what, int level) {
 TEST_P(MinSearch, AgreesWithTheStrictScanOnEveryPath) {
     const int level = GetParam().index;
     // Few distinct values, so that equal minima land in different lanes.
-    auto data = random_floats(4096 + 8, 3, 6);
+    auto data = random_floats(8192 + 8, 3, 6);
     for (int offset = 0; offset < 4; ++offset) {
-        for (int len : min_lengths()) expect_like_model(data.data() + offset, len, "random", level);
+        for (int len : vt::lengths(1)) expect_like_model(data.data() + offset, len, "random", level);
     }
     // The minimum at every position of a vector-path length, once and twice.
     for (int len : {34, 35, 67, 100}) {

@@ -13,13 +13,6 @@ using DotProd = zortest::LevelTest;
 
 using vt::bits;
 
-// Lengths 1..70 and around powers of two up to 2^13.
-std::vector<int> lengths() {
-    std::vector<int> v = vt::lengths();
-    v.erase(v.begin());
-    return v;
-}
-
 // Values of mixed sign and magnitude, so that order shows in the bits.
 template <typename T> std::vector<T> random_values(size_t n, uint32_t seed) {
     std::mt19937_64 gen(seed);
@@ -45,7 +38,7 @@ float accurate_model(const float* p, int len) {
 TEST_P(Sum, AccurateFormFollowsItsLaneOrderForEveryHintButOne) {
     const auto data = random_values<float>(16384 + 8, 7);
     for (int offset = 0; offset < 4; ++offset) {
-        for (int len : lengths()) {
+        for (int len : vt::lengths(1)) {
             const float* p = data.data() + offset;
             const float expected = accurate_model(p, len);
             for (int hint : {0, 2, -1, 77}) {
@@ -60,7 +53,7 @@ TEST_P(Sum, AccurateFormFollowsItsLaneOrderForEveryHintButOne) {
 TEST_P(Sum, FastFormIsWithinTheBoundOfSinglePrecisionAddition) {
     const auto data = random_values<float>(16384 + 8, 11);
     for (int offset = 0; offset < 4; ++offset) {
-        for (int len : lengths()) {
+        for (int len : vt::lengths(1)) {
             const float* p = data.data() + offset;
             long double exact = 0, magnitude = 0;
             for (int i = 0; i < len; ++i) {
@@ -139,7 +132,7 @@ void check_form(ZorStatus (*fn)(const A*, const B*, int32_t, R*), uint32_t seed)
     const auto ra = random_values<T>(maxLen * aw, seed), rb = random_values<T>(maxLen * bw, seed + 1);
     const T eps = std::numeric_limits<T>::epsilon();
     for (int offA = 0; offA < 3; ++offA) {
-        for (int len : lengths()) {
+        for (int len : vt::lengths(1)) {
             const T* pa = ra.data() + offA * aw;
             const T* pb = rb.data() + (offA * 5 + len) % 3 * bw;
             R out;

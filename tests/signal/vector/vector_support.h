@@ -69,10 +69,10 @@ template <typename T> inline bool same(T a, T b) {
     return bits(a) == bits(b) || (std::isnan(a) && std::isnan(b));
 }
 
-// 0..70, and each power of two from 2^7 to 2^13 with its neighbours.
-inline std::vector<int> lengths() {
+// first..70, and each power of two from 2^7 to 2^13 with its neighbours.
+inline std::vector<int> lengths(int first = 0) {
     std::vector<int> v;
-    for (int n = 0; n <= 70; ++n) v.push_back(n);
+    for (int n = first; n <= 70; ++n) v.push_back(n);
     for (int k = 7; k <= 13; ++k)
         for (int d = -1; d <= 1; ++d) v.push_back((1 << k) + d);
     return v;
