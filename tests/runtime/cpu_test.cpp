@@ -112,10 +112,10 @@ TEST(CpuFeatures, NullWordFailsBeforeRegsAreWritten) {
     EXPECT_TRUE(regs[0] == 0xa5a5a5a5u && regs[1] == 1 && regs[2] == 2 && regs[3] == 3);
 }
 
-TEST(CpuFeatures, RegsGetLeaf1UnlessGetInfoIsAsked) {
+// pRegs gets leaf 1, or with the request word the leaf and subleaf it names.
+TEST(CpuFeatures, RegsGetLeaf1OrTheRequestedLeaf) {
     const uint64_t expected = model_features();
-    // A zero leaf in pRegs means nothing without the request word.
-    uint64_t word = kGetInfo + 1;
+    uint64_t word = kGetInfo + 1;  // a zero leaf means nothing without the request word
     uint32_t regs[4] = {0, 0, 0, 0};
     ASSERT_EQ(zorGetCpuFeatures(&word, regs), zorStsNoErr);
     EXPECT_EQ(word, expected);
@@ -123,22 +123,15 @@ TEST(CpuFeatures, RegsGetLeaf1UnlessGetInfoIsAsked) {
     mask_apic(1, regs);
     mask_apic(1, l1.r);
     for (int i = 0; i < 4; ++i) EXPECT_EQ(regs[i], l1.r[i]) << "register " << i;
-
-    // The request word without pRegs is simply overwritten.
-    word = kGetInfo;
+    word = kGetInfo;  // without pRegs simply overwritten
     ASSERT_EQ(zorGetCpuFeatures(&word, nullptr), zorStsNoErr);
     EXPECT_EQ(word, expected);
-}
-
-TEST(CpuFeatures, GetInfoReadsTheRequestedLeafAndSubleaf) {
-    const uint64_t expected = model_features();
-    uint64_t word = kGetInfo;
-    uint32_t regs[4] = {0, 0xdeadbeefu, 0, 0xdeadbeefu};
-    ASSERT_EQ(zorGetCpuFeatures(&word, regs), zorStsNoErr);
+    word = kGetInfo;
+    uint32_t r0[4] = {0, 0xdeadbeefu, 0, 0xdeadbeefu};
+    ASSERT_EQ(zorGetCpuFeatures(&word, r0), zorStsNoErr);
     EXPECT_EQ(word, expected);
-    EXPECT_EQ(regs[0], max_leaf());
-    EXPECT_EQ(vendor_of(regs), vendor());
-
+    EXPECT_EQ(r0[0], max_leaf());
+    EXPECT_EQ(vendor_of(r0), vendor());
     if (max_leaf() >= 4) {  // subleaf comes from pRegs[2]
         word = kGetInfo;
         uint32_t r4[4] = {4, 0, 1, 0};

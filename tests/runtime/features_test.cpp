@@ -117,15 +117,6 @@ TEST_F(Selection, InitUndoesNarrowing) {
     EXPECT_EQ(zorJumpIndexForMergedLibs, expected_index(detected));
 }
 
-TEST_F(Selection, MaskAloneDoesNotMoveTheLevel) {
-    const int32_t before = zorJumpIndexForMergedLibs;
-    EXPECT_EQ(zorSetCpuFeaturesMask(0), zorStsNoErr);
-    EXPECT_EQ(zorGetEnabledCpuFeatures(), 0u);
-    EXPECT_EQ(zorJumpIndexForMergedLibs, before);
-    EXPECT_EQ(ownGetFeature(0), 1);
-    EXPECT_EQ(ownGetFeature(zorFeatureSSE2), 0);
-}
-
 // The no-check bit rewrites the detected word for good, so each of these
 // runs in a child process. The child exits 0 when every expectation held.
 #define IN_CHILD(body)                                          \

@@ -167,14 +167,9 @@ TEST_F(FpuTest, MxcsrFlagsAndDaz) {
     EXPECT_TRUE(daz == 0 || daz == 1) << daz;
 }
 
-TEST_F(FpuTest, VectorStateClearRuns) {
-    ps_destroy_ssx();
-    EXPECT_EQ(zorFpuSsx4TS(7, 0x1234, 0x5678), 0u);
-    EXPECT_EQ(mxcsr(), csr_);
-    EXPECT_EQ(x87_cw(), cw_);
-}
-
 TEST_F(FpuTest, TableEntryMatchesDirectCalls) {
+    ps_destroy_ssx();
+    EXPECT_EQ(zorFpuSsx4TS(7, 0x1234, 0x5678), 0u);  // the vector state clear
     for (int32_t sel : {0, 8, -1, 100, INT32_MIN})
         EXPECT_EQ(zorFpuSsx4TS(sel, 0xffff, 0xffff), 0u) << sel;
     EXPECT_EQ(x87_cw(), cw_);
@@ -203,18 +198,12 @@ TEST(FpuClass, NanAndFinite) {
         double x;
         int32_t isnan, finite;
     } cases[] = {
-        {"+inf", from_bits(0x7ff0000000000000ULL), 0, 0},
-        {"-inf", from_bits(0xfff0000000000000ULL), 0, 0},
-        {"quiet nan", from_bits(0x7ff8000000000000ULL), 1, 0},
-        {"negative nan", from_bits(0xfff8000000000000ULL), 1, 0},
+        {"+inf", from_bits(0x7ff0000000000000ULL), 0, 0}, {"-inf", from_bits(0xfff0000000000000ULL), 0, 0},
+        {"quiet nan", from_bits(0x7ff8000000000000ULL), 1, 0}, {"negative nan", from_bits(0xfff8000000000000ULL), 1, 0},
         {"signalling nan", from_bits(0x7ff0000000000001ULL), 1, 0},
         {"nan, top mantissa bits clear", from_bits(0x7ff0000100000000ULL), 1, 0},
-        {"smallest denormal", from_bits(1), 0, 1},
-        {"largest denormal", from_bits(0x000fffffffffffffULL), 0, 1},
-        {"-0", from_bits(0x8000000000000000ULL), 0, 1},
-        {"0", 0.0, 0, 1},
-        {"max", DBL_MAX, 0, 1},
-        {"-1", -1.0, 0, 1},
+        {"smallest denormal", from_bits(1), 0, 1}, {"largest denormal", from_bits(0x000fffffffffffffULL), 0, 1},
+        {"-0", from_bits(0x8000000000000000ULL), 0, 1}, {"0", 0.0, 0, 1}, {"max", DBL_MAX, 0, 1}, {"-1", -1.0, 0, 1},
     };
     for (const auto& c : cases) {
         EXPECT_EQ(zor_isnan(c.x), c.isnan) << c.what;

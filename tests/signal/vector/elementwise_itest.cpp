@@ -2,16 +2,8 @@
 // square, the in-place constant forms and their short cuts, in-place
 // reversal, clears and the integer copies, and the conversions to
 // integers in all three rounding modes.
-#include <gtest/gtest.h>
 
 #include <xmmintrin.h>
-
-#include <cmath>
-#include <cstdint>
-#include <algorithm>
-#include <cstring>
-#include <limits>
-#include <vector>
 
 #include "vector_support.h"
 #include "zorinternal.h"
@@ -90,48 +82,48 @@ TEST_P(Elementwise, InPlaceReversalChecks) {
 // The row functions behind the image arithmetic: nothing written at length
 // 0, Sub the second minus the first, and no short cut for any constant, so
 // NaN and infinity times 0 stay NaN.
+// One row function over every length and placement: call(sources,
+// destination, len) runs it (it returns nothing), op(x, y) models element
+// i of sources 0 and 1. In place, source 0 is the destination.
+template <typename T, typename Call, typename Op>
+void row(const std::vector<std::vector<T>>& d, bool inplace, Call call, Op op) {
+    vt::sweep<T>(d, inplace, 1, false,
+                 [&](const T* const* s, T* o, int32_t n) { call(s, o, n); return n ? zorStsNoErr : zorStsSizeErr; },
+                 [&](size_t i) { return op(d[0][i], d[1][i]); });
+}
+
 TEST_P(Elementwise, RowFunctionsTakeNoShortCuts) {
     const std::vector<std::vector<float>> f = {vt::values<float>(8200, 5), vt::values<float>(8200, 6)};
     const std::vector<std::vector<double>> d = {vt::values<double>(8200, 7), vt::values<double>(8200, 8)};
-    auto done = [](int32_t n) { return n ? zorStsNoErr : zorStsSizeErr; };
     using F = const float* const*;
     using D = const double* const*;
-    auto two = [&](auto fn, auto op) {
-        vt::sweep<float>(f, false, 1, false, [&](F s, float* o, int32_t n) { fn(s[0], s[1], o, n); return done(n); },
-                         [&](size_t i) { return op(f[0][i], f[1][i]); });
-    };
-    two(ZOR_BODY(ownsAdd_32f), [](float x, float y) { return x + y; });
-    two(ZOR_BODY(ownsSub_32f), [](float x, float y) { return y - x; });
-    two(ZOR_BODY(ownsMul_32f), [](float x, float y) { return x * y; });
+    const auto add = [](auto x, auto y) { return x + y; };
+    const auto mul = [](auto x, auto y) { return x * y; };
+    const auto add32 = ZOR_BODY(ownsAdd_32f), sub32 = ZOR_BODY(ownsSub_32f), mul32 = ZOR_BODY(ownsMul_32f);
     const auto add64 = ZOR_BODY(ownsAdd_64f);
-    vt::sweep<double>(d, false, 1, false, [&](D s, double* o, int32_t n) { add64(s[0], s[1], o, n); return done(n); },
-                      [&](size_t i) { return d[0][i] + d[1][i]; });
-    // In place: srcDst (source 0) op src (source 1).
-    const auto addI = ZOR_BODY(ownsAdd_32f_I), mulI = ZOR_BODY(ownsMul_32f_I);
     const auto add64I = ZOR_BODY(ownsAdd_64f_I);
-    vt::sweep<float>(f, true, 1, false, [&](F s, float* o, int32_t n) { addI(s[1], o, n); return done(n); },
-                     [&](size_t i) { return f[0][i] + f[1][i]; });
-    vt::sweep<float>(f, true, 1, false, [&](F s, float* o, int32_t n) { mulI(s[1], o, n); return done(n); },
-                     [&](size_t i) { return f[0][i] * f[1][i]; });
-    vt::sweep<double>(d, true, 1, false, [&](D s, double* o, int32_t n) { add64I(s[1], o, n); return done(n); },
-                      [&](size_t i) { return d[0][i] + d[1][i]; });
+    const auto addI = ZOR_BODY(ownsAdd_32f_I), mulI = ZOR_BODY(ownsMul_32f_I);
+    row(f, false, [&](F s, float* o, int32_t n) { add32(s[0], s[1], o, n); }, add);
+    row(f, false, [&](F s, float* o, int32_t n) { sub32(s[0], s[1], o, n); }, [](float x, float y) { return y - x; });
+    row(f, false, [&](F s, float* o, int32_t n) { mul32(s[0], s[1], o, n); }, mul);
+    row(d, false, [&](D s, double* o, int32_t n) { add64(s[0], s[1], o, n); }, add);
+    // In place: srcDst (source 0) op src (source 1).
+    row(f, true, [&](F s, float* o, int32_t n) { addI(s[1], o, n); }, add);
+    row(f, true, [&](F s, float* o, int32_t n) { mulI(s[1], o, n); }, mul);
+    row(d, true, [&](D s, double* o, int32_t n) { add64I(s[1], o, n); }, add);
     const auto addc = ZOR_BODY(ownsAddC_32f), subc = ZOR_BODY(ownsSubC_32f), mulc = ZOR_BODY(ownsMulC_32f);
     const auto mulcI = ZOR_BODY(ownsMulC_32f_I);
     const auto mulc64 = ZOR_BODY(ownsMulC_64f);
     const auto mulc64I = ZOR_BODY(ownsMulC_64f_I);
     for (float v : {0.0f, -0.0f, 1.0f, -2.5f}) {
-        vt::sweep<float>(f, false, 1, false, [&](F s, float* o, int32_t n) { addc(s[0], o, n, v); return done(n); },
-                         [&](size_t i) { return f[0][i] + v; });
-        vt::sweep<float>(f, false, 1, false, [&](F s, float* o, int32_t n) { subc(s[0], o, n, v); return done(n); },
-                         [&](size_t i) { return f[0][i] - v; });
-        vt::sweep<float>(f, false, 1, false, [&](F s, float* o, int32_t n) { mulc(s[0], o, n, v); return done(n); },
-                         [&](size_t i) { return f[0][i] * v; });
-        vt::sweep<float>(f, true, 1, false, [&](F, float* o, int32_t n) { mulcI(o, n, v); return done(n); },
-                         [&](size_t i) { return f[0][i] * v; });
-        vt::sweep<double>(d, false, 1, false, [&](D s, double* o, int32_t n) { mulc64(s[0], o, n, v); return done(n); },
-                          [&](size_t i) { return d[0][i] * (double)v; });
-        vt::sweep<double>(d, true, 1, false, [&](D, double* o, int32_t n) { mulc64I(o, n, v); return done(n); },
-                          [&](size_t i) { return d[0][i] * (double)v; });
+        const auto plus_v = [v](auto x, auto) { return x + v; };
+        const auto times_v = [v](auto x, auto) { return x * (decltype(x))v; };
+        row(f, false, [&](F s, float* o, int32_t n) { addc(s[0], o, n, v); }, plus_v);
+        row(f, false, [&](F s, float* o, int32_t n) { subc(s[0], o, n, v); }, [v](float x, float) { return x - v; });
+        row(f, false, [&](F s, float* o, int32_t n) { mulc(s[0], o, n, v); }, times_v);
+        row(f, true, [&](F, float* o, int32_t n) { mulcI(o, n, v); }, times_v);
+        row(d, false, [&](D s, double* o, int32_t n) { mulc64(s[0], o, n, v); }, times_v);
+        row(d, true, [&](D, double* o, int32_t n) { mulc64I(o, n, v); }, times_v);
     }
 }
 

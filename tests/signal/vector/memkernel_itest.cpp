@@ -4,11 +4,6 @@
 // around each kernel's block and chunk sizes, the level's whole choice for
 // given cache sizes around its thresholds, byte-wise overlapping moves,
 // and the copy's own cache table against the runtime's.
-#include <gtest/gtest.h>
-
-#include <cstdint>
-#include <cstring>
-#include <vector>
 
 #include "vector_support.h"
 #include "zorinternal.h"

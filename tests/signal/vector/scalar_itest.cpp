@@ -4,15 +4,8 @@
 // table of hard arguments with correctly rounded results worked out in
 // high precision beforehand, and sweeps against quad-precision references
 // where the compiler's quad library is linked.
-#include <gtest/gtest.h>
 
 #include <cfenv>
-#include <cmath>
-#include <cstdint>
-#include <cstring>
-#include <limits>
-#include <random>
-#include <vector>
 
 #include "vector_support.h"
 #include "zorinternal.h"
@@ -80,20 +73,10 @@ struct Hard {
 
 const Hard kHard[] = {
     {0x1.6c6cbc45dc8dep+5, 0x1.0000000000000p+0, -0x1.6d61b58c99c43p-61},  // medium k=29 |r|=6.19e-19
-    {0x1.6c6cbc45dc8dep+6, -0x1.6d61b58c99c43p-60, -0x1.0000000000000p+0},  // medium k=58 |r|=1.24e-18
-    {0x1.6c6cbc45dc8dep+7, 0x1.6d61b58c99c43p-59, 0x1.0000000000000p+0},  // medium k=116 |r|=2.48e-18
-    {0x1.6c6cbc45dc8dep+8, 0x1.6d61b58c99c43p-58, 0x1.0000000000000p+0},  // medium k=232 |r|=4.95e-18
-    {0x1.6c6cbc45dc8dep+9, 0x1.6d61b58c99c43p-57, 0x1.0000000000000p+0},  // medium k=464 |r|=9.9e-18
-    {0x1.6c6cbc45dc8dep+10, 0x1.6d61b58c99c43p-56, 0x1.0000000000000p+0},  // medium k=928 |r|=1.98e-17
     {0x1.6c6cbc45dc8dep+11, 0x1.6d61b58c99c43p-55, 0x1.0000000000000p+0},  // medium k=1856 |r|=3.96e-17
     {0x1.921fb54442d18p+0, 0x1.0000000000000p+0, 0x1.1a62633145c07p-54},  // medium k=1 |r|=6.12e-17
     {0x1.67e57cdd4dc54p+15, -0x1.0000000000000p+0, 0x1.396f53352c401p-53},  // medium k=29327 |r|=1.36e-16
-    {0x1.635e3d74befcap+15, 0x1.a15417e407485p-52, -0x1.0000000000000p+0},  // medium k=28958 |r|=3.62e-16
-    {0x1.6c6cbc45dc8dep+15, 0x1.6d61b58c99c43p-51, 0x1.0000000000000p+0},  // medium k=29696 |r|=6.34e-16
-    {0x1.5ed6fe0c30340p+15, 0x1.0000000000000p+0, 0x1.efafecb152585p-51},  // medium k=28589 |r|=8.6e-16
     {0x1.70f3fbae6b568p+15, 0x1.0000000000000p+0, -0x1.4633cb25f43c3p-50},  // medium k=30065 |r|=1.13e-15
-    {0x1.5a4fbea3a16b6p+15, -0x1.875ae6b850864p-50, 0x1.0000000000000p+0},  // medium k=28220 |r|=1.36e-15
-    {0x1.fe691f24548fdp+14, -0x1.b5071d69e3becp-50, 0x1.0000000000000p+0},  // medium k=20796 |r|=1.52e-15
     {0x1.757b3b16fa1f2p+15, -0x1.d5b6bb859b964p-50, -0x1.0000000000000p+0},  // medium k=30434 |r|=1.63e-15
     {0x1.5ffb2915e3cc9p+16, 0x1.e2a7b30a463c6p-39, 0x1.0000000000000p+0},  // k=57364 near 90112
     {0x1.5ffb2915e3ccap+16, 0x1.3c54f66148c79p-36, 0x1.0000000000000p+0},  // k=57364 +1ulp
@@ -107,14 +90,9 @@ const Hard kHard[] = {
     {0x1.5ffffffffffffp+16, -0x1.fbde6256f48cep-1, 0x1.03a487efec87fp-3},  // huge-path boundary
     {0x1.6000000000001p+16, -0x1.fbde6256ec6fcp-1, 0x1.03a487f0ea772p-3},  // huge-path boundary
     {-0x1.6000000000000p+16, 0x1.fbde6256f07e5p-1, 0x1.03a487f06b7f8p-3},  // huge-path boundary
-    {0x1.921fb54442d18p+0, 0x1.0000000000000p+0, 0x1.1a62633145c07p-54},  // k=1
     {0x1.921fb54442d18p+1, 0x1.1a62633145c07p-53, -0x1.0000000000000p+0},  // k=2
     {0x1.2d97c7f3321d2p+2, -0x1.0000000000000p+0, -0x1.a79394c9e8a0ap-53},  // k=3
     {0x1.921fb54442d18p+2, -0x1.1a62633145c07p-52, 0x1.0000000000000p+0},  // k=4
-    {0x1.f6a7a2955385ep+2, 0x1.0000000000000p+0, 0x1.60fafbfd97309p-52},  // k=5
-    {0x1.2d97c7f3321d2p+3, 0x1.a79394c9e8a0ap-52, -0x1.0000000000000p+0},  // k=6
-    {0x1.5fdbbe9bba775p+3, -0x1.0000000000000p+0, -0x1.ee2c2d963a10cp-52},  // k=7
-    {0x1.921fb54442d18p+3, -0x1.1a62633145c07p-51, 0x1.0000000000000p+0},  // k=8
     {0x1.921fb54442d18p-4, 0x1.917a6bc29b42cp-4, 0x1.fd88da3d12526p-1},  // pi/32
     {0x1.921fb54442d18p-5, 0x1.91f65f10dd814p-5, 0x1.ff621e3796d7ep-1},  // pi/64
     {0x1.921fb54442d17p-5, 0x1.91f65f10dd813p-5, 0x1.ff621e3796d7ep-1},  // pi/64-

@@ -15,6 +15,7 @@
 #include <type_traits>
 #include <vector>
 
+#include "zortest.h"
 #include "zortypes.h"
 
 namespace vt {
@@ -43,22 +44,6 @@ struct Region {
     uint8_t* in(std::vector<uint8_t>& image) const { return image.data() + offset; }
 };
 
-// Empty when equal; else where the first difference lies.
-inline std::string first_difference(const std::vector<uint8_t>& got, const std::vector<uint8_t>& want,
-                                    size_t origin) {
-    if (got.size() == want.size() && std::memcmp(got.data(), want.data(), got.size()) == 0) return "";
-    for (size_t i = 0; i < got.size(); ++i)
-        if (got[i] != want[i])
-            return "byte " + std::to_string((long long)i - (long long)origin) + " of the region: got " +
-                   std::to_string(got[i]) + ", want " + std::to_string(want[i]);
-    return "";
-}
-
-#define EXPECT_IMAGE(region, image) \
-    EXPECT_EQ(vt::first_difference((region).raw, (image), (region).offset), "")
-#define ASSERT_IMAGE(region, image) \
-    ASSERT_EQ(vt::first_difference((region).raw, (image), (region).offset), "")
-
 // Element access at any byte address.
 template <typename T> inline T get(const void* p, size_t i) {
     T x;
@@ -69,26 +54,14 @@ template <typename T> inline void put(void* p, size_t i, T x) {
     std::memcpy(static_cast<uint8_t*>(p) + i * sizeof(T), &x, sizeof(T));
 }
 
-inline uint32_t bits(float x) {
-    uint32_t u;
-    std::memcpy(&u, &x, 4);
+// The bits of a float or double, and back.
+template <typename T> inline auto bits(T x) {
+    std::conditional_t<sizeof(T) == 4, uint32_t, uint64_t> u;
+    std::memcpy(&u, &x, sizeof u);
     return u;
 }
-inline uint64_t bits(double x) {
-    uint64_t u;
-    std::memcpy(&u, &x, 8);
-    return u;
-}
-inline float f32(uint32_t u) {
-    float x;
-    std::memcpy(&x, &u, 4);
-    return x;
-}
-inline double f64(uint64_t u) {
-    double x;
-    std::memcpy(&x, &u, 8);
-    return x;
-}
+inline float f32(uint32_t u) { return get<float>(&u, 0); }
+inline double f64(uint64_t u) { return get<double>(&u, 0); }
 
 // Equal bits, or both NaN: where two NaNs meet, which payload survives is
 // the processor's choice of operand order, not ours.
@@ -96,10 +69,10 @@ template <typename T> inline bool same(T a, T b) {
     return bits(a) == bits(b) || (std::isnan(a) && std::isnan(b));
 }
 
-// 0..70, and each power of two from 2^7 to 2^13 with its neighbours.
-inline std::vector<int> lengths() {
+// first..70, and each power of two from 2^7 to 2^13 with its neighbours.
+inline std::vector<int> lengths(int first = 0) {
     std::vector<int> v;
-    for (int n = 0; n <= 70; ++n) v.push_back(n);
+    for (int n = first; n <= 70; ++n) v.push_back(n);
     for (int k = 7; k <= 13; ++k)
         for (int d = -1; d <= 1; ++d) v.push_back((1 << k) + d);
     return v;
@@ -179,6 +152,10 @@ void sweep(const std::vector<std::vector<T>>& data, bool inplace, int unit, bool
                 ASSERT_TRUE(matches<T>(out, want, count, exact)) << "len " << len << " at " << ps << ", " << pd;
             }
 }
+
+// The whole buffer of r against want, byte for byte.
+#define EXPECT_IMAGE(r, want) EXPECT_TRUE(vt::matches<uint8_t>((r), (want), (r).bytes, true))
+#define ASSERT_IMAGE(r, want) ASSERT_TRUE(vt::matches<uint8_t>((r), (want), (r).bytes, true))
 
 // A copy (or move without overlap) of elements of type T: every length and
 // placement, compared as bytes; then the null check.
