@@ -210,7 +210,7 @@ using zortest::guard_intact;
 struct Made {
     std::vector<uint8_t> rec, buf;
     int32_t specSize = 0, bufSize = 0;
-    ZoriFilterBorderSpec* spec() { return (ZoriFilterBorderSpec*)(rec.data() + 3); }
+    ZoriFilterBorderSpec* state() { return (ZoriFilterBorderSpec*)(rec.data() + 3); }
     Zor8u* buffer() { return buf.data() + 5; }
     bool buffer_intact() const { return guard_intact(buf, 5 + (size_t)bufSize); }
 };
@@ -222,7 +222,7 @@ Made make(const float* k, ZoriSize ks, ZoriSize roi, ZorDataType t, int mode,
               zorStsNoErr);
     m.rec = zortest::guarded(3 + (size_t)m.specSize);
     m.buf = zortest::guarded(5 + (size_t)m.bufSize);
-    EXPECT_EQ(zoriFilterBorderInit_32f(k, ks, t, 1, mode, m.spec()), want);
+    EXPECT_EQ(zoriFilterBorderInit_32f(k, ks, t, 1, mode, m.state()), want);
     EXPECT_TRUE(guard_intact(m.rec, 3 + (size_t)m.specSize)) << "Init wrote past the record";
     return m;
 }
@@ -245,7 +245,7 @@ void check_case(int level, const Case& c, const std::vector<float>& k, bool exac
     Source<T> src(c.W, c.H, pad, offset, g);
 
     Made m = make(k.data(), {c.kw, c.kh}, {c.W, c.H}, Type<T>::id, c.roundMode);
-    const ZoriFilterBorderSpec* use = given ? given : m.spec();
+    const ZoriFilterBorderSpec* use = given ? given : m.state();
 
     const int G = 3;  // guard pixels around the destination ROI
     const int32_t dstStep = (int32_t)((c.W + 2 * G) * sizeof(T)) + (sizeof(T) == 1 ? 1 : 0);
@@ -402,8 +402,8 @@ TEST_P(FilterBorder, RecordFromAnotherLevel) {
         Made m16 = make(k.data(), {c.kw, c.kh}, {c.W, c.H}, zor16s, c.roundMode);
         Made m32 = make(k.data(), {c.kw, c.kh}, {c.W, c.H}, zor32f, 0);
         zorSetCpuFeatures(GetParam().select);
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor16s>(level, c, k, true, 3, m16.spec()));
-        ASSERT_NO_FATAL_FAILURE(check_case<Zor32f>(level, c, k, true, 3, m32.spec()));
+        ASSERT_NO_FATAL_FAILURE(check_case<Zor16s>(level, c, k, true, 3, m16.state()));
+        ASSERT_NO_FATAL_FAILURE(check_case<Zor32f>(level, c, k, true, 3, m32.state()));
     }
 }
 
@@ -418,7 +418,7 @@ std::vector<T> run_plain(const std::vector<T>& img, int W, int H, const std::vec
     std::vector<T> out((size_t)outW * outH);
     const int ax = (kw - 1) / 2, ay = (kh - 1) / 2;
     EXPECT_EQ(Type<T>::filter(img.data() + ay * W + ax, W * sizeof(T), out.data(),
-                              outW * sizeof(T), {outW, outH}, zorBorderInMem, nullptr, m.spec(),
+                              outW * sizeof(T), {outW, outH}, zorBorderInMem, nullptr, m.state(),
                               m.buffer()),
               zorStsNoErr);
     return out;
@@ -473,7 +473,7 @@ TEST_P(FilterBorder, SeamBetweenTruncatedEdgesAndRoundedCentre) {
         std::vector<Zor8u> out(W * H);
         fesetround(rc);
         const ZorStatus st = zoriFilterBorder_8u_C1R(img.data() + (W + 2) + 1, W + 2, out.data(),
-                                                     W, {W, H}, zorBorderRepl, nullptr, m.spec(),
+                                                     W, {W, H}, zorBorderRepl, nullptr, m.state(),
                                                      m.buffer());
         fesetround(FE_TONEAREST);
         ASSERT_EQ(st, 0);
@@ -521,12 +521,12 @@ TEST_P(FilterBorder, NoReadsPastTheRoiWhereNothingIsInMemory) {
                 std::vector<float> out(W * H);
                 const float v32 = 1.0f;
                 EXPECT_EQ(zoriFilterBorder_32f_C1R(img32, W * 4, out.data(), W * 4, {W, H}, kind,
-                                                   &v32, m32.spec(), m32.buffer()),
+                                                   &v32, m32.state(), m32.buffer()),
                           0);
                 std::vector<Zor8u> out8(W * H);
                 const Zor8u v8 = 1;
                 EXPECT_EQ(zoriFilterBorder_8u_C1R(img8, W, out8.data(), W, {W, H}, kind, &v8,
-                                                  m8.spec(), m8.buffer()),
+                                                  m8.state(), m8.buffer()),
                           0);
             }
             munmap(m, span + 2 * page);
@@ -539,7 +539,7 @@ TEST_P(FilterBorder, NoReadsPastTheRoiWhereNothingIsInMemory) {
 TEST_P(FilterBorder, FilterChecksInOrderAndWritesNothing) {
     const float k[9] = {0, 0, 0, 0, 1, 0, 0, 0, 0};
     Made made = make(k, {3, 3}, {8, 8}, zor8u, 1);
-    const ZoriFilterBorderSpec* rec = made.spec();
+    const ZoriFilterBorderSpec* rec = made.state();
     std::vector<uint8_t>& buf = made.buf;
     Zor8u big[256] = {1}, dst[64];
     const Zor8u* src = big + 100;
@@ -621,7 +621,7 @@ TEST_P(FilterBorder, HintBitWarnsAndIsRemoved) {
     Made m = make(k, {1, 1}, {3, 1}, zor8u, 0x10000, zorStsAccurateModeNotSupported);
     const Zor8u src[3] = {3, 5, 7};
     Zor8u dst[3];
-    ASSERT_EQ(zoriFilterBorder_8u_C1R(src, 3, dst, 3, {3, 1}, zorBorderRepl, nullptr, m.spec(),
+    ASSERT_EQ(zoriFilterBorder_8u_C1R(src, 3, dst, 3, {3, 1}, zorBorderRepl, nullptr, m.state(),
                                       m.buffer()),
               0);
     EXPECT_EQ(dst[0], 2);  // 2.25
