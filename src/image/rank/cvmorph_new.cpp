@@ -7,7 +7,6 @@
 
 #include "morph_internal.h"
 
-
 ZOR_BEGIN
 namespace morph {
 namespace {
@@ -499,7 +498,7 @@ template <typename Op> void general_8u(const Job<Zor8u>& j) { mask_8u<Op, kindLi
 // ones from what the destination holds, so that any number of cells folds
 // in list order without a buffer.
 //
-// Blocks of kRows output rows share their loads: a source pixel at window
+// Blocks of kBlockRows output rows share their loads: a source pixel at window
 // row i, column c serves output row o of the block where (i - o, c) is in
 // the batch. The batch becomes a list of loads in (i, c) order, each with
 // the set of output rows it feeds. Each output still folds its cells in
@@ -518,11 +517,11 @@ struct Load {
     uint32_t rows;  // bit o: output row o of the block takes it
 };
 
-// The loads of a block of R rows for cells k0 .. k1 - 1 of (row, column),
-// which are in list order. At most R * kBatch entries.
+// The loads of a block of R <= kBlockRows rows for the batch's n cells of
+// (row, column), which are in list order. At most R * n entries.
 int32_t block_loads(const int32_t* cellRow, const int32_t* cellCol, int32_t n, int R,
                     ptrdiff_t srcStep, ptrdiff_t elem, Load* out) {
-    int32_t at[8] = {0, 0, 0, 0, 0, 0, 0, 0};  // next cell of each output row
+    int32_t at[kBlockRows] = {};  // next cell of each output row
     int32_t count = 0;
     for (;;) {
         // Smallest (window row, column) among the rows' next cells.
