@@ -6,7 +6,7 @@
 #                                                (zorSetCpuFeatures)    (incl. OS state bits)
 set(ZOR_LEVEL_ROWS
   "m7|-msse3|0xf|0xf"
-  "n8|-mssse3,-mmovbe,-mtune=silvermont|0x3f|0x3f"
+  "n8|-mssse3,-mtune=silvermont|0x3f|0x3f"
   "y8|-msse4.2,-mpopcnt|0xdf|0xdf"
   "e9|-mavx|0x1df|0x3df"
   "l9|-mavx2,-mfma,-mbmi,-mbmi2|0x81df|0x83df"

@@ -11,8 +11,8 @@
 #  define ZOR_VECTOR_BYTES 16
 #  define ZOR_LEVEL_TEXT "zorIP SSE3 (m7)"
 #elif defined(ZOR_LEVEL_n8)
-#  if !defined(__SSSE3__) || !defined(__MOVBE__)
-#    error "n8 needs SSSE3 and MOVBE"
+#  if !defined(__SSSE3__) || defined(__MOVBE__)
+#    error "n8 is SSSE3 without MOVBE (a processor without MOVBE may be sent here)"
 #  endif
 #  define ZOR_VECTOR_BYTES 16
 #  define ZOR_LEVEL_TEXT "zorIP Lark (n8)"
@@ -49,6 +49,61 @@
 #  define ZOR_LEVEL_TEXT "zorIP AVX-512F/CD/BW/DQ/VL (k0)"
 #else
 #  error "variant code must be built for one level"
+#endif
+
+/* What each level has, for kernels to test instead of level names.
+ *   ZOR_VECTOR_BYTES      float (and 32/64-bit integer) vector width
+ *   ZOR_INT_VECTOR_BYTES  widest native byte and word integer vectors: AVX
+ *                         has none at 32 bytes, AVX-512F/CD none at 64
+ *   ZOR_HAS_SSSE3, ZOR_HAS_SSE41, ZOR_HAS_AVX, ZOR_HAS_AVX2, ZOR_HAS_FMA,
+ *   ZOR_HAS_AVX512 (F/CD: 512-bit float and dword work, mask registers),
+ *   ZOR_HAS_AVX512BW (byte/word work at 64 bytes, with DQ and VL)
+ *   ZOR_HAS_MASKED_TAILS  a row's tail can be loaded and stored under a mask
+ * Each is 0 or 1, so they serve in #if and in if constexpr alike; they come
+ * from the compiler's own instruction-set macros, so a capability can never
+ * claim more than the level's flags allow. */
+#if defined(__SSSE3__)
+#  define ZOR_HAS_SSSE3 1
+#else
+#  define ZOR_HAS_SSSE3 0
+#endif
+#if defined(__SSE4_1__)
+#  define ZOR_HAS_SSE41 1
+#else
+#  define ZOR_HAS_SSE41 0
+#endif
+#if defined(__AVX__)
+#  define ZOR_HAS_AVX 1
+#else
+#  define ZOR_HAS_AVX 0
+#endif
+#if defined(__AVX2__)
+#  define ZOR_HAS_AVX2 1
+#else
+#  define ZOR_HAS_AVX2 0
+#endif
+#if defined(__FMA__)
+#  define ZOR_HAS_FMA 1
+#else
+#  define ZOR_HAS_FMA 0
+#endif
+#if defined(__AVX512F__)
+#  define ZOR_HAS_AVX512 1
+#else
+#  define ZOR_HAS_AVX512 0
+#endif
+#if defined(__AVX512BW__)
+#  define ZOR_HAS_AVX512BW 1
+#else
+#  define ZOR_HAS_AVX512BW 0
+#endif
+#define ZOR_HAS_MASKED_TAILS ZOR_HAS_AVX512
+#if ZOR_HAS_AVX512BW
+#  define ZOR_INT_VECTOR_BYTES 64
+#elif ZOR_HAS_AVX2
+#  define ZOR_INT_VECTOR_BYTES 32
+#else
+#  define ZOR_INT_VECTOR_BYTES 16
 #endif
 
 #define ZOR_PASTE_(a, b) a##_##b

@@ -6,8 +6,11 @@
 #define ZOR_SIMD_H
 
 #include <immintrin.h>
+#include <stddef.h>
 #include <stdint.h>
 #include <string.h>
+
+#include <type_traits>
 
 #include "level_config.h"
 
@@ -25,9 +28,20 @@ typedef int32_t vs32 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
 typedef uint32_t vu32 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
 typedef int64_t vs64 __attribute__((vector_size(ZOR_VECTOR_BYTES)));
 
+// A vector of W bytes of T, for kernels that run at another width than the
+// level's float width: vec<ZOR_INT_VECTOR_BYTES, uint8_t> for byte work,
+// vec<16, float> for a half-width tail.
+template <int W, typename T> struct VecType {
+    typedef T type __attribute__((vector_size(W)));
+};
+template <int W, typename T> using vec = typename VecType<W, T>::type;
+
+// Integer vectors at the width the level's byte and word instructions have.
+template <typename T> using ivec = vec<ZOR_INT_VECTOR_BYTES, T>;
+
 template <typename V> struct Lanes {
     typedef __typeof__((*(V*)0)[0]) Element;
-    static constexpr int count = ZOR_VECTOR_BYTES / sizeof(Element);
+    static constexpr int count = sizeof(V) / sizeof(Element);
 };
 
 // memcpy of a whole vector compiles to one unaligned load or store.
@@ -62,6 +76,24 @@ template <typename V> inline void stream(void* p, V v) {
 }
 
 inline void store_fence() { _mm_sfence(); }
+
+}  // namespace simd
+
+// ---- rows and alignment -------------------------------------------------------
+// Row y of an image whose rows are `step` bytes apart; the product is formed
+// in pointer width so that large images and negative steps stay exact.
+template <typename T> inline T* row_at(T* p, ptrdiff_t step, ptrdiff_t y) {
+    typedef typename std::conditional<std::is_const<T>::value, const char, char>::type Byte;
+    return (T*)((Byte*)p + step * y);
+}
+
+// p moved up to the next multiple of `a` bytes (a power of two).
+template <typename T> inline T* align_up(T* p, uintptr_t a) {
+    return (T*)(((uintptr_t)p + a - 1) & ~(a - 1));
+}
+inline bool is_aligned(const void* p, uintptr_t a) { return ((uintptr_t)p & (a - 1)) == 0; }
+
+namespace simd {
 
 }  // namespace simd
 }  // namespace ZOR_NS

@@ -101,9 +101,11 @@ TEST_F(Selection, UnknownBitEndsAsNotSupportedAndStays) {
 
 TEST_F(Selection, MissingFeatureStillSwitches) {
     // A bit the processor lacks: the status says so, the request is honoured.
+    // Bits of the AVX and AVX-512 groups are dropped instead when the system
+    // does not keep their state, so they are not asked for here.
     uint64_t missing = 0;
     for (uint64_t bit = 1; bit < (1ULL << 33) && !missing; bit <<= 1)
-        if (!(detected & bit) && bit != 0x1000) missing = bit;
+        if (!(detected & bit) && bit != 0x1000 && !(bit & 0x6ff08100)) missing = bit;
     if (!missing) GTEST_SKIP() << "processor has every feature";
     EXPECT_EQ(zorSetCpuFeatures(0xdf | missing), zorStsFeatureNotSupported);
     EXPECT_TRUE(zorGetEnabledCpuFeatures() & missing);

@@ -9,6 +9,8 @@
 #include <stddef.h>
 #include <stdint.h>
 
+#include "simd.h"
+
 ZOR_BEGIN
 namespace filt {
 
@@ -33,10 +35,6 @@ static_assert(offsetof(Record, pTaps) == 48 && offsetof(Record, numChannels) == 
               "record layout is shared by all levels");
 
 constexpr int32_t kHeadBytes = 128;
-
-template <typename P> inline P* align_up(P* p, uintptr_t a) {
-    return (P*)(((uintptr_t)p + (a - 1)) & ~(uintptr_t)(a - 1));
-}
 
 inline const Record* record_of(const void* p) { return align_up((const Record*)p, 64); }
 

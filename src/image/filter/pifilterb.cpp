@@ -326,7 +326,7 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriFilterBorderInit_32f)(const Zor32f* pKernel, Zo
     const int32_t mode = roundMode & ~hint;
     if ((uint32_t)mode > 2) return zorStsRoundModeNotSupportedErr;
 
-    Record* s = (Record*)align_up((Zor8u*)pSpec, 64);
+    Record* s = (Record*)ZOR_NS::align_up((Zor8u*)pSpec, 64);
     const int32_t kw = kernelSize.width, kh = kernelSize.height;
     const ptrdiff_t n = (ptrdiff_t)kw * kh;
     float* taps = (float*)((Zor8u*)s + kHeadBytes);

@@ -8,6 +8,7 @@
 #include <math.h>
 
 #include "pifilter.h"
+#include "simd.h"
 
 ZOR_BEGIN
 namespace filt {
@@ -48,13 +49,6 @@ template <typename T> inline T convert(float f, int32_t mode) {
         r = v < 0 ? trunc(v - 0.5) : trunc(0.5 + v);
     }
     return (T)(int32_t)r;
-}
-
-template <typename T> inline const T* row_at(const T* p, int32_t step, int32_t y) {
-    return (const T*)((const uint8_t*)p + (ptrdiff_t)y * step);
-}
-template <typename T> inline T* row_at(T* p, int32_t step, int32_t y) {
-    return (T*)((uint8_t*)p + (ptrdiff_t)y * step);
 }
 
 // One output pixel: kernel rows in order, taps left to right (the reversed

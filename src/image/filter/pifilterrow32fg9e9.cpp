@@ -18,6 +18,7 @@
 #include <string.h>
 
 #include "pifilter.h"
+#include "simd.h"
 
 ZOR_BEGIN
 namespace filt {
@@ -228,13 +229,6 @@ template <> struct TapsOf<Zor16s> {
 inline float pix1(Zor8u v) { return (float)v; }
 inline float pix1(Zor16u v) { return (float)v; }
 inline float pix1(Zor16s v) { return kScaled16s ? (float)v * 65536.0f : (float)v; }
-
-template <typename T> inline const T* row_at(const T* p, int32_t step, int32_t y) {
-    return (const T*)((const uint8_t*)p + (ptrdiff_t)y * step);
-}
-template <typename T> inline T* row_at(T* p, int32_t step, int32_t y) {
-    return (T*)((uint8_t*)p + (ptrdiff_t)y * step);
-}
 
 // A loaded vector that feeds several sums stays in its register: without
 // this the compiler folds the load into every multiply-add, which turns

@@ -16,17 +16,11 @@
 #include <emmintrin.h>
 
 #include "pifilter.h"
+#include "simd.h"
 
 ZOR_BEGIN
 namespace filt {
 namespace {
-
-template <typename T> inline const T* row_at(const T* p, int32_t step, int32_t y) {
-    return (const T*)((const uint8_t*)p + (ptrdiff_t)y * step);
-}
-template <typename T> inline T* row_at(T* p, int32_t step, int32_t y) {
-    return (T*)((uint8_t*)p + (ptrdiff_t)y * step);
-}
 
 // ---- pixels to floats (SSE2 only: m7 has no pmovzx) --------------------------
 

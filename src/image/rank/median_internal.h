@@ -32,15 +32,6 @@ struct Job {
 template <typename T>
 using Kernel = void (*)(const Job<T>&);
 
-template <typename T>
-inline const T* row_at(const T* p, ptrdiff_t step, ptrdiff_t y) {
-    return (const T*)((const uint8_t*)p + y * step);
-}
-template <typename T>
-inline T* row_at(T* p, ptrdiff_t step, ptrdiff_t y) {
-    return (T*)((uint8_t*)p + y * step);
-}
-
 // Fixed masks (pimedianfixed.cpp): 1x3, 1x5, 3x1, 5x1, 3x3, 5x5 for every
 // type; the 16s 7-tap lines.
 template <typename T> void fixed_1x3(const Job<T>& j);

@@ -8,6 +8,7 @@
 #include <stdint.h>
 #include <string.h>
 
+#include "simd.h"
 
 // The helpers are small and called per vector: always inlined, so that
 // their loops unroll into registers.
@@ -192,13 +193,6 @@ template <typename T> struct Job {
     const Head* head;
     uint8_t* ring;
 };
-
-template <typename T> inline const T* row_at(const T* p, ptrdiff_t step, ptrdiff_t y) {
-    return (const T*)((const uint8_t*)p + y * step);
-}
-template <typename T> inline T* row_at(T* p, ptrdiff_t step, ptrdiff_t y) {
-    return (T*)((uint8_t*)p + y * step);
-}
 
 // Kernels (cvmorph_new.cpp), instantiated for each type and operation.
 template <typename T, typename Op> void rect3x3(const Job<T>& j);
