@@ -29,13 +29,18 @@ ZorStatus unary_rounded_steps(UnaryRow fn, const Zor32f* pSrc, int32_t srcStep, 
 }
 
 #if defined(ZOR_LEVEL_k0)
+inline void sqr1(const Zor32f* s, Zor32f* d, int32_t i) {
+    const float x = simd::load<float>(s + i);
+    simd::store(d + i, x * x);
+}
+
 // Squares of one run; nt streams the stores past the caches, prefetch > 0
 // touches the source that many bytes ahead.
 void ownsSqr_32f_NTP(const Zor32f* s, Zor32f* d, int32_t len, bool nt, int32_t prefetch) {
     constexpr int L = simd::Lanes<vf32>::count;
     int32_t i = 0;
     if (nt && (uintptr_t)d % 4 == 0) {
-        for (; i < len && (uintptr_t)(d + i) % ZOR_VECTOR_BYTES != 0; ++i) d[i] = s[i] * s[i];
+        for (; i < len && (uintptr_t)(d + i) % ZOR_VECTOR_BYTES != 0; ++i) sqr1(s, d, i);
         for (; i + L <= len; i += L) {
             if (prefetch) _mm_prefetch((const char*)(s + i) + prefetch, _MM_HINT_T0);
             const vf32 x = simd::load<vf32>(s + i);
@@ -49,7 +54,7 @@ void ownsSqr_32f_NTP(const Zor32f* s, Zor32f* d, int32_t len, bool nt, int32_t p
             simd::store(d + i, x * x);
         }
     }
-    for (; i < len; ++i) d[i] = s[i] * s[i];
+    for (; i < len; ++i) sqr1(s, d, i);
 }
 
 // Memory behaviour by the working set W = width * 8 * height (signed 32
@@ -59,7 +64,7 @@ void owniSqr_32f_C1(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst, int32_t d
                     ZoriSize roi) {
     const int32_t W = (int32_t)((uint32_t)roi.width * 8u * (uint32_t)roi.height);
     const bool small = W <= 32768, mid = !small && W <= 0x600000;
-    if (srcStep == dstStep && srcStep == roi.width * 4 &&
+    if (srcStep == dstStep && srcStep == (int64_t)roi.width * 4 &&
         (int64_t)roi.width * roi.height <= INT32_MAX) {
         ownsSqr_32f_NTP(pSrc, pDst, roi.width * roi.height, !small && !mid, small || !mid ? 0 : 256);
         return;
@@ -114,7 +119,8 @@ void absdiff_rows(const T* pa, int32_t sa, const T* pb, int32_t sb, T* pd, int32
             else
                 simd::store(d + i, r);
         }
-        for (; i < roi.width; ++i) d[i] = absdiff(a[i], Const ? value : b[i]);
+        for (; i < roi.width; ++i)
+            simd::store(d + i, absdiff(simd::load<T>(a + i), Const ? value : simd::load<T>(b + i)));
     }
     if (nt) simd::store_fence();
 }
@@ -143,7 +149,8 @@ ZorStatus absdiff_checks(const T* p1, int32_t s1, const T* p2, int32_t s2, const
                          int32_t s3, ZoriSize roi) {
     if (!p1 || !p2 || !p3) return zorStsNullPtrErr;
     if (roi.width < 1 || roi.height < 1) return zorStsSizeErr;
-    const int32_t row = roi.width * (int32_t)sizeof(T);
+    // In 64 bits: a width near 2^31 / sizeof(T) must fail here, not wrap.
+    const int64_t row = (int64_t)roi.width * (int64_t)sizeof(T);
     if (s1 < row || s2 < row || s3 < row) return zorStsStepErr;
     if ((s1 | s2 | s3) % (int32_t)sizeof(T)) return zorStsNotEvenStepErr;
     return zorStsNoErr;

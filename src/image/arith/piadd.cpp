@@ -18,7 +18,7 @@ using simd::vs32;
 
 // One row of width * height elements where every step is the row length.
 inline bool merged(ZoriSize roi, int32_t s1, int32_t s2, int32_t s3) {
-    const int32_t row = roi.width * 4;
+    const int64_t row = (int64_t)roi.width * 4;
     return s1 == row && s2 == row && s3 == row && (int64_t)roi.width * roi.height <= INT32_MAX;
 }
 
@@ -90,7 +90,9 @@ void add_product_row(const Zor32f* a, const Zor32f* b, const Zor8u* m, Zor32f* d
         const vf32 p = masked(simd::load<vf32>(a + i), m + i) * simd::load<vf32>(b + i);
         simd::store(d + i, simd::load<vf32>(d + i) + p);
     }
-    for (; i < w; ++i) d[i] = d[i] + masked(a[i], m[i]) * b[i];
+    for (; i < w; ++i)
+        simd::store(d + i, simd::load<float>(d + i) +
+                               masked(simd::load<float>(a + i), m[i]) * simd::load<float>(b + i));
 }
 
 #if ZOR_VECTOR_BYTES >= 32
@@ -104,7 +106,7 @@ void add_row(const Zor32f* a, const Zor32f* b, Zor32f* d, int32_t w) {
             for (int k = 0; k < 16; k += L)
                 simd::store(d + i + k, simd::load<vf32>(a + i + k) + simd::load<vf32>(b + i + k));
     }
-    for (; i < w; ++i) d[i] = a[i] + b[i];
+    for (; i < w; ++i) simd::store(d + i, simd::load<float>(a + i) + simd::load<float>(b + i));
 }
 #endif
 
@@ -163,7 +165,8 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriAddProduct_32f_C1IMR)(const Zor32f* pSrc1, int3
     if (!pSrc1 || !pSrc2 || !pMask || !pSrcDst) return zorStsNullPtrErr;
     if (roiSize.width < 1 || roiSize.height < 1) return zorStsSizeErr;
     const int32_t w = roiSize.width, h = roiSize.height;
-    if (src1Step < 4 * w || src2Step < 4 * w || srcDstStep < 4 * w || maskStep < w)
+    const int64_t row = 4 * (int64_t)w;  // no wrap for huge widths
+    if (src1Step < row || src2Step < row || srcDstStep < row || maskStep < w)
         return zorStsStepErr;
     if ((src1Step | src2Step | srcDstStep) & 3) return zorStsNotEvenStepErr;
     bool wide = false;
