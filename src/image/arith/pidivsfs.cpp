@@ -197,16 +197,16 @@ ZorStatus div_row(const typename E::T* a, const typename E::T* b, typename E::T*
         // Every non-zero quotient saturates, by the signs (a zero divisor
         // counting as positive).
         for (int32_t i = 0; i < len; ++i) {
-            const int32_t n = b[i], dv = a[i];
+            const int32_t n = simd::load<T>(b + i), dv = simd::load<T>(a + i);
             zero |= dv == 0;
-            d[i] = (T)(n == 0 ? 0 : ((n > 0) == (dv >= 0) ? E::kHi : E::kLo));
+            simd::store(d + i, (T)(n == 0 ? 0 : ((n > 0) == (dv >= 0) ? E::kHi : E::kLo)));
         }
     } else if (s > E::kMaxS) {
         // Every quotient rounds to 0; zero divisors keep their own rule.
         for (int32_t i = 0; i < len; ++i) {
-            const int32_t n = b[i], dv = a[i];
+            const int32_t n = simd::load<T>(b + i), dv = simd::load<T>(a + i);
             zero |= dv == 0;
-            d[i] = (T)(dv == 0 ? by_zero<E>(n) : 0);
+            simd::store(d + i, (T)(dv == 0 ? by_zero<E>(n) : 0));
         }
     } else {
         const float scale = pow2(-s), tiny = pow2(-64);
@@ -229,8 +229,9 @@ ZorStatus div_row(const typename E::T* a, const typename E::T* b, typename E::T*
         }
         for (int k = 0; k < L; ++k) zero |= bytes ? zeros[k] == 0.0f : zeros[k] != 0.0f;
         for (; i < len; ++i) {
-            zero |= a[i] == 0;
-            d[i] = (T)quotient<E>(b[i], a[i], scale, tiny);
+            const int32_t n = simd::load<T>(b + i), dv = simd::load<T>(a + i);
+            zero |= dv == 0;
+            simd::store(d + i, (T)quotient<E>(n, dv, scale, tiny));
         }
     }
     return zero ? zorStsDivByZero : zorStsNoErr;

@@ -154,7 +154,9 @@ void mul_rows(const typename E::T* pSrc1, int32_t src1Step, const typename E::T*
             E::template block<R>(a + i + K, b + i + K, d + i + K, s);
         }
         for (; i + K <= roi.width; i += K) E::template block<R>(a + i, b + i, d + i, s);
-        for (; i < roi.width; ++i) d[i] = (T)E::template rule<R>((S)a[i] * (S)b[i], s);
+        for (; i < roi.width; ++i)
+            simd::store(d + i, (T)E::template rule<R>((S)simd::load<T>(a + i) *
+                                                          (S)simd::load<T>(b + i), s));
     }
 }
 

@@ -74,25 +74,34 @@ inline int32_t vec_unary(const T* a, T* d, int32_t len, Op op) {
     return i;
 }
 
+// Element i alone. Through the vector layer's loads: a row of an image
+// with an odd step is not on an element boundary.
+template <typename T, typename Op> inline void binary1(const T* a, const T* b, T* d, int32_t i, Op op) {
+    simd::store(d + i, op(simd::load<T>(a + i), simd::load<T>(b + i)));
+}
+template <typename T, typename Op> inline void unary1(const T* a, T* d, int32_t i, Op op) {
+    simd::store(d + i, op(simd::load<T>(a + i)));
+}
+
 // Scalar steps to the destination's vector boundary, blocks, scalar rest.
 template <typename V, typename T, typename Op>
 void binary(const T* a, const T* b, T* d, int32_t len, Op op) {
     int32_t i = 0;
     if (len >= kShortRow) {
-        for (const int32_t h = peel_count(d, len); i < h; ++i) d[i] = op(a[i], b[i]);
+        for (const int32_t h = peel_count(d, len); i < h; ++i) binary1(a, b, d, i, op);
         i += vec_binary<V>(a + i, b + i, d + i, len - i, op);
     }
-    for (; i < len; ++i) d[i] = op(a[i], b[i]);
+    for (; i < len; ++i) binary1(a, b, d, i, op);
 }
 
 template <typename V, typename T, typename Op>
 void unary(const T* a, T* d, int32_t len, Op op) {
     int32_t i = 0;
     if (len >= kShortRow) {
-        for (const int32_t h = peel_count(d, len); i < h; ++i) d[i] = op(a[i]);
+        for (const int32_t h = peel_count(d, len); i < h; ++i) unary1(a, d, i, op);
         i += vec_unary<V>(a + i, d + i, len - i, op);
     }
-    for (; i < len; ++i) d[i] = op(a[i]);
+    for (; i < len; ++i) unary1(a, d, i, op);
 }
 
 // Operations written once for scalars and vectors alike.
@@ -136,9 +145,9 @@ template <typename V, typename T> void mulc_complex(const T* a, T* d, int32_t n,
         simd::store(d + i, even_odd(t1 - t2, t1 + t2, lanes));
     }
     for (; i < total; i += 2) {
-        const T x = a[i], y = a[i + 1];
-        d[i] = rounded(x * re) - rounded(y * im);
-        d[i + 1] = rounded(y * re) + rounded(x * im);
+        const T x = simd::load<T>(a + i), y = simd::load<T>(a + i + 1);
+        simd::store(d + i, (T)(rounded(x * re) - rounded(y * im)));
+        simd::store(d + i + 1, (T)(rounded(y * re) + rounded(x * im)));
     }
 }
 

@@ -31,11 +31,11 @@ template <typename V, typename T, int G> void flip(const T* s, T* d, size_t n) {
     if (n >= 2 * L && (uintptr_t)d % (sizeof(T) * G) == 0) {
         // Whole elements up to the destination's vector boundary.
         for (; ((uintptr_t)(d + i) & (VB - 1)) != 0; i += G)
-            for (int g = 0; g < G; ++g) d[i + g] = s[n - i - G + g];
+            for (int g = 0; g < G; ++g) simd::store(d + i + g, simd::load<T>(s + n - i - G + g));
     }
     for (; n - i >= L; i += L) simd::store(d + i, reverse<G>(simd::load<V>(s + n - i - L), lanes));
     for (; i < n; i += G)
-        for (int g = 0; g < G; ++g) d[i + g] = s[n - i - G + g];
+        for (int g = 0; g < G; ++g) simd::store(d + i + g, simd::load<T>(s + n - i - G + g));
 }
 
 // Swaps a vector from each end while they do not meet, then single
@@ -51,17 +51,18 @@ template <typename V, typename T, int G> void flip_inplace(T* p, size_t n) {
     }
     for (; hi - lo >= 2 * G; lo += G, hi -= G)
         for (int g = 0; g < G; ++g) {
-            const T t = p[lo + g];
-            p[lo + g] = p[hi - G + g];
-            p[hi - G + g] = t;
+            const T t = simd::load<T>(p + lo + g);
+            simd::store(p + lo + g, simd::load<T>(p + hi - G + g));
+            simd::store(p + hi - G + g, t);
         }
 }
 
 }  // namespace
 
-// Float elements read and written as integers of their size.
-typedef int32_t Bits32 __attribute__((may_alias));
-typedef int64_t Bits64 __attribute__((may_alias));
+// Float elements moved as integers of their size (only through the vector
+// layer's loads and stores, which need no alignment).
+typedef int32_t Bits32;
+typedef int64_t Bits64;
 
 ZOR_END
 

@@ -17,6 +17,12 @@ constexpr size_t VB = ZOR_VECTOR_BYTES;
 // maximum instruction of the level (or compare and select, same rule).
 template <typename X> inline X larger(X a, X b) { return a > b ? a : b; }
 
+// Element i (through the layer's loads: a pointer need not sit on an
+// element boundary).
+template <typename T> inline void larger1(const T* a, const T* b, T* d, size_t i) {
+    simd::store(d + i, larger(simd::load<T>(a + i), simd::load<T>(b + i)));
+}
+
 // Nearer than one vector but not the same address: in place is safe for
 // whole vectors.
 inline bool near(const void* p, const void* q) {
@@ -33,11 +39,11 @@ template <typename V, typename T> void max_every(const T* a, const T* b, T* d, s
     constexpr size_t L = VB / sizeof(T);
     size_t i = 0;
     if (n >= 8 && !near(a, d) && !near(b, d) && (uintptr_t)d % sizeof(T) == 0) {
-        for (; i < n && ((uintptr_t)(d + i) & (VB - 1)) != 0; ++i) d[i] = larger(a[i], b[i]);
+        for (; i < n && ((uintptr_t)(d + i) & (VB - 1)) != 0; ++i) larger1(a, b, d, i);
         for (; n - i >= L; i += L)
             simd::store(d + i, larger(simd::load<V>(a + i), simd::load<V>(b + i)));
     }
-    for (; i < n; ++i) d[i] = larger(a[i], b[i]);
+    for (; i < n; ++i) larger1(a, b, d, i);
 }
 
 }  // namespace
