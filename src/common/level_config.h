@@ -106,6 +106,68 @@
 #  define ZOR_INT_VECTOR_BYTES 16
 #endif
 
+/* Rules the library fixes per level on purpose, beyond what the
+ * instructions allow; each is 0 or 1 unless it says otherwise.
+ *   ZOR_DIV_TRUE           float quotients by the division instruction (n0,
+ *                          k0); the others refine the reciprocal estimate
+ *   ZOR_DIV_EXACT_ZERO_GROUPS  a group holding a zero divisor divides
+ *                          exactly and its infinities take the numerator's
+ *                          sign alone (m7, y8)
+ *   ZOR_DIV_ZERO_BITS      only the bit pattern of +0 is a zero divisor; -0
+ *                          goes through the estimate (e9, l9)
+ *   ZOR_DIV_NAN_BITS       the quotient 0/0 and NaN/0 (a bit pattern)
+ *   ZOR_COPY_POLICY        large copies and clears: ZOR_COPY_READAHEAD (m7,
+ *                          n8, y8: cache from CPUID leaf 2, read-ahead and
+ *                          streaming), ZOR_COPY_STRING (e9: string moves),
+ *                          ZOR_COPY_PAGE (l9, n0, k0: page-offset test,
+ *                          streaming beyond half the cache)
+ *   ZOR_CACHE_TEST_ABSDIFF     absolute differences stream their stores
+ *                          once the working set reaches the cache (m7, n8)
+ *   ZOR_CACHE_TEST_ADDPRODUCT  the masked product accumulation takes its
+ *                          wide loop beyond the cache (m7, n8, y8)
+ *   ZOR_SQR_WORKING_SET    image squares choose prefetch and streaming by
+ *                          the working set (k0) */
+#define ZOR_COPY_READAHEAD 1
+#define ZOR_COPY_STRING 2
+#define ZOR_COPY_PAGE 3
+#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_n8) || defined(ZOR_LEVEL_y8)
+#  define ZOR_COPY_POLICY ZOR_COPY_READAHEAD
+#  define ZOR_CACHE_TEST_ADDPRODUCT 1
+#elif defined(ZOR_LEVEL_e9)
+#  define ZOR_COPY_POLICY ZOR_COPY_STRING
+#  define ZOR_CACHE_TEST_ADDPRODUCT 0
+#else
+#  define ZOR_COPY_POLICY ZOR_COPY_PAGE
+#  define ZOR_CACHE_TEST_ADDPRODUCT 0
+#endif
+#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_y8)
+#  define ZOR_DIV_EXACT_ZERO_GROUPS 1
+#  define ZOR_DIV_NAN_BITS 0x7fc00000u
+#else
+#  define ZOR_DIV_EXACT_ZERO_GROUPS 0
+#  define ZOR_DIV_NAN_BITS 0x7fbfffffu
+#endif
+#if defined(ZOR_LEVEL_e9) || defined(ZOR_LEVEL_l9)
+#  define ZOR_DIV_ZERO_BITS 1
+#else
+#  define ZOR_DIV_ZERO_BITS 0
+#endif
+#if defined(ZOR_LEVEL_n0) || defined(ZOR_LEVEL_k0)
+#  define ZOR_DIV_TRUE 1
+#else
+#  define ZOR_DIV_TRUE 0
+#endif
+#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_n8)
+#  define ZOR_CACHE_TEST_ABSDIFF 1
+#else
+#  define ZOR_CACHE_TEST_ABSDIFF 0
+#endif
+#if defined(ZOR_LEVEL_k0)
+#  define ZOR_SQR_WORKING_SET 1
+#else
+#  define ZOR_SQR_WORKING_SET 0
+#endif
+
 #define ZOR_PASTE_(a, b) a##_##b
 #define ZOR_PASTE(a, b) ZOR_PASTE_(a, b)
 /* ZOR_NAME(zoriAdd_32f_C1R) is e9_zoriAdd_32f_C1R in the e9 build. */

@@ -23,12 +23,12 @@ ZorStatus unary_rounded_steps(UnaryRow fn, const Zor32f* pSrc, int32_t srcStep, 
     srcStep &= ~3;
     dstStep &= ~3;
     for (int32_t y = 0; y < roi.height; ++y)
-        fn((const Zor32f*)arith::row(pSrc, srcStep, y), (Zor32f*)arith::row(pDst, dstStep, y),
+        fn(row_at(pSrc, srcStep, y), row_at(pDst, dstStep, y),
            roi.width);
     return zorStsNoErr;
 }
 
-#if defined(ZOR_LEVEL_k0)
+#if ZOR_SQR_WORKING_SET
 inline void sqr1(const Zor32f* s, Zor32f* d, int32_t i) {
     const float x = simd::load<float>(s + i);
     simd::store(d + i, x * x);
@@ -71,8 +71,8 @@ void owniSqr_32f_C1(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst, int32_t d
     }
     const int32_t pf = small ? 0 : mid && roi.height == 1 ? 256 : srcStep;
     for (int32_t y = 0; y < roi.height; ++y)
-        ownsSqr_32f_NTP((const Zor32f*)arith::row(pSrc, srcStep, y),
-                        (Zor32f*)arith::row(pDst, dstStep, y), roi.width, !small && !mid, pf);
+        ownsSqr_32f_NTP(row_at(pSrc, srcStep, y),
+                        row_at(pDst, dstStep, y), roi.width, !small && !mid, pf);
 }
 #endif
 
@@ -108,9 +108,9 @@ void absdiff_rows(const T* pa, int32_t sa, const T* pb, int32_t sb, T* pd, int32
     constexpr int L = ZOR_VECTOR_BYTES / sizeof(T);
     const V vv = simd::broadcast<V>(value);
     for (int32_t y = 0; y < roi.height; ++y) {
-        const T* a = (const T*)arith::row(pa, sa, y);
-        const T* b = Const ? nullptr : (const T*)arith::row(pb, sb, y);
-        T* d = (T*)arith::row(pd, sd, y);
+        const T* a = row_at(pa, sa, y);
+        const T* b = Const ? nullptr : row_at(pb, sb, y);
+        T* d = row_at(pd, sd, y);
         int32_t i = 0;
         for (; i + L <= roi.width; i += L) {
             const V r = absdiff(simd::load<V>(a + i), Const ? vv : simd::load<V>(b + i));
@@ -130,7 +130,7 @@ void absdiff_rows(const T* pa, int32_t sa, const T* pb, int32_t sb, T* pd, int32
 // and everything is 16-byte aligned.
 inline bool stream_stores(int32_t bytesPerPixel, ZoriSize roi, const void* p1, int32_t s1,
                           const void* p2, int32_t s2, const void* p3, int32_t s3) {
-#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_n8)
+#if ZOR_CACHE_TEST_ABSDIFF
     int32_t cache = 0;
     zorGetMaxCacheSizeB(&cache);
     const int32_t W =
@@ -176,7 +176,7 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriAbs_32f_C1R)(const Zor32f* pSrc, int32_t srcSte
 
 ZOR_ENTRY ZorStatus ZOR_NAME(zoriSqr_32f_C1R)(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst,
                                               int32_t dstStep, ZoriSize roiSize) {
-#if defined(ZOR_LEVEL_k0)
+#if ZOR_SQR_WORKING_SET
     if (!pSrc || !pDst) return zorStsNullPtrErr;
     if (roiSize.width < 1 || roiSize.height < 1) return zorStsSizeErr;
     if (srcStep < 1 || dstStep < 1) return zorStsStepErr;

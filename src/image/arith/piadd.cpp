@@ -34,8 +34,8 @@ ZorStatus binary(BinaryRow fn, const Zor32f* pSrc1, int32_t src1Step, const Zor3
         return zorStsNoErr;
     }
     for (int32_t y = 0; y < roi.height; ++y)
-        fn((const Zor32f*)arith::row(pSrc1, src1Step, y),
-           (const Zor32f*)arith::row(pSrc2, src2Step, y), (Zor32f*)arith::row(pDst, dstStep, y),
+        fn(row_at(pSrc1, src1Step, y),
+           row_at(pSrc2, src2Step, y), row_at(pDst, dstStep, y),
            roi.width);
     return zorStsNoErr;
 }
@@ -48,7 +48,7 @@ void const_rows(ConstRow fn, const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst, 
         return;
     }
     for (int32_t y = 0; y < roi.height; ++y)
-        fn((const Zor32f*)arith::row(pSrc, srcStep, y), (Zor32f*)arith::row(pDst, dstStep, y),
+        fn(row_at(pSrc, srcStep, y), row_at(pDst, dstStep, y),
            roi.width, value);
 }
 
@@ -170,16 +170,16 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriAddProduct_32f_C1IMR)(const Zor32f* pSrc1, int3
         return zorStsStepErr;
     if ((src1Step | src2Step | srcDstStep) & 3) return zorStsNotEvenStepErr;
     bool wide = false;
-#if ZOR_VECTOR_BYTES == 16
+#if ZOR_CACHE_TEST_ADDPRODUCT
     int32_t cache = 0;
     zorGetMaxCacheSizeB(&cache);  // a failure leaves 0: the large shape
     wide = (int32_t)((uint32_t)h * 13u * (uint32_t)w) >= cache;
 #endif
     for (int32_t y = 0; y < h; ++y) {
-        const Zor32f* a = (const Zor32f*)arith::row(pSrc1, src1Step, y);
-        const Zor32f* b = (const Zor32f*)arith::row(pSrc2, src2Step, y);
-        const Zor8u* m = arith::row(pMask, maskStep, y);
-        Zor32f* d = (Zor32f*)arith::row(pSrcDst, srcDstStep, y);
+        const Zor32f* a = row_at(pSrc1, src1Step, y);
+        const Zor32f* b = row_at(pSrc2, src2Step, y);
+        const Zor8u* m = row_at(pMask, maskStep, y);
+        Zor32f* d = row_at(pSrcDst, srcDstStep, y);
         if (wide)
             add_product_row<true>(a, b, m, d, w);
         else

@@ -29,8 +29,8 @@ void compare_rows(const Zor32f* pSrc, int32_t srcStep, Zor8u* pDst, int32_t dstS
     constexpr int L = simd::Lanes<vf32>::count;
     const vf32 v = simd::broadcast<vf32>(value);
     for (int32_t y = 0; y < roi.height; ++y) {
-        const Zor32f* s = (const Zor32f*)arith::row(pSrc, srcStep, y);
-        Zor8u* d = arith::row(pDst, dstStep, y);
+        const Zor32f* s = row_at(pSrc, srcStep, y);
+        Zor8u* d = row_at(pDst, dstStep, y);
         int32_t i = 0;
         for (; i + 16 <= roi.width; i += 16) {
             vs32 m[arith::kMaskVectors];
@@ -38,7 +38,7 @@ void compare_rows(const Zor32f* pSrc, int32_t srcStep, Zor8u* pDst, int32_t dstS
                 m[k] = holds<Op>(simd::load<vf32>(s + i + k * L), v);
             simd::store(d + i, arith::narrow16<false>(m));
         }
-        for (; i < roi.width; ++i) d[i] = holds<Op>(s[i], value) ? 255 : 0;
+        for (; i < roi.width; ++i) d[i] = holds<Op>(simd::load<float>(s + i), value) ? 255 : 0;
     }
 }
 

@@ -80,7 +80,7 @@ void owniCopy_C1R(const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst, int32_t dstSt
         return;
     }
     for (int32_t y = 0; y < height; ++y)
-        owniCopy_8u_C1_M7(arith::row(pSrc, srcStep, y), arith::row(pDst, dstStep, y),
+        owniCopy_8u_C1_M7(row_at(pSrc, srcStep, y), row_at(pDst, dstStep, y),
                           (size_t)rowBytes, large);
 }
 
@@ -105,7 +105,7 @@ inline void copy_selected16(const Zor32f* s, Zor32f* d, const Zor8u* m, unsigned
 #elif ZOR_VECTOR_BYTES == 32
     (void)bits;
     const __m128i sel = ~_mm_cmpeq_epi8(_mm_loadu_si128((const __m128i*)m), _mm_setzero_si128());
-#if defined(ZOR_LEVEL_e9)
+#if !ZOR_HAS_AVX2
     // Byte masks widened four at a time (no 256-bit integer work on AVX).
     const __m256i lo = _mm256_setr_m128i(_mm_cvtepi8_epi32(sel),
                                          _mm_cvtepi8_epi32(_mm_srli_si128(sel, 4)));
@@ -196,8 +196,8 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriCopy_32f_C1MR)(const Zor32f* pSrc, int32_t srcS
     if (!pSrc || !pDst || !pMask) return zorStsNullPtrErr;
     if (roiSize.width < 1 || roiSize.height < 1) return zorStsSizeErr;
     for (int32_t y = 0; y < roiSize.height; ++y)
-        ZOR_NS::owniCopy_32f_C1M_M7((const Zor32f*)ZOR_NS::arith::row(pSrc, srcStep, y),
-                                    (Zor32f*)ZOR_NS::arith::row(pDst, dstStep, y),
-                                    ZOR_NS::arith::row(pMask, maskStep, y), roiSize.width);
+        ZOR_NS::owniCopy_32f_C1M_M7(ZOR_NS::row_at(pSrc, srcStep, y),
+                                    ZOR_NS::row_at(pDst, dstStep, y),
+                                    ZOR_NS::row_at(pMask, maskStep, y), roiSize.width);
     return zorStsNoErr;
 }

@@ -7,7 +7,8 @@
 //   n0, k0      true division, groups of 16
 // A row goes through in groups of one vector from its start (the last group
 // may be short; it is computed as a whole group padded with 1 / 0). Zero
-// divisors are found per group and their lanes replaced afterwards.
+// divisors are found per group and their lanes replaced afterwards. The
+// level's rules are the ZOR_DIV_ facts of level_config.h.
 #include "variant.h"
 
 #include <immintrin.h>
@@ -22,12 +23,6 @@ using simd::vs32;
 
 constexpr int G = simd::Lanes<vf32>::count;
 
-#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_y8)
-constexpr uint32_t kNanBits = 0x7fc00000u;
-#else
-constexpr uint32_t kNanBits = 0x7fbfffffu;
-#endif
-
 inline bool any(vs32 m) {
 #if ZOR_VECTOR_BYTES == 16
     return _mm_movemask_ps((__m128)m) != 0;
@@ -38,9 +33,7 @@ inline bool any(vs32 m) {
 #endif
 }
 
-inline vf32 splat_bits(uint32_t b) { return (vf32)simd::broadcast<vs32>((int32_t)b); }
-
-#if ZOR_VECTOR_BYTES < 64
+#if !ZOR_DIV_TRUE
 inline vf32 rcp(vf32 d) {
 #if ZOR_VECTOR_BYTES == 16
     return (vf32)_mm_rcp_ps((__m128)d);
@@ -55,7 +48,7 @@ inline vf32 estimate_quotient(vf32 n, vf32 d) {
     const vf32 one = simd::broadcast<vf32>(1.0f);
     const vf32 r = rcp(d);
     d = (vf32)((vs32)d & ~(vs32)(r == 0.0f));
-#if defined(ZOR_LEVEL_l9)
+#if ZOR_HAS_FMA
     const __m256 t = _mm256_fnmadd_ps((__m256)d, (__m256)r, (__m256)one);
     const __m256 u = _mm256_fmadd_ps(t, t, t);
     return n * (vf32)_mm256_fmadd_ps((__m256)r, u, (__m256)r);
@@ -74,20 +67,20 @@ inline vf32 estimate_quotient(vf32 n, vf32 d) {
 
 // One group: quotients into q, returns whether a divisor counted as zero.
 inline bool group(vf32 n, vf32 d, vf32& q) {
-    const vf32 nan = splat_bits(kNanBits);
+    const vf32 nan = (vf32)simd::broadcast<vs32>((int32_t)ZOR_DIV_NAN_BITS);
     // Numerator zero or NaN: the NaN pattern in a zero-divisor lane.
     const vs32 noSign = (n == 0.0f) | (n != n);
-#if defined(ZOR_LEVEL_e9) || defined(ZOR_LEVEL_l9)
+#if ZOR_DIV_ZERO_BITS
     const vs32 zero = (vs32)d == 0;  // +0 only; -0 runs through the estimate
 #else
     const vs32 zero = d == 0.0f;
 #endif
     const bool hasZero = any(zero);
-#if defined(ZOR_LEVEL_n0) || defined(ZOR_LEVEL_k0)
+#if ZOR_DIV_TRUE
     // Division already gives the right infinity for a signed numerator.
     q = n / d;
     if (hasZero) q = (zero & noSign) ? nan : q;
-#elif defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_y8)
+#elif ZOR_DIV_EXACT_ZERO_GROUPS
     if (!hasZero) {
         q = estimate_quotient(n, d);
         return false;
@@ -140,9 +133,9 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriDiv_32f_C1R)(const Zor32f* pSrc1, int32_t src1S
     if (src1Step < 1 || src2Step < 1 || dstStep < 1) return zorStsStepErr;
     ZorStatus status = zorStsNoErr;
     for (int32_t y = 0; y < roiSize.height; ++y) {
-        const ZorStatus st = ZOR_NAME(zorsDiv_32f)((const Zor32f*)arith::row(pSrc1, src1Step, y),
-                                                   (const Zor32f*)arith::row(pSrc2, src2Step, y),
-                                                   (Zor32f*)arith::row(pDst, dstStep, y),
+        const ZorStatus st = ZOR_NAME(zorsDiv_32f)(row_at(pSrc1, src1Step, y),
+                                                   row_at(pSrc2, src2Step, y),
+                                                   row_at(pDst, dstStep, y),
                                                    roiSize.width);
         if (status == zorStsNoErr) status = st;
     }

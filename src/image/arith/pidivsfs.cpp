@@ -123,7 +123,7 @@ inline void block64_estimate(const Zor8u* a, const Zor8u* b, Zor8u* d, vf32 scal
     for (int k = 0; k < 4; ++k)
         r[k] = quotient8u_estimate<Scaled>(arith::load_u8_i32<64>(b + 16 * k),
                                            arith::load_u8_i32<64>(a + 16 * k), scale);
-#if defined(ZOR_LEVEL_k0)
+#if ZOR_HAS_AVX512BW
     dminBytes = _mm512_min_epu8(dminBytes, _mm512_loadu_si512(a));
     const __m512i w0 = _mm512_packs_epi32((__m512i)r[0], (__m512i)r[1]);
     const __m512i w1 = _mm512_packs_epi32((__m512i)r[2], (__m512i)r[3]);
@@ -152,7 +152,7 @@ inline int32_t div8u_estimate(const Zor8u* a, const Zor8u* b, Zor8u* d, int32_t 
     } else {
         for (; i + 64 <= len; i += 64) block64_estimate<true>(a + i, b + i, d + i, scale, dmin);
     }
-#if defined(ZOR_LEVEL_k0)
+#if ZOR_HAS_AVX512BW
     *zero = i > 0 && _mm512_cmpeq_epi8_mask(dmin, _mm512_setzero_si512()) != 0;
 #else
     const __m128i m = _mm512_castsi512_si128(dmin);
@@ -253,9 +253,9 @@ inline ZorStatus div_rows(const typename E::T* pSrc1, int32_t src1Step, const ty
     typedef typename E::T T;
     ZorStatus status = zorStsNoErr;
     for (int32_t y = 0; y < roi.height; ++y) {
-        const ZorStatus st = rowFn((const T*)arith::row(pSrc1, src1Step, y),
-                                   (const T*)arith::row(pSrc2, src2Step, y),
-                                   (T*)arith::row(pDst, dstStep, y), roi.width, s);
+        const ZorStatus st = rowFn(row_at(pSrc1, src1Step, y),
+                                   row_at(pSrc2, src2Step, y),
+                                   row_at(pDst, dstStep, y), roi.width, s);
         if (status == zorStsNoErr) status = st;
     }
     return status;

@@ -49,11 +49,6 @@ namespace arith {
 
 constexpr size_t VB = simd::vectorBytes;
 
-inline const Zor8u* row(const void* p, int32_t step, int32_t y) {
-    return (const Zor8u*)p + (ptrdiff_t)y * step;
-}
-inline Zor8u* row(void* p, int32_t step, int32_t y) { return (Zor8u*)p + (ptrdiff_t)y * step; }
-
 // Round to nearest integer in the rounding mode in force (the conversion
 // instruction, not a truncation); out-of-range lanes give 0x80000000.
 inline simd::vs32 round_to_int(simd::vf32 v) {
@@ -106,7 +101,7 @@ inline v16u8 narrow16(const simd::vs32* m) {
     __m128i a = _mm_packs_epi32((__m128i)m[0], (__m128i)m[1]);
     __m128i b = _mm_packs_epi32((__m128i)m[2], (__m128i)m[3]);
     return (v16u8)pack_words<Unsigned>(a, b);
-#elif defined(ZOR_LEVEL_e9)
+#elif !ZOR_HAS_AVX2
     // AVX has no 256-bit integer packs: two halves each.
     __m256i m0 = (__m256i)m[0], m1 = (__m256i)m[1];
     __m128i a = _mm_packs_epi32(_mm256_castsi256_si128(m0), _mm256_extractf128_si256(m0, 1));
@@ -127,125 +122,103 @@ inline v16u8 narrow16(const simd::vs32* m) {
 
 // ---- integer lanes ----------------------------------------------------------
 
-// The width of integer vector work: 16-bit lanes need AVX2 for 32 bytes
-// and AVX-512BW for 64, so e9 works on 16 bytes and n0 on 32.
-#if defined(ZOR_LEVEL_k0)
-constexpr int IB = 64;
-typedef __m512i ivec;
-#elif defined(ZOR_LEVEL_l9) || defined(ZOR_LEVEL_n0)
-constexpr int IB = 32;
-typedef __m256i ivec;
-#else
-constexpr int IB = 16;
-typedef __m128i ivec;
-#endif
-typedef uint16_t iu16 __attribute__((vector_size(IB)));
+// Bytes at the level's integer width, as two vectors of 16-bit lanes (the
+// low and high bytes of each 128-bit lane), and back; pack_bytes undoes
+// widen_bytes exactly for values up to 255.
+typedef simd::ivec<uint8_t> iu8;
+typedef simd::ivec<uint16_t> iu16;
 
-inline ivec load_ivec(const void* p) {
-    ivec v;
-    memcpy(&v, p, sizeof v);
-    return v;
-}
-inline void store_ivec(void* p, ivec v) { memcpy(p, &v, sizeof v); }
-
-// IB bytes to two vectors of 16-bit lanes (the low and high byte of each
-// 128-bit lane), and back; pack_bytes undoes widen_bytes exactly for
-// values up to 255.
-inline void widen_bytes(ivec x, iu16& lo, iu16& hi) {
-#if defined(ZOR_LEVEL_k0)
-    lo = (iu16)_mm512_unpacklo_epi8(x, _mm512_setzero_si512());
-    hi = (iu16)_mm512_unpackhi_epi8(x, _mm512_setzero_si512());
-#elif defined(ZOR_LEVEL_l9) || defined(ZOR_LEVEL_n0)
-    lo = (iu16)_mm256_unpacklo_epi8(x, _mm256_setzero_si256());
-    hi = (iu16)_mm256_unpackhi_epi8(x, _mm256_setzero_si256());
+inline void widen_bytes(iu8 x, iu16& lo, iu16& hi) {
+#if ZOR_INT_VECTOR_BYTES == 64
+    lo = (iu16)_mm512_unpacklo_epi8((__m512i)x, _mm512_setzero_si512());
+    hi = (iu16)_mm512_unpackhi_epi8((__m512i)x, _mm512_setzero_si512());
+#elif ZOR_INT_VECTOR_BYTES == 32
+    lo = (iu16)_mm256_unpacklo_epi8((__m256i)x, _mm256_setzero_si256());
+    hi = (iu16)_mm256_unpackhi_epi8((__m256i)x, _mm256_setzero_si256());
 #else
-    lo = (iu16)_mm_unpacklo_epi8(x, _mm_setzero_si128());
-    hi = (iu16)_mm_unpackhi_epi8(x, _mm_setzero_si128());
+    lo = (iu16)_mm_unpacklo_epi8((__m128i)x, _mm_setzero_si128());
+    hi = (iu16)_mm_unpackhi_epi8((__m128i)x, _mm_setzero_si128());
 #endif
 }
 
-inline ivec pack_bytes(iu16 lo, iu16 hi) {
-#if defined(ZOR_LEVEL_k0)
-    return _mm512_packus_epi16((__m512i)lo, (__m512i)hi);
-#elif defined(ZOR_LEVEL_l9) || defined(ZOR_LEVEL_n0)
-    return _mm256_packus_epi16((__m256i)lo, (__m256i)hi);
+inline iu8 pack_bytes(iu16 lo, iu16 hi) {
+#if ZOR_INT_VECTOR_BYTES == 64
+    return (iu8)_mm512_packus_epi16((__m512i)lo, (__m512i)hi);
+#elif ZOR_INT_VECTOR_BYTES == 32
+    return (iu8)_mm256_packus_epi16((__m256i)lo, (__m256i)hi);
 #else
-    return _mm_packus_epi16((__m128i)lo, (__m128i)hi);
+    return (iu8)_mm_packus_epi16((__m128i)lo, (__m128i)hi);
 #endif
 }
 
-// 32-bit lanes in a vector of W bytes (the float width VB for the
-// divisions, the integer width IB for the 16-bit products).
+// W / 4 bytes to 32-bit lanes (W the float width VB for the divisions, the
+// integer width for the 16-bit products).
 template <int W>
-struct Int32Vec {
-    typedef int32_t type __attribute__((vector_size(W)));
-};
-template <int W>
-using vi32 = typename Int32Vec<W>::type;
-
-// W / 4 bytes to 32-bit lanes.
-template <int W>
-inline vi32<W> load_u8_i32(const Zor8u* p) {
+inline simd::vec<W, int32_t> load_u8_i32(const Zor8u* p) {
+    typedef simd::vec<W, int32_t> V;
     if constexpr (W == 16) {
-        int32_t w;
-        memcpy(&w, p, 4);
-#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_n8)
-        const __m128i z = _mm_setzero_si128();
-        return (vi32<W>)_mm_unpacklo_epi16(_mm_unpacklo_epi8(_mm_cvtsi32_si128(w), z), z);
+        const __m128i x = _mm_cvtsi32_si128(simd::load<int32_t>(p));
+#if ZOR_HAS_SSE41
+        return (V)_mm_cvtepu8_epi32(x);
 #else
-        return (vi32<W>)_mm_cvtepu8_epi32(_mm_cvtsi32_si128(w));
+        const __m128i z = _mm_setzero_si128();
+        return (V)_mm_unpacklo_epi16(_mm_unpacklo_epi8(x, z), z);
 #endif
     } else if constexpr (W == 32) {
-#if defined(ZOR_LEVEL_e9)
-        int64_t w;
-        memcpy(&w, p, 8);
-        const __m128i x = _mm_cvtsi64_si128(w);
-        return (vi32<W>)_mm256_setr_m128i(_mm_cvtepu8_epi32(x),
-                                          _mm_cvtepu8_epi32(_mm_srli_si128(x, 4)));
-#elif ZOR_VECTOR_BYTES >= 32
-        return (vi32<W>)_mm256_cvtepu8_epi32(_mm_loadl_epi64((const __m128i*)p));
+#if ZOR_VECTOR_BYTES >= 32
+        const __m128i x = _mm_loadl_epi64((const __m128i*)p);
+#if ZOR_HAS_AVX2
+        return (V)_mm256_cvtepu8_epi32(x);
+#else
+        return (V)_mm256_setr_m128i(_mm_cvtepu8_epi32(x), _mm_cvtepu8_epi32(_mm_srli_si128(x, 4)));
+#endif
 #endif
     } else {
 #if ZOR_VECTOR_BYTES == 64
-        return (vi32<W>)_mm512_cvtepu8_epi32(_mm_loadu_si128((const __m128i*)p));
+        return (V)_mm512_cvtepu8_epi32(_mm_loadu_si128((const __m128i*)p));
 #endif
     }
 }
 
 // W / 4 16-bit elements to 32-bit lanes.
 template <int W, bool Signed>
-inline vi32<W> load_16_i32(const void* p) {
+inline simd::vec<W, int32_t> load_16_i32(const void* p) {
+    typedef simd::vec<W, int32_t> V;
     if constexpr (W == 16) {
         const __m128i x = _mm_loadl_epi64((const __m128i*)p);
-#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_n8)
-        if (Signed) return (vi32<W>)_mm_srai_epi32(_mm_unpacklo_epi16(x, x), 16);
-        return (vi32<W>)_mm_unpacklo_epi16(x, _mm_setzero_si128());
+#if ZOR_HAS_SSE41
+        return (V)(Signed ? _mm_cvtepi16_epi32(x) : _mm_cvtepu16_epi32(x));
 #else
-        return (vi32<W>)(Signed ? _mm_cvtepi16_epi32(x) : _mm_cvtepu16_epi32(x));
+        if (Signed) return (V)_mm_srai_epi32(_mm_unpacklo_epi16(x, x), 16);
+        return (V)_mm_unpacklo_epi16(x, _mm_setzero_si128());
 #endif
     } else if constexpr (W == 32) {
+#if ZOR_VECTOR_BYTES >= 32
         const __m128i x = _mm_loadu_si128((const __m128i*)p);
-#if defined(ZOR_LEVEL_e9)
+#if ZOR_HAS_AVX2
+        return (V)(Signed ? _mm256_cvtepi16_epi32(x) : _mm256_cvtepu16_epi32(x));
+#else
         const __m128i y = _mm_srli_si128(x, 8);
-        if (Signed) return (vi32<W>)_mm256_setr_m128i(_mm_cvtepi16_epi32(x), _mm_cvtepi16_epi32(y));
-        return (vi32<W>)_mm256_setr_m128i(_mm_cvtepu16_epi32(x), _mm_cvtepu16_epi32(y));
-#elif ZOR_VECTOR_BYTES >= 32
-        return (vi32<W>)(Signed ? _mm256_cvtepi16_epi32(x) : _mm256_cvtepu16_epi32(x));
+        if (Signed) return (V)_mm256_setr_m128i(_mm_cvtepi16_epi32(x), _mm_cvtepi16_epi32(y));
+        return (V)_mm256_setr_m128i(_mm_cvtepu16_epi32(x), _mm_cvtepu16_epi32(y));
+#endif
 #endif
     } else {
 #if ZOR_VECTOR_BYTES == 64
         const __m256i x = _mm256_loadu_si256((const __m256i*)p);
-        return (vi32<W>)(Signed ? _mm512_cvtepi16_epi32(x) : _mm512_cvtepu16_epi32(x));
+        return (V)(Signed ? _mm512_cvtepi16_epi32(x) : _mm512_cvtepu16_epi32(x));
 #endif
     }
 }
 
 // 32-bit lanes, already in the element's range, to W / 4 16-bit elements.
 template <int W, bool Signed>
-inline void store_i32_16(void* p, vi32<W> v) {
+inline void store_i32_16(void* p, simd::vec<W, int32_t> v) {
     if constexpr (W == 16) {
         __m128i x = (__m128i)v;
-#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_n8)
+#if ZOR_HAS_SSE41
+        x = Signed ? _mm_packs_epi32(x, x) : _mm_packus_epi32(x, x);
+#else
         if (Signed) {
             x = _mm_packs_epi32(x, x);
         } else {
@@ -253,8 +226,6 @@ inline void store_i32_16(void* p, vi32<W> v) {
             const __m128i t = _mm_sub_epi32(x, _mm_set1_epi32(32768));
             x = _mm_xor_si128(_mm_packs_epi32(t, t), _mm_set1_epi16((short)0x8000));
         }
-#else
-        x = Signed ? _mm_packs_epi32(x, x) : _mm_packus_epi32(x, x);
 #endif
         _mm_storel_epi64((__m128i*)p, x);
     } else if constexpr (W == 32) {

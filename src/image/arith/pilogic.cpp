@@ -12,8 +12,8 @@ void ownpi_XorC_8u_C1R(const Zor8u* pSrc, int32_t srcStep, Zor8u value, Zor8u* p
     const vu8 v = simd::broadcast<vu8>(value);
     const size_t width = (size_t)roiSize.width;
     for (int32_t y = 0; y < roiSize.height; ++y) {
-        const Zor8u* s = arith::row(pSrc, srcStep, y);
-        Zor8u* d = arith::row(pDst, dstStep, y);
+        const Zor8u* s = row_at(pSrc, srcStep, y);
+        Zor8u* d = row_at(pDst, dstStep, y);
         size_t i = 0;
         for (; i + 2 * VB <= width; i += 2 * VB) {
             const vu8 a = simd::load<vu8>(s + i), b = simd::load<vu8>(s + i + VB);

@@ -52,7 +52,7 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriMinMax_32f_C1R)(const Zor32f* pSrc, int32_t src
     const int32_t full = roiSize.width & ~15;
     const int32_t rest = roiSize.width - full;
     for (int32_t y = 0; y < roiSize.height; ++y) {
-        const Zor32f* s = (const Zor32f*)arith::row(pSrc, srcStep, y);
+        const Zor32f* s = row_at(pSrc, srcStep, y);
         for (int32_t i = 0; i < full; i += 16) {
             for (int k = 0; k < N; ++k) {
                 const vf32 x = simd::load<vf32>(s + i + k * L);

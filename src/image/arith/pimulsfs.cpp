@@ -25,7 +25,7 @@ inline V bc(int64_t x) {
     if constexpr (std::is_arithmetic_v<V>)
         return (V)x;
     else
-        return V{} + (std::remove_cv_t<std::remove_reference_t<decltype(V{}[0])>>)x;
+        return simd::broadcast<V>((typename simd::Lanes<V>::Element)x);
 }
 
 template <typename V>
@@ -91,7 +91,8 @@ inline V rule16s(V p, int s) {
 
 // ---- element types ---------------------------------------------------------
 
-// 8u: IB bytes a round, as two vectors of 16-bit products.
+// 8u: one integer vector of bytes a round, as two vectors of 16-bit
+// products.
 struct U8 {
     typedef Zor8u T;
     typedef uint32_t S;
@@ -100,19 +101,19 @@ struct U8 {
     static V rule(V p, int s) {
         return rule8u<R>(p, s);
     }
-    static constexpr int32_t kStep = arith::IB;
+    static constexpr int32_t kStep = ZOR_INT_VECTOR_BYTES;
     template <int R>
     static void block(const T* a, const T* b, T* d, int s) {
         arith::iu16 a0, a1, b0, b1;
-        arith::widen_bytes(arith::load_ivec(a), a0, a1);
-        arith::widen_bytes(arith::load_ivec(b), b0, b1);
-        arith::store_ivec(d, arith::pack_bytes(rule<R>(a0 * b0, s), rule<R>(a1 * b1, s)));
+        arith::widen_bytes(simd::load<arith::iu8>(a), a0, a1);
+        arith::widen_bytes(simd::load<arith::iu8>(b), b0, b1);
+        simd::store(d, arith::pack_bytes(rule<R>(a0 * b0, s), rule<R>(a1 * b1, s)));
     }
 };
 
 // The 16-bit types: products in 32-bit lanes of the integer width.
-typedef int32_t is32 __attribute__((vector_size(arith::IB)));
-typedef uint32_t iu32 __attribute__((vector_size(arith::IB)));
+typedef simd::ivec<int32_t> is32;
+typedef simd::ivec<uint32_t> iu32;
 
 template <typename Elem, typename Lane, typename Wide, bool Signed>
 struct Words {
@@ -126,10 +127,10 @@ struct Words {
         else
             return rule16u<R>(p, s);
     }
-    static constexpr int32_t kStep = arith::IB / 4;
+    static constexpr int32_t kStep = ZOR_INT_VECTOR_BYTES / 4;
     template <int R>
     static void block(const T* a, const T* b, T* d, int s) {
-        constexpr int W = arith::IB;
+        constexpr int W = ZOR_INT_VECTOR_BYTES;
         const Lane p = (Lane)arith::load_16_i32<W, Signed>(a) *
                        (Lane)arith::load_16_i32<W, Signed>(b);
         arith::store_i32_16<W, Signed>(d, (is32)rule<R>(p, s));
@@ -145,9 +146,9 @@ void mul_rows(const typename E::T* pSrc1, int32_t src1Step, const typename E::T*
     typedef typename E::S S;
     constexpr int32_t K = E::kStep;
     for (int32_t y = 0; y < roi.height; ++y) {
-        const T* a = (const T*)arith::row(pSrc1, src1Step, y);
-        const T* b = (const T*)arith::row(pSrc2, src2Step, y);
-        T* d = (T*)arith::row(pDst, dstStep, y);
+        const T* a = row_at(pSrc1, src1Step, y);
+        const T* b = row_at(pSrc2, src2Step, y);
+        T* d = row_at(pDst, dstStep, y);
         int32_t i = 0;
         for (; i + 2 * K <= roi.width; i += 2 * K) {
             E::template block<R>(a + i, b + i, d + i, s);

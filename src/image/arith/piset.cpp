@@ -79,7 +79,7 @@ void owniSet_C1R(const Zor8u pattern[16], Zor8u* pDst, int32_t dstStep, int64_t 
         return;
     }
     for (int32_t y = 0; y < height; ++y)
-        owniSet_8u_C4_M7(pattern, arith::row(pDst, dstStep, y), (size_t)rowBytes, nt);
+        owniSet_8u_C4_M7(pattern, row_at(pDst, dstStep, y), (size_t)rowBytes, nt);
 }
 
 namespace {

@@ -37,8 +37,8 @@ void clip_rows(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst, int32_t dstSte
                Zor32f threshold) {
     const vf32 t = simd::broadcast<vf32>(threshold);
     for (int32_t y = 0; y < roi.height; ++y) {
-        const Zor32f* s = (const Zor32f*)arith::row(pSrc, srcStep, y);
-        Zor32f* d = (Zor32f*)arith::row(pDst, dstStep, y);
+        const Zor32f* s = row_at(pSrc, srcStep, y);
+        Zor32f* d = row_at(pDst, dstStep, y);
         int32_t i = 0;
         for (; i + 2 * L <= roi.width; i += 2 * L) {
             const vf32 a = simd::load<vf32>(s + i), b = simd::load<vf32>(s + i + L);
@@ -47,7 +47,8 @@ void clip_rows(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst, int32_t dstSte
         }
         for (; i + L <= roi.width; i += L)
             simd::store(d + i, clip<Greater>(simd::load<vf32>(s + i), t));
-        for (; i < roi.width; ++i) d[i] = clip<Greater>(s[i], threshold);
+        for (; i < roi.width; ++i)
+            simd::store(d + i, clip<Greater>(simd::load<float>(s + i), threshold));
     }
 }
 
@@ -56,8 +57,8 @@ void replace_rows(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst, int32_t dst
                   ZoriSize roi, Zor32f threshold, Zor32f value) {
     const vf32 t = simd::broadcast<vf32>(threshold), v = simd::broadcast<vf32>(value);
     for (int32_t y = 0; y < roi.height; ++y) {
-        const Zor32f* s = (const Zor32f*)arith::row(pSrc, srcStep, y);
-        Zor32f* d = (Zor32f*)arith::row(pDst, dstStep, y);
+        const Zor32f* s = row_at(pSrc, srcStep, y);
+        Zor32f* d = row_at(pDst, dstStep, y);
         int32_t i = 0;
         for (; i + 2 * L <= roi.width; i += 2 * L) {
             const vf32 a = simd::load<vf32>(s + i), b = simd::load<vf32>(s + i + L);
@@ -66,7 +67,8 @@ void replace_rows(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst, int32_t dst
         }
         for (; i + L <= roi.width; i += L)
             simd::store(d + i, replace<Greater>(simd::load<vf32>(s + i), t, v));
-        for (; i < roi.width; ++i) d[i] = replace<Greater>(s[i], threshold, value);
+        for (; i < roi.width; ++i)
+            simd::store(d + i, replace<Greater>(simd::load<float>(s + i), threshold, value));
     }
 }
 

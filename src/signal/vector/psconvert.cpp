@@ -100,18 +100,20 @@ template <typename D, Round R> void convert(const float* s, D* d, int32_t len, i
     int32_t i = 0;
     if (sf >= -127 && sf <= 126) {
         const float scale = ldexpf(1.0f, -sf);
-        typedef D VD __attribute__((vector_size(L * sizeof(D))));
+        typedef simd::vec<L * sizeof(D), D> VD;
         const vf32 vscale = simd::broadcast<vf32>(scale);
         for (; len - i >= L; i += L) {
             const vs32 t = saturate<D>(to_int<R>(simd::load<vf32>(s + i) * vscale, vs32{}));
-            const VD v = __builtin_convertvector(t, VD);
-            memcpy(d + i, &v, sizeof v);
+            simd::store(d + i, __builtin_convertvector(t, VD));
         }
-        for (; i < len; ++i) d[i] = (D)saturate<D>(to_int<R>(s[i] * scale, int32_t{}));
+        for (; i < len; ++i)
+            simd::store(d + i, (D)saturate<D>(to_int<R>(simd::load<float>(s + i) * scale, int32_t{})));
         return;
     }
     const double scale = ldexp(1.0, sf < -300 ? 300 : sf > 300 ? -300 : -sf);
-    for (; i < len; ++i) d[i] = (D)saturate<D>(to_int<R>((double)s[i] * scale, int32_t{}));
+    for (; i < len; ++i)
+        simd::store(d + i,
+                    (D)saturate<D>(to_int<R>((double)simd::load<float>(s + i) * scale, int32_t{})));
 }
 
 template <typename D>

@@ -213,7 +213,7 @@ const Zor8u kLeaf2Codes[] = {
 // cache: the largest cache in bytes, or negative when unknown. Each family
 // asks for it only where its choice depends on it.
 
-#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_n8) || defined(ZOR_LEVEL_y8)
+#if ZOR_COPY_POLICY == ZOR_COPY_READAHEAD
 
 static void copy_policy(const Zor8u* s, Zor8u* d, size_t n, int64_t cache) {
     if (n >= 0x80000 && cache >= 0 && 2 * n >= (uint64_t)cache)
@@ -231,7 +231,7 @@ static void zero_policy(Zor8u* d, size_t n, int64_t cache) {
 }
 static int64_t zero_cache(size_t n) { return n > 0x80000 ? leaf2_cache_size() : -1; }
 
-#elif defined(ZOR_LEVEL_e9)
+#elif ZOR_COPY_POLICY == ZOR_COPY_STRING
 
 static void copy_policy(const Zor8u* s, Zor8u* d, size_t n, int64_t) {
     if (n >= 32768)
@@ -241,7 +241,7 @@ static void copy_policy(const Zor8u* s, Zor8u* d, size_t n, int64_t) {
 }
 static int64_t copy_cache(size_t) { return -1; }
 
-#else  // l9, n0, k0
+#else  // ZOR_COPY_PAGE
 
 static void copy_policy(const Zor8u* s, Zor8u* d, size_t n, int64_t cache) {
     if (n < 0x8000) {
@@ -264,7 +264,7 @@ static int64_t copy_cache(size_t n) {
 
 #endif
 
-#if !defined(ZOR_LEVEL_m7) && !defined(ZOR_LEVEL_n8) && !defined(ZOR_LEVEL_y8)
+#if ZOR_COPY_POLICY != ZOR_COPY_READAHEAD
 // The AVX levels clear large ranges with the string store.
 static void zero_policy(Zor8u* d, size_t n, int64_t) {
     if (n >= 32768)
