@@ -1,7 +1,7 @@
 // The level-private fills, copies and division rows of every level.
 #include <math.h>
 
-#include "arith_harness.h"
+#include "sweep.h"
 #include "zorinternal.h"
 
 namespace {
@@ -10,60 +10,44 @@ using namespace arithtest;
 
 using ArithInternal = zortest::LevelTest;
 
-template <typename T, typename Fill>
-void check_fill(Fill fill, T value, uint64_t seed) {
+// Fill and copy of each element width against the plain definition, with
+// the checks (pointers, then ROI; no step test) after.
+template <typename T, typename Fill, typename Copy>
+void check_fill_copy(Fill fill, Copy copy, T value, uint64_t seed) {
     Rng r(seed);
-    for (const Geometry& g : geometries()) {
-        for (int32_t step : steps_for(g.w * (int32_t)sizeof(T), sizeof(T), true, true)) {
-            Plane dst(g.w, g.h, sizeof(T), step, misaligns(sizeof(T), true)[r.below(5)], r);
-            Plane want = dst;
-            for (int32_t y = 0; y < g.h; ++y)
-                for (int32_t x = 0; x < g.w; ++x) want.put<T>(x, y, value);
-            ASSERT_EQ(fill(value, dst.ptr<T>(), step, {g.w, g.h}), zorStsNoErr);
-            ASSERT_TRUE(same_bytes(dst.mem, want.mem, dst));
-        }
-    }
-    T one[2] = {1, 1};
-    EXPECT_EQ(fill(value, nullptr, 2, {0, 0}), zorStsNullPtrErr);
-    EXPECT_EQ(fill(value, one, 2, {0, 1}), zorStsSizeErr);
-    EXPECT_EQ(fill(value, one, 2, {1, 0}), zorStsSizeErr);
-    EXPECT_EQ(one[0], 1);
-}
-
-TEST_P(ArithInternal, SetFillsEveryWidth) {
-    ASSERT_NO_FATAL_FAILURE(check_fill<Zor8u>(ZOR_BODY(zoriSet_8u_C1R), (Zor8u)0xa5, 1));
-    ASSERT_NO_FATAL_FAILURE(check_fill<Zor16s>(ZOR_BODY(zoriSet_16s_C1R), (Zor16s)-12345, 2));
-}
-
-template <typename T, typename Copy>
-void check_copy(Copy copy, uint64_t seed) {
-    Rng r(seed);
-    for (const Geometry& g : geometries()) {
-        const std::vector<int32_t> steps = steps_for(g.w * (int32_t)sizeof(T), sizeof(T), true, true);
-        for (size_t k = 0; k < steps.size(); ++k) {
-            for (size_t j : {k, (k + 1) % steps.size()}) {
-                Plane src(g.w, g.h, sizeof(T), steps[k], misaligns(sizeof(T), true)[r.below(5)], r);
-                Plane dst(g.w, g.h, sizeof(T), steps[j], misaligns(sizeof(T), true)[r.below(5)], r);
-                Plane want = dst;
-                for (int32_t y = 0; y < g.h; ++y)
-                    memcpy(want.at(0, y), src.at(0, y), (size_t)g.w * sizeof(T));
-                ASSERT_EQ(copy(src.ptr<T>(), steps[k], dst.ptr<T>(), steps[j], {g.w, g.h}),
-                          zorStsNoErr);
-                ASSERT_TRUE(same_bytes(dst.mem, want.mem, dst));
-            }
+    const int32_t e = (int32_t)sizeof(T);
+    size_t turn = 0;
+    for (ZoriSize g : geometries()) {
+        const std::vector<int32_t> steps = steps_for(g.width * e, e, kFree);
+        for (size_t k = 0; k < steps.size(); ++k, ++turn) {
+            const int32_t ds = steps[(k + 1) % steps.size()];
+            Image<T> src = image<T>(g.width, g.height, steps[k], misalign(e, true, turn));
+            Image<T> dst = image<T>(g.width, g.height, ds, misalign(e, true, turn + 1));
+            src.randomize(r);
+            Image<T> want = dst, filled = dst;
+            for (int32_t y = 0; y < g.height; ++y)
+                for (int32_t x = 0; x < g.width; ++x) want.set(x, y, src.get(x, y));
+            ASSERT_EQ(copy(src.ptr(), steps[k], dst.ptr(), ds, g), zorStsNoErr);
+            ASSERT_TRUE(same_bytes(dst, want));
+            want.fill([&](int32_t, int32_t) { return value; });
+            ASSERT_EQ(fill(value, filled.ptr(), ds, g), zorStsNoErr);
+            ASSERT_TRUE(same_bytes(filled, want));
         }
     }
     T a[2] = {1, 2}, b[2] = {5, 5};
-    EXPECT_EQ(copy(nullptr, 2, b, 2, {0, 0}), zorStsNullPtrErr);
-    EXPECT_EQ(copy(a, 2, nullptr, 2, {1, 1}), zorStsNullPtrErr);
-    EXPECT_EQ(copy(a, 2, b, 2, {0, 1}), zorStsSizeErr);
-    EXPECT_EQ(copy(a, 2, b, 2, {1, 0}), zorStsSizeErr);
-    EXPECT_EQ(b[0], 5);
+    run_checks({{zorStsNullPtrErr, "fill", [&] { return fill(value, nullptr, 2, {0, 0}); }},
+                {zorStsSizeErr, "fill", [&] { return fill(value, b, 2, {0, 1}); }},
+                {zorStsNullPtrErr, "copy", [&] { return copy(nullptr, 2, b, 2, {0, 0}); }},
+                {zorStsNullPtrErr, "copy", [&] { return copy(a, 2, nullptr, 2, {1, 1}); }},
+                {zorStsSizeErr, "copy", [&] { return copy(a, 2, b, 2, {1, 0}); }}},
+               [&] { return b[0] == 5 && b[1] == 5; });
 }
 
-TEST_P(ArithInternal, CopyMovesEveryWidth) {
-    ASSERT_NO_FATAL_FAILURE(check_copy<Zor8u>(ZOR_BODY(zoriCopy_8u_C1R), 3));
-    ASSERT_NO_FATAL_FAILURE(check_copy<Zor16s>(ZOR_BODY(zoriCopy_16s_C1R), 4));
+TEST_P(ArithInternal, FillAndCopyEveryWidth) {
+    ASSERT_NO_FATAL_FAILURE(check_fill_copy<Zor8u>(ZOR_BODY(zoriSet_8u_C1R), ZOR_BODY(zoriCopy_8u_C1R),
+                                                   (Zor8u)0xa5, 1));
+    ASSERT_NO_FATAL_FAILURE(check_fill_copy<Zor16s>(ZOR_BODY(zoriSet_16s_C1R),
+                                                    ZOR_BODY(zoriCopy_16s_C1R), (Zor16s)-12345, 2));
 }
 
 // The row forms: dst = src2 / src1 over len elements, status 2 on a zero

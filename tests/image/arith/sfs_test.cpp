@@ -4,11 +4,12 @@
 #include <limits.h>
 #include <math.h>
 
+#include <algorithm>
 #include <map>
 #include <string>
 #include <typeinfo>
 
-#include "arith_harness.h"
+#include "sweep.h"
 #include "zortest.h"
 
 namespace {
@@ -203,113 +204,81 @@ TEST_P(Sfs, Div16bitSampledPairs) {
 
 template <typename T, typename Model>
 void check_geometries(SfsFn<T> fn, Model model, bool division, const std::vector<int>& ss,
-                      bool negative, uint64_t seed) {
+                      StepRule rule, uint64_t seed) {
     Rng r(seed);
     size_t turn = 0;
-    for (const Geometry& g : geometries()) {
-        const std::vector<int32_t> steps =
-            steps_for(g.w * (int32_t)sizeof(T), sizeof(T), negative, true);
-        const std::vector<size_t> ms = misaligns(sizeof(T), false);
+    const int32_t e = (int32_t)sizeof(T);
+    for (ZoriSize g : geometries()) {
+        const std::vector<int32_t> steps = steps_for(g.width * e, e, rule);
         for (size_t k = 0; k < steps.size(); ++k, ++turn) {
             const int s = ss[turn % ss.size()];
-            const int32_t st1 = steps[k], st2 = steps[(k + 1) % steps.size()];
-            const int32_t dstep = k % 2 ? steps[k] : steps[(k + 2) % steps.size()];
-            Plane a(g.w, g.h, sizeof(T), st1, ms[k % ms.size()], r);
-            Plane b(g.w, g.h, sizeof(T), st2, ms[(k + 1) % ms.size()], r);
-            Plane d(g.w, g.h, sizeof(T), dstep, ms[(k + 2) % ms.size()], r);
+            const int32_t st[3] = {steps[k], steps[(k + 1) % steps.size()], steps[(k + 2) % steps.size()]};
+            Image<T> a = image<T>(g.width, g.height, st[0], misalign(e, false, k));
+            Image<T> b = image<T>(g.width, g.height, st[1], misalign(e, false, k + 1));
+            Image<T> d = image<T>(g.width, g.height, st[2], misalign(e, false, k + 2));
             // Small values now and then, so that every rule sees both.
             const bool small = turn % 3 == 0;
-            for (int32_t y = 0; y < g.h; ++y)
-                for (int32_t x = 0; x < g.w; ++x) {
-                    a.put<T>(x, y, (T)(small ? r.below(4) : r.next()));
-                    b.put<T>(x, y, (T)(small ? r.below(40) : r.next()));
-                }
-            Plane want = d;
+            a.fill([&](int32_t, int32_t) { return small ? r.below(4) : r.next(); });
+            b.fill([&](int32_t, int32_t) { return small ? r.below(40) : r.next(); });
+            Image<T> want = d;
             bool zero = false;
-            for (int32_t y = 0; y < g.h; ++y)
-                for (int32_t x = 0; x < g.w; ++x) {
-                    want.put<T>(x, y, (T)model(a.get<T>(x, y), b.get<T>(x, y), s));
-                    zero |= a.get<T>(x, y) == 0;
+            for (int32_t y = 0; y < g.height; ++y)
+                for (int32_t x = 0; x < g.width; ++x) {
+                    want.set(x, y, (T)model(a.get(x, y), b.get(x, y), s));
+                    zero |= a.get(x, y) == 0;
                 }
-            const ZorStatus st =
-                fn(a.ptr<T>(), st1, b.ptr<T>(), st2, d.ptr<T>(), dstep, {g.w, g.h}, s);
-            ASSERT_TRUE(same_bytes(d.mem, want.mem, d)) << "scale " << s;
-            ASSERT_EQ(st, division && zero ? zorStsDivByZero : zorStsNoErr)
-                << where(d) << " scale " << s;
+            const ZorStatus st0 = fn(a.ptr(), st[0], b.ptr(), st[1], d.ptr(), st[2], g, s);
+            ASSERT_TRUE(same_bytes(d, want)) << "scale " << s << " steps " << st[0] << " " << st[2];
+            ASSERT_EQ(st0, division && zero ? zorStsDivByZero : zorStsNoErr) << "scale " << s;
         }
     }
 }
 
 TEST_P(Sfs, GuardedGeometries) {
-    const std::vector<int> mul8 = {0, 1, 2, 5, 8, 15, 16, 17, -1, -7, -8};
-    check_geometries<Zor8u>(zoriMul_8u_C1RSfs, mul_model<Zor8u>, false, mul8, true, 21);
-    const std::vector<int> mul16u = {0, 1, 2, 16, 17, 31, 32, 33, -1, -15, -16};
-    check_geometries<Zor16u>(zoriMul_16u_C1RSfs, mul_model<Zor16u>, false, mul16u, true, 22);
-    const std::vector<int> mul16s = {0, 1, 2, 15, 30, 31, -1, -14, -15};
-    check_geometries<Zor16s>(zoriMul_16s_C1RSfs, mul_model<Zor16s>, false, mul16s, true, 23);
-    const std::vector<int> div8 = {0, 1, 3, 8, 9, -1, -15, -16};
-    check_geometries<Zor8u>(zoriDiv_8u_C1RSfs, div_model<Zor8u>, true, div8, false, 24);
-    const std::vector<int> div16u = {0, 1, 16, 17, -1, -31, -32};
-    check_geometries<Zor16u>(zoriDiv_16u_C1RSfs, div_model<Zor16u>, true, div16u, true, 25);
-    const std::vector<int> div16s = {0, 2, 15, 16, -1, -30, -31};
-    check_geometries<Zor16s>(zoriDiv_16s_C1RSfs, div_model<Zor16s>, true, div16s, false, 26);
+    check_geometries<Zor8u>(zoriMul_8u_C1RSfs, mul_model<Zor8u>, false,
+                            {0, 1, 2, 5, 8, 15, 16, 17, -1, -7, -8}, kFree, 21);
+    check_geometries<Zor16u>(zoriMul_16u_C1RSfs, mul_model<Zor16u>, false,
+                             {0, 1, 2, 16, 17, 31, 32, 33, -1, -15, -16}, kFree, 22);
+    check_geometries<Zor16s>(zoriMul_16s_C1RSfs, mul_model<Zor16s>, false,
+                             {0, 1, 2, 15, 30, 31, -1, -14, -15}, kFree, 23);
+    check_geometries<Zor8u>(zoriDiv_8u_C1RSfs, div_model<Zor8u>, true, {0, 1, 3, 8, 9, -1, -15, -16},
+                            kPositive, 24);
+    check_geometries<Zor16u>(zoriDiv_16u_C1RSfs, div_model<Zor16u>, true, {0, 1, 16, 17, -1, -31, -32},
+                             kFree, 25);
+    check_geometries<Zor16s>(zoriDiv_16s_C1RSfs, div_model<Zor16s>, true, {0, 2, 15, 16, -1, -30, -31},
+                             kPositive, 26);
 }
 
-// Every row is computed whichever row meets a zero divisor.
-TEST_P(Sfs, DivisionStatusAndLaterRows) {
-    for (int32_t zeroRow : {0, 2}) {
-        Zor8u a[3][20], b[3][20], d[3][20];
-        for (int y = 0; y < 3; ++y)
-            for (int x = 0; x < 20; ++x) {
-                a[y][x] = (Zor8u)(1 + x);
-                b[y][x] = (Zor8u)(10 * y + x);
-            }
-        a[zeroRow][19] = 0;
-        memset(d, 0, sizeof d);
-        ASSERT_EQ(zoriDiv_8u_C1RSfs(&a[0][0], 20, &b[0][0], 20, &d[0][0], 20, {20, 3}, 0),
-                  zorStsDivByZero);
-        for (int y = 0; y < 3; ++y)
-            for (int x = 0; x < 20; ++x)
-                ASSERT_EQ(d[y][x], div_model<Zor8u>(a[y][x], b[y][x], 0)) << y << "," << x;
-    }
+// Pointers, ROI, then steps where the operation tests them (the divisions
+// of 8u and 16s); nothing written on an error.
+template <typename T> void check_order(SfsFn<T> fn, bool stepTest) {
+    static const T src[8] = {1, 1, 1, 1, 1, 1, 1, 1};
+    T dst[8] = {7, 7, 7, 7, 7, 7, 7, 7};
+    T* const d = dst;
+    const int32_t row = 2 * (int32_t)sizeof(T);
+    std::vector<CheckRow> rows = {
+        {zorStsNullPtrErr, "src1", [=] { return fn(nullptr, row, src, row, d, row, {0, 0}, 1); }},
+        {zorStsNullPtrErr, "src2", [=] { return fn(src, row, nullptr, row, d, row, {2, 1}, 1); }},
+        {zorStsNullPtrErr, "dst", [=] { return fn(src, row, src, row, nullptr, row, {2, 1}, 1); }},
+        {zorStsSizeErr, "width", [=] { return fn(src, 0, src, 0, d, 0, {0, 1}, 1); }},
+        {zorStsSizeErr, "height", [=] { return fn(src, -1, src, -1, d, -1, {2, -1}, 1); }},
+    };
+    if (stepTest)
+        for (int k = 0; k < 3; ++k)
+            rows.push_back({zorStsStepErr, "step", [=] {
+                                return fn(src, k == 0 ? 0 : row, src, k == 1 ? -row : row, d,
+                                          k == 2 ? 0 : row, {2, 1}, 1);
+                            }});
+    run_checks(rows, [&] { return std::all_of(dst, dst + 8, [](T v) { return v == 7; }); });
 }
 
-// Pointers, ROI, then steps where the operation tests them; nothing written
-// on an error.
 TEST_P(Sfs, ChecksInOrder) {
-    Zor16u src[16];
-    for (Zor16u& v : src) v = 0x0101;  // non-zero divisors in every width
-    for (int k = 0; k < 6; ++k) {
-        const bool stepTest = k == 3 || k == 5;  // Div 8u and Div 16s
-        auto call = [&](bool n1, bool n2, bool nd, ZoriSize roi, int32_t s1, int32_t s2,
-                        int32_t sd, Zor16u* dst) -> ZorStatus {
-            const void* p1 = n1 ? nullptr : src;
-            const void* p2 = n2 ? nullptr : src;
-            void* pd = nd ? nullptr : dst;
-            switch (k) {
-            case 0: return zoriMul_8u_C1RSfs((const Zor8u*)p1, s1, (const Zor8u*)p2, s2, (Zor8u*)pd, sd, roi, 1);
-            case 1: return zoriMul_16u_C1RSfs((const Zor16u*)p1, s1, (const Zor16u*)p2, s2, (Zor16u*)pd, sd, roi, 1);
-            case 2: return zoriMul_16s_C1RSfs((const Zor16s*)p1, s1, (const Zor16s*)p2, s2, (Zor16s*)pd, sd, roi, 1);
-            case 3: return zoriDiv_8u_C1RSfs((const Zor8u*)p1, s1, (const Zor8u*)p2, s2, (Zor8u*)pd, sd, roi, 1);
-            case 4: return zoriDiv_16u_C1RSfs((const Zor16u*)p1, s1, (const Zor16u*)p2, s2, (Zor16u*)pd, sd, roi, 1);
-            default: return zoriDiv_16s_C1RSfs((const Zor16s*)p1, s1, (const Zor16s*)p2, s2, (Zor16s*)pd, sd, roi, 1);
-            }
-        };
-        Zor16u dst[4] = {7, 7, 7, 7};
-        auto untouched = [&] { return dst[0] == 7 && dst[1] == 7 && dst[2] == 7 && dst[3] == 7; };
-        EXPECT_EQ(call(true, false, false, {0, 0}, 0, 0, 0, dst), zorStsNullPtrErr) << k;
-        EXPECT_EQ(call(false, true, false, {1, 1}, 8, 8, 8, dst), zorStsNullPtrErr) << k;
-        EXPECT_EQ(call(false, false, true, {1, 1}, 8, 8, 8, dst), zorStsNullPtrErr) << k;
-        EXPECT_EQ(call(false, false, false, {0, 1}, 0, 0, 0, dst), zorStsSizeErr) << k;
-        EXPECT_EQ(call(false, false, false, {1, -1}, 8, 8, 8, dst), zorStsSizeErr) << k;
-        EXPECT_TRUE(untouched()) << k;
-        const ZorStatus zeroStep = call(false, false, false, {1, 2}, 8, 0, 0, dst);
-        EXPECT_EQ(zeroStep, stepTest ? zorStsStepErr : zorStsNoErr) << k;
-        EXPECT_EQ(call(false, false, false, {1, 1}, 8, 8, -8, dst),
-                  stepTest ? zorStsStepErr : zorStsNoErr)
-            << k;
-        if (stepTest) EXPECT_TRUE(untouched()) << k;
-    }
+    check_order<Zor8u>(zoriMul_8u_C1RSfs, false);
+    check_order<Zor16u>(zoriMul_16u_C1RSfs, false);
+    check_order<Zor16s>(zoriMul_16s_C1RSfs, false);
+    check_order<Zor8u>(zoriDiv_8u_C1RSfs, true);
+    check_order<Zor16u>(zoriDiv_16u_C1RSfs, false);
+    check_order<Zor16s>(zoriDiv_16s_C1RSfs, true);
 }
 
 ZOR_INSTANTIATE_LEVELS(Sfs);

@@ -1,7 +1,9 @@
-// Level-private element-wise operations on every level: absolute value,
-// square, the in-place constant forms and their short cuts, in-place
-// reversal, clears and the integer copies, and the conversions to
-// integers in all three rounding modes.
+// Level-private element-wise operations on every level that no public
+// sweep reaches: the square of k0's own image path, the in-place constant
+// forms and their short cuts, in-place reversal checks, clears and the
+// integer copies, and the conversions to integers in all three rounding
+// modes. (The row functions behind the image arithmetic are swept through
+// the image operations.)
 
 #include <xmmintrin.h>
 
@@ -16,13 +18,9 @@ using Elementwise = zortest::LevelTest;
 using Clear = zortest::LevelTest;
 using Convert = zortest::LevelTest;
 
-TEST_P(Elementwise, AbsSquareAndConstantForms) {
+TEST_P(Elementwise, SquareAndConstantForms) {
     const std::vector<std::vector<float>> f(1, vt::values<float>(8200, 3));
     const std::vector<std::vector<double>> d(1, vt::values<double>(8200, 4));
-    // The sign bit cleared, NaN payloads kept: exact.
-    const auto abs = ZOR_BODY(zorsAbs_32f);
-    vt::sweep<float>(f, false, 1, true, [&](const float* const* s, float* o, int32_t n) { return abs(s[0], o, n); },
-                     [&](size_t i) { return vt::f32(vt::bits(f[0][i]) & 0x7fffffffu); });
     const auto sqr = ZOR_BODY(zorsSqr_32f);
     vt::sweep<float>(f, false, 1, false, [&](const float* const* s, float* o, int32_t n) { return sqr(s[0], o, n); },
                      [&](size_t i) { return f[0][i] * f[0][i]; });
@@ -77,54 +75,6 @@ TEST_P(Elementwise, InPlaceReversalChecks) {
     EXPECT_EQ(ZOR_BODY(zorsFlip_64f_I)(nullptr, 5), zorStsNullPtrErr);
     EXPECT_EQ(ZOR_BODY(zorsFlip_64fc_I)(one, -1), zorStsSizeErr);
     EXPECT_EQ(one[0].im, 2);
-}
-
-// The row functions behind the image arithmetic: nothing written at length
-// 0, Sub the second minus the first, and no short cut for any constant, so
-// NaN and infinity times 0 stay NaN.
-// One row function over every length and placement: call(sources,
-// destination, len) runs it (it returns nothing), op(x, y) models element
-// i of sources 0 and 1. In place, source 0 is the destination.
-template <typename T, typename Call, typename Op>
-void row(const std::vector<std::vector<T>>& d, bool inplace, Call call, Op op) {
-    vt::sweep<T>(d, inplace, 1, false,
-                 [&](const T* const* s, T* o, int32_t n) { call(s, o, n); return n ? zorStsNoErr : zorStsSizeErr; },
-                 [&](size_t i) { return op(d[0][i], d[1][i]); });
-}
-
-TEST_P(Elementwise, RowFunctionsTakeNoShortCuts) {
-    const std::vector<std::vector<float>> f = {vt::values<float>(8200, 5), vt::values<float>(8200, 6)};
-    const std::vector<std::vector<double>> d = {vt::values<double>(8200, 7), vt::values<double>(8200, 8)};
-    using F = const float* const*;
-    using D = const double* const*;
-    const auto add = [](auto x, auto y) { return x + y; };
-    const auto mul = [](auto x, auto y) { return x * y; };
-    const auto add32 = ZOR_BODY(ownsAdd_32f), sub32 = ZOR_BODY(ownsSub_32f), mul32 = ZOR_BODY(ownsMul_32f);
-    const auto add64 = ZOR_BODY(ownsAdd_64f);
-    const auto add64I = ZOR_BODY(ownsAdd_64f_I);
-    const auto addI = ZOR_BODY(ownsAdd_32f_I), mulI = ZOR_BODY(ownsMul_32f_I);
-    row(f, false, [&](F s, float* o, int32_t n) { add32(s[0], s[1], o, n); }, add);
-    row(f, false, [&](F s, float* o, int32_t n) { sub32(s[0], s[1], o, n); }, [](float x, float y) { return y - x; });
-    row(f, false, [&](F s, float* o, int32_t n) { mul32(s[0], s[1], o, n); }, mul);
-    row(d, false, [&](D s, double* o, int32_t n) { add64(s[0], s[1], o, n); }, add);
-    // In place: srcDst (source 0) op src (source 1).
-    row(f, true, [&](F s, float* o, int32_t n) { addI(s[1], o, n); }, add);
-    row(f, true, [&](F s, float* o, int32_t n) { mulI(s[1], o, n); }, mul);
-    row(d, true, [&](D s, double* o, int32_t n) { add64I(s[1], o, n); }, add);
-    const auto addc = ZOR_BODY(ownsAddC_32f), subc = ZOR_BODY(ownsSubC_32f), mulc = ZOR_BODY(ownsMulC_32f);
-    const auto mulcI = ZOR_BODY(ownsMulC_32f_I);
-    const auto mulc64 = ZOR_BODY(ownsMulC_64f);
-    const auto mulc64I = ZOR_BODY(ownsMulC_64f_I);
-    for (float v : {0.0f, -0.0f, 1.0f, -2.5f}) {
-        const auto plus_v = [v](auto x, auto) { return x + v; };
-        const auto times_v = [v](auto x, auto) { return x * (decltype(x))v; };
-        row(f, false, [&](F s, float* o, int32_t n) { addc(s[0], o, n, v); }, plus_v);
-        row(f, false, [&](F s, float* o, int32_t n) { subc(s[0], o, n, v); }, [v](float x, float) { return x - v; });
-        row(f, false, [&](F s, float* o, int32_t n) { mulc(s[0], o, n, v); }, times_v);
-        row(f, true, [&](F, float* o, int32_t n) { mulcI(o, n, v); }, times_v);
-        row(d, false, [&](D s, double* o, int32_t n) { mulc64(s[0], o, n, v); }, times_v);
-        row(d, true, [&](D, double* o, int32_t n) { mulc64I(o, n, v); }, times_v);
-    }
 }
 
 // ---- clears and integer copies ------------------------------------------------

@@ -8,7 +8,6 @@
 
 namespace {
 
-using vt::Region;
 using vt::sweep;
 using Arith = zortest::LevelTest;
 using MaxEvery = zortest::LevelTest;
@@ -99,34 +98,18 @@ TEST_P(Arith, ConstantForms) {
 // By 1 a copy and by +-0 a clear, bit for bit whatever the elements hold
 // (signalling NaNs too); subtracting +-0 a copy; in place by 1 nothing.
 TEST_P(Arith, ShortCutsForOneAndZero) {
-    const int n = 67;
-    std::vector<uint32_t> p(n);
-    for (int i = 0; i < n; ++i) p[i] = i % 3 ? 0x7f800001u + i : 0xffc00000u - i;
-    std::vector<uint64_t> q(n);
-    for (int i = 0; i < n; ++i) q[i] = i % 2 ? 0x7ff0000000000001ull + i : 0xfff8000000000000ull - i;
-    for (size_t off : {0, 4, 1}) {
-        auto check = [&](const void* pattern, size_t size, auto call, bool copies) {
-            Region rs(n * size, 0), rd(n * size, off, 2);
-            std::memcpy(rs.data(), pattern, n * size);
-            auto want = rd.raw;
-            if (copies) std::memcpy(rd.in(want), pattern, n * size);
-            else std::memset(rd.in(want), 0, n * size);
-            ASSERT_EQ(call(rs.data(), rd.data()), zorStsNoErr);
-            EXPECT_IMAGE(rd, want);
-        };
-        check(p.data(), 4, [](void* s, void* d) { return zorsMulC_32f((float*)s, (float*)d, n, 1.0f); }, true);
-        check(q.data(), 8, [](void* s, void* d) { return zorsMulC_64f((double*)s, (double*)d, n, 1.0); }, true);
-        for (float zero : {0.0f, -0.0f}) {
-            check(p.data(), 4, [&](void* s, void* d) { return zorsMulC_32f((float*)s, (float*)d, n, zero); }, false);
-            check(q.data(), 8, [&](void* s, void* d) { return zorsMulC_64f((double*)s, (double*)d, n, zero); }, false);
-            check(p.data(), 4, [&](void* s, void* d) { return zorsSubC_32f((float*)s, (float*)d, n, zero); }, true);
-            check(p.data(), 4, [&](void*, void* d) { return zorsMulC_32f_I((float*)d, n, zero); }, false);
-        }
-        Region r(n * 4, off);
-        std::memcpy(r.data(), p.data(), n * 4);
-        const auto before = r.raw;
-        ASSERT_EQ(zorsMulC_32f_I(r.as<float>(), n, 1.0f), zorStsNoErr);
-        EXPECT_IMAGE(r, before);
+    const auto f = sources<float>(1);
+    const auto d = sources<double>(1);
+    using F = const float* const*;
+    for (float v : {1.0f, 0.0f, -0.0f}) {
+        const auto mul = [&](size_t i) { return v == 1 ? f[0][i] : 0.0f; };
+        sweep<float>(f, false, 1, true, [v](F s, float* o, int32_t n) { return zorsMulC_32f(s[0], o, n, v); }, mul);
+        sweep<float>(f, true, 1, true, [v](F, float* o, int32_t n) { return zorsMulC_32f_I(o, n, v); }, mul);
+        sweep<double>(d, false, 1, true, [v](const double* const* s, double* o, int32_t n) {
+            return zorsMulC_64f(s[0], o, n, v); }, [&](size_t i) { return v == 1 ? d[0][i] : 0.0; });
+        if (v == 0)
+            sweep<float>(f, false, 1, true, [v](F s, float* o, int32_t n) { return zorsSubC_32f(s[0], o, n, v); },
+                         [&](size_t i) { return f[0][i]; });
     }
 }
 

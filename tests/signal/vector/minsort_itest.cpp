@@ -57,16 +57,6 @@ TEST_P(MinSearch, AgreesWithTheStrictScanOnEveryPath) {
     for (int offset = 0; offset < 4; ++offset) {
         for (int len : vt::lengths(1)) expect_like_model(data.data() + offset, len, "random", level);
     }
-    // The minimum at every position of a vector-path length, once and twice.
-    for (int len : {34, 35, 67, 100}) {
-        for (int at = 0; at < len; ++at) {
-            std::vector<float> v(len, 5.0f);
-            v[at] = -1.0f;
-            expect_like_model(v.data(), len, "single", level);
-            v[len - 1 - at / 2] = -1.0f;
-            expect_like_model(v.data(), len, "twice", level);
-        }
-    }
 }
 
 // Equal minima (zeros of both signs among them), NaNs and -infinity on
