@@ -40,148 +40,47 @@ constexpr Slot R1{kRow, 1}, R2E{kRowEven, 2}, R4E{kRowEven, 4}, R2{kRow, 2}, R4{
 // p: a small zero-filled area standing in for every image, record and buffer.
 #define A(T) ((T*)p)
 #define S(i) s[i]
+#define CALL(...) [=](ZoriSize r, const int32_t* s, uint8_t* p) { return __VA_ARGS__; }
 
 std::vector<Op> ops() {
     const int repl = zorBorderRepl;
     return {
-        {"AbsDiff_8u", {R1, R1, R1},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriAbsDiff_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), A(Zor8u), S(2), r);
-         }},
-        {"AbsDiff_16u", {R2E, R2E, R2E},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriAbsDiff_16u_C1R(A(Zor16u), S(0), A(Zor16u), S(1), A(Zor16u), S(2), r);
-         }},
-        {"AbsDiff_32f", {R4E, R4E, R4E},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriAbsDiff_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), A(Zor32f), S(2), r);
-         }},
-        {"AbsDiffC_32f", {R4E, R4E},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriAbsDiffC_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f);
-         }},
-        {"AddProduct_32f", {R4E, R4E, R1, R4E},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriAddProduct_32f_C1IMR(A(Zor32f), S(0), A(Zor32f), S(1), A(Zor8u), S(2),
-                                             A(Zor32f), S(3), r);
-         }},
-        {"Div_32f", {P, P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriDiv_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), A(Zor32f), S(2), r);
-         }},
-        {"DivC_32f", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriDivC_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 2.0f);
-         }},
-        {"Abs_32f", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriAbs_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r);
-         }},
-        {"Sqr_32f", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriSqr_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r);
-         }},
-        {"Div_8u_Sfs", {P, P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriDiv_8u_C1RSfs(A(Zor8u), S(0), A(Zor8u), S(1), A(Zor8u), S(2), r, 0);
-         }},
-        {"Div_16s_Sfs", {P, P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriDiv_16s_C1RSfs(A(Zor16s), S(0), A(Zor16s), S(1), A(Zor16s), S(2), r, 0);
-         }},
-        {"CompareC_32f", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriCompareC_32f_C1R(A(Zor32f), S(0), A(Zor8u), S(1), r, 0, 1.0f);
-         }},
-        {"Threshold_GT_32f", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriThreshold_GT_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f);
-         }},
-        {"Threshold_LT_32f", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriThreshold_LT_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f);
-         }},
-        {"Threshold_GTVal_32f", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriThreshold_GTVal_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f, 2.0f);
-         }},
-        {"Threshold_LTVal_32f", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriThreshold_LTVal_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f, 2.0f);
-         }},
-        {"Not_8u", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriNot_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), r);
-         }},
-        {"CopyConstBorder_8u", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriCopyConstBorder_8u_C1R(A(Zor8u), S(0), r, A(Zor8u), S(1), r, 0, 0, 7);
-         }},
-        {"CopyConstBorder_32f", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriCopyConstBorder_32f_C1R(A(Zor32f), S(0), r, A(Zor32f) + 4, S(1), r, 0, 0,
-                                                7.0f);
-         }},
-        {"CopyReplicateBorder_16u", {P, P},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriCopyReplicateBorder_16u_C1R(A(Zor16u), S(0), r, A(Zor16u) + 8, S(1), r, 0,
-                                                    0);
-         }},
-        {"FilterMedianBorder_16u", {E2, E2},
-         [repl](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriFilterMedianBorder_16u_C1R(A(Zor16u), S(0), A(Zor16u), S(1), r, {3, 3},
-                                                   (ZoriBorderType)repl, 0, p);
-         }},
-        {"FilterMedianBorder_32f", {E4, E4},
-         [repl](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriFilterMedianBorder_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, {3, 3},
-                                                   (ZoriBorderType)repl, 0, p);
-         }},
-        {"FilterBorder_8u", {P, R1},
-         [repl](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriFilterBorder_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), r, repl, A(Zor8u),
-                                            A(const ZoriFilterBorderSpec), p);
-         }},
-        {"FilterBorder_16s", {P, R2},
-         [repl](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriFilterBorder_16s_C1R(A(Zor16s), S(0), A(Zor16s), S(1), r, repl, A(Zor16s),
-                                             A(const ZoriFilterBorderSpec), p);
-         }},
-        {"FilterBorder_32f", {P, R4},
-         [repl](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriFilterBorder_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, repl, A(Zor32f),
-                                             A(const ZoriFilterBorderSpec), p);
-         }},
+        {"AbsDiff_8u", {R1, R1, R1}, CALL(zoriAbsDiff_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), A(Zor8u), S(2), r))},
+        {"AbsDiff_16u", {R2E, R2E, R2E}, CALL(zoriAbsDiff_16u_C1R(A(Zor16u), S(0), A(Zor16u), S(1), A(Zor16u), S(2), r))},
+        {"AbsDiff_32f", {R4E, R4E, R4E}, CALL(zoriAbsDiff_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), A(Zor32f), S(2), r))},
+        {"AbsDiffC_32f", {R4E, R4E}, CALL(zoriAbsDiffC_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f))},
+        {"AddProduct_32f", {R4E, R4E, R1, R4E}, CALL(zoriAddProduct_32f_C1IMR(A(Zor32f), S(0), A(Zor32f), S(1), A(Zor8u), S(2), A(Zor32f), S(3), r))},
+        {"Div_32f", {P, P, P}, CALL(zoriDiv_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), A(Zor32f), S(2), r))},
+        {"DivC_32f", {P, P}, CALL(zoriDivC_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 2.0f))},
+        {"Abs_32f", {P, P}, CALL(zoriAbs_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r))},
+        {"Sqr_32f", {P, P}, CALL(zoriSqr_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r))},
+        {"Div_8u_Sfs", {P, P, P}, CALL(zoriDiv_8u_C1RSfs(A(Zor8u), S(0), A(Zor8u), S(1), A(Zor8u), S(2), r, 0))},
+        {"Div_16s_Sfs", {P, P, P}, CALL(zoriDiv_16s_C1RSfs(A(Zor16s), S(0), A(Zor16s), S(1), A(Zor16s), S(2), r, 0))},
+        {"CompareC_32f", {P, P}, CALL(zoriCompareC_32f_C1R(A(Zor32f), S(0), A(Zor8u), S(1), r, 0, 1.0f))},
+        {"Threshold_GT_32f", {P, P}, CALL(zoriThreshold_GT_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f))},
+        {"Threshold_LT_32f", {P, P}, CALL(zoriThreshold_LT_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f))},
+        {"Threshold_GTVal_32f", {P, P}, CALL(zoriThreshold_GTVal_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f, 2.0f))},
+        {"Threshold_LTVal_32f", {P, P}, CALL(zoriThreshold_LTVal_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f, 2.0f))},
+        {"Not_8u", {P, P}, CALL(zoriNot_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), r))},
+        {"CopyConstBorder_8u", {P, P}, CALL(zoriCopyConstBorder_8u_C1R(A(Zor8u), S(0), r, A(Zor8u), S(1), r, 0, 0, 7))},
+        {"CopyConstBorder_32f", {P, P}, CALL(zoriCopyConstBorder_32f_C1R(A(Zor32f), S(0), r, A(Zor32f) + 4, S(1), r, 0, 0, 7.0f))},
+        {"CopyReplicateBorder_16u", {P, P}, CALL(zoriCopyReplicateBorder_16u_C1R(A(Zor16u), S(0), r, A(Zor16u) + 8, S(1), r, 0, 0))},
+        {"FilterMedianBorder_16u", {E2, E2}, CALL(zoriFilterMedianBorder_16u_C1R(A(Zor16u), S(0), A(Zor16u), S(1), r, {3, 3}, (ZoriBorderType)repl, 0, p))},
+        {"FilterMedianBorder_32f", {E4, E4}, CALL(zoriFilterMedianBorder_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, {3, 3}, (ZoriBorderType)repl, 0, p))},
+        {"FilterBorder_8u", {P, R1}, CALL(zoriFilterBorder_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), r, repl, A(Zor8u), A(const ZoriFilterBorderSpec), p))},
+        {"FilterBorder_16s", {P, R2}, CALL(zoriFilterBorder_16s_C1R(A(Zor16s), S(0), A(Zor16s), S(1), r, repl, A(Zor16s), A(const ZoriFilterBorderSpec), p))},
+        {"FilterBorder_32f", {P, R4}, CALL(zoriFilterBorder_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, repl, A(Zor32f), A(const ZoriFilterBorderSpec), p))},
         // A one-pixel kernel: the source row is as long as the destination's.
-        {"Filter_64f", {R8, R8},
-         [](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriFilter_64f_C1R(A(Zor64f), S(0), A(Zor64f), S(1), r, A(Zor64f), {1, 1},
-                                       {0, 0}, p);
-         }},
-        {"ErodeBorder_8u", {R1, R1},
-         [repl](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriErodeBorder_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), r, repl, 0,
-                                           A(const ZoriMorphState), p);
-         }},
-        {"DilateBorder_16u", {R2E, R2E},
-         [repl](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriDilateBorder_16u_C1R(A(Zor16u), S(0), A(Zor16u) + 8, S(1), r, repl, 0,
-                                             A(const ZoriMorphState), p);
-         }},
-        {"ErodeBorder_16s", {R2E, R2E},
-         [repl](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriErodeBorder_16s_C1R(A(Zor16s), S(0), A(Zor16s) + 8, S(1), r, repl, 0,
-                                            A(const ZoriMorphState), p);
-         }},
-        {"DilateBorder_32f", {R4E, R4E},
-         [repl](ZoriSize r, const int32_t* s, uint8_t* p) {
-             return zoriDilateBorder_32f_C1R(A(Zor32f), S(0), A(Zor32f) + 4, S(1), r, repl, 0,
-                                             A(const ZoriMorphState), p);
-         }},
+        {"Filter_64f", {R8, R8}, CALL(zoriFilter_64f_C1R(A(Zor64f), S(0), A(Zor64f), S(1), r, A(Zor64f), {1, 1}, {0, 0}, p))},
+        {"ErodeBorder_8u", {R1, R1}, CALL(zoriErodeBorder_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), r, repl, 0, A(const ZoriMorphState), p))},
+        {"DilateBorder_16u", {R2E, R2E}, CALL(zoriDilateBorder_16u_C1R(A(Zor16u), S(0), A(Zor16u) + 8, S(1), r, repl, 0, A(const ZoriMorphState), p))},
+        {"ErodeBorder_16s", {R2E, R2E}, CALL(zoriErodeBorder_16s_C1R(A(Zor16s), S(0), A(Zor16s) + 8, S(1), r, repl, 0, A(const ZoriMorphState), p))},
+        {"DilateBorder_32f", {R4E, R4E}, CALL(zoriDilateBorder_32f_C1R(A(Zor32f), S(0), A(Zor32f) + 4, S(1), r, repl, 0, A(const ZoriMorphState), p))},
     };
 }
 #undef A
 #undef S
+#undef CALL
 
 // Widths with 2^29, 2^30 and 2^31 bytes a row, one either side, for rows
 // of 1, 2, 4 and 8 bytes a pixel.

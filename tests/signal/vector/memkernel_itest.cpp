@@ -2,8 +2,9 @@
 // level (the machine's own cache answer may never lead the public calls to
 // some of them): every small length at many relative alignments, lengths
 // around each kernel's block and chunk sizes, the level's whole choice for
-// given cache sizes around its thresholds, byte-wise overlapping moves,
-// and the copy's own cache table against the runtime's.
+// given cache sizes around its thresholds, and the copy's own cache table
+// against the runtime's. (Overlapping moves are swept through the public
+// moves.)
 
 #include "vector_support.h"
 #include "zorinternal.h"
@@ -93,25 +94,6 @@ TEST_P(MemKernel, WholeChoiceForGivenCacheSizes) {
                 std::memset(rs.in(want), 0, n);
                 zero(rs.data(), n, cache);
                 ASSERT_IMAGE(rs, want) << "clear " << n << " cache " << cache << " at " << p[0];
-            }
-}
-
-// Byte-wise: every shift up to 70 either way, every length up to 200 and a
-// few larger, at a few base alignments.
-TEST_P(MemKernel, MoveWithAnyOverlap) {
-    const auto move = ZOR_BODY(ownsMove_8u);
-    std::vector<size_t> lens;
-    for (size_t n = 0; n <= 200; ++n) lens.push_back(n);
-    for (size_t n : {255, 256, 257, 1000, 4099}) lens.push_back(n);
-    for (size_t n : lens)
-        for (long shift = -70; shift <= 70; shift += (n > 200 ? 7 : 1))
-            for (size_t base : {0, 1, 6, 13}) {
-                Region r(n + 160, base, 4);
-                uint8_t* s = r.data() + 80;
-                auto want = r.raw;
-                std::memmove(r.in(want) + 80 + shift, r.in(want) + 80, n);
-                move(s, s + shift, n);
-                ASSERT_IMAGE(r, want) << "bytes " << n << " shift " << shift << " base " << base;
             }
 }
 
