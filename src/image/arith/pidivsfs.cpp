@@ -250,7 +250,6 @@ template <typename E, typename Row>
 inline ZorStatus div_rows(const typename E::T* pSrc1, int32_t src1Step, const typename E::T* pSrc2,
                           int32_t src2Step, typename E::T* pDst, int32_t dstStep, ZoriSize roi,
                           int s, Row rowFn) {
-    typedef typename E::T T;
     ZorStatus status = zorStsNoErr;
     for (int32_t y = 0; y < roi.height; ++y) {
         const ZorStatus st = rowFn(row_at(pSrc1, src1Step, y),

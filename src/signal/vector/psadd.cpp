@@ -200,10 +200,12 @@ ZOR_INTERNAL void ZOR_NAME(ownsMulC_64f_I)(Zor64f* pSrcDst, int32_t len, Zor64f 
     ZOR_NAME(ownsMulC_64f)(pSrcDst, pSrcDst, len, value);
 }
 ZOR_INTERNAL void ZOR_NAME(ownsMulC_32fc)(const Zor32fc* pSrc, Zor32fc* pDst, int32_t len, Zor32fc value) {
-    mulc_complex<vf32>(&pSrc->re, &pDst->re, len, value.re, value.im);
+    // A complex vector as its floats: no member access, the rows need not
+    // sit on an element boundary.
+    mulc_complex<vf32>((const Zor32f*)pSrc, (Zor32f*)pDst, len, value.re, value.im);
 }
 ZOR_INTERNAL void ZOR_NAME(ownsMulC_64fc)(const Zor64fc* pSrc, Zor64fc* pDst, int32_t len, Zor64fc value) {
-    mulc_complex<vf64>(&pSrc->re, &pDst->re, len, value.re, value.im);
+    mulc_complex<vf64>((const Zor64f*)pSrc, (Zor64f*)pDst, len, value.re, value.im);
 }
 
 
