@@ -22,23 +22,22 @@ TEST_P(Copy, EveryTypeEveryLengthAndPlacement) {
 }
 
 // A range moved onto itself shifted by every byte count up to 70 either
-// way: the result is the source's former content.
+// way gives the source's former content. Every move is the same byte move:
+// two element sizes suffice.
 template <typename T> void overlap(ZorStatus (*fn)(const T*, T*, int32_t)) {
     for (int len = 1; len <= 1300; len += len < 70 ? 1 : 97)
         for (long shift = -70; shift <= 70; ++shift)
             for (size_t base : {(size_t)0, (size_t)5}) {
-                const size_t bytes = len * sizeof(T);
-                Region r(bytes + 160, base, 21);
+                Region r(len * sizeof(T) + 160, base, 21);
                 uint8_t* src = r.data() + 80;
                 auto want = r.raw;
-                std::memmove(r.in(want) + 80 + shift, r.in(want) + 80, bytes);
+                std::memmove(r.in(want) + 80 + shift, r.in(want) + 80, len * sizeof(T));
                 ASSERT_EQ(fn((const T*)src, (T*)(src + shift), len), zorStsNoErr);
                 ASSERT_IMAGE(r, want) << "len " << len << " shift " << shift << " base " << base;
             }
 }
 
 TEST_P(Move, OverlapInBothDirections) {
-    // Every move is the same byte move: two element sizes suffice.
     overlap(zorsMove_32f);
     overlap(zorsMove_64fc);
 }
