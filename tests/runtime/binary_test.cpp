@@ -19,12 +19,11 @@ namespace {
 
 std::string run(const std::string& command) {
     std::string out;
-    FILE* pipe = popen(command.c_str(), "r");
-    if (!pipe) return out;
-    char buffer[4096];
-    size_t n;
-    while ((n = fread(buffer, 1, sizeof buffer, pipe)) > 0) out.append(buffer, n);
-    pclose(pipe);
+    if (FILE* pipe = popen(command.c_str(), "r")) {
+        char buffer[4096];
+        for (size_t n; (n = fread(buffer, 1, sizeof buffer, pipe)) > 0;) out.append(buffer, n);
+        pclose(pipe);
+    }
     return out;
 }
 
@@ -40,50 +39,41 @@ const std::string library = ZOR_LIBRARY_FILE;
 std::vector<std::string> public_names() {
     std::vector<std::string> names;
     std::ifstream in(ZOR_NAMES_FILE);
-    const std::regex entry(R"(^ZOR_API\((\w+)\))");
-    std::smatch m;
     for (std::string line; std::getline(in, line);)
-        if (std::regex_search(line, m, entry)) names.push_back(m[1]);
+        if (line.rfind("ZOR_API(", 0) == 0) names.push_back(line.substr(8, line.find(')') - 8));
     return names;
 }
 
-// Every symbol of the library's full symbol table: name -> (address, type letter).
+// name -> (address, type letter) from nm's listing.
 struct Symbol {
     uint64_t address;
     char type;
 };
-const std::map<std::string, Symbol>& symbols() {
-    static std::map<std::string, Symbol> table = [] {
-        std::map<std::string, Symbol> t;
-        for (const std::string& line : lines(run("nm " + library))) {
-            std::istringstream in(line);
-            std::string address, type, name;
-            if (in >> address >> type >> name) t[name] = {std::stoull(address, nullptr, 16), type[0]};
-        }
-        return t;
-    }();
+std::map<std::string, Symbol> symbols(const std::string& options) {
+    std::map<std::string, Symbol> table;
+    for (const std::string& line : lines(run("nm " + options + " " + library))) {
+        std::istringstream in(line);
+        std::string address, type, name;
+        if (in >> address >> type >> name) table[name] = {std::stoull(address, nullptr, 16), type[0]};
+    }
     return table;
 }
 
 const char* const services[] = {
-    "zorInit", "zorSafeInit", "zorSetCpuFeatures", "zorJumpIndexForMergedLibs",
-    "my_init", "zorGetCpuFeatures", "zorGetEnabledCpuFeatures", "zorSetCpuFeaturesMask", "zor_get_cpuid",
-    "zor_max_cpuid_input", "zor_has_cpuid", "zor_is_GenuineTarvo", "zorGetMaxCacheSizeB",
-    "zor_get_cache_line_size", "zorGetNumCoresOnDie", "zor_get_cores_on_die", "zor_has_rdtsc",
-    "zor_is_mmx_extension", "zor_is_ssx_extension", "zor_is_wni_extension",
-    "zor_is_htt_extension", "zor_is_pni_extension", "zor_is_x8664_extension",
+    "zorInit", "zorSafeInit", "zorSetCpuFeatures", "zorJumpIndexForMergedLibs", "my_init", "zorGetCpuFeatures",
+    "zorGetEnabledCpuFeatures", "zorSetCpuFeaturesMask", "zor_get_cpuid", "zor_max_cpuid_input", "zor_has_cpuid",
+    "zor_is_GenuineTarvo", "zorGetMaxCacheSizeB", "zor_get_cache_line_size", "zorGetNumCoresOnDie",
+    "zor_get_cores_on_die", "zor_has_rdtsc", "zor_is_mmx_extension", "zor_is_ssx_extension",
+    "zor_is_wni_extension", "zor_is_htt_extension", "zor_is_pni_extension", "zor_is_x8664_extension",
     "zor_is_mni_extension", "zor_is_sse41_extension", "zor_is_sse42_extension", "zor_is_movbe",
-    "zor_is_avx_extension", "zor_is_avx512_extension", "zor_get_quindle_ident",
-    "zorGetStatusString",
-    "zorMalloc", "zorFree",
-    "zorConstantOfNAN_64f", "zorConstantOfINF_64f", "zorConstantOfINF_NEG_64f",
-    "zorConstantOfNAN_32f", "zorConstantOfINF_32f", "zorConstantOfINF_NEG_32f",
-    "zorGetCpuClocks", "zor_get_quindle_counter", "zorStartTsc", "zorStopTsc", "zorStartTscp",
-    "zorStopTscp", "zorGetNumThreads", "zorSetNumThreads", "ps_get_cw_fpu",
-    "ps_set_cw_fpu", "ps_get_sw_fpu", "ps_clear_fpu", "ps_get_ssx", "ps_set_ssx",
-    "ps_destroy_ssx", "zor_set_cw_ssx", "zor_set_rc_ssx", "zor_clear_ssx", "zor_tst_daz_ssx",
-    "zor_control87", "zor_status87", "zor_clear87", "zor_set_rcpc_fpu", "zor_set_cw_fpu",
-    "zor_isnan", "zor_finite", "zorFpuSsx4TS",
+    "zor_is_avx_extension", "zor_is_avx512_extension", "zor_get_quindle_ident", "zorGetStatusString",
+    "zorMalloc", "zorFree", "zorConstantOfNAN_64f", "zorConstantOfINF_64f", "zorConstantOfINF_NEG_64f",
+    "zorConstantOfNAN_32f", "zorConstantOfINF_32f", "zorConstantOfINF_NEG_32f", "zorGetCpuClocks",
+    "zor_get_quindle_counter", "zorStartTsc", "zorStopTsc", "zorStartTscp", "zorStopTscp", "zorGetNumThreads",
+    "zorSetNumThreads", "ps_get_cw_fpu", "ps_set_cw_fpu", "ps_get_sw_fpu", "ps_clear_fpu", "ps_get_ssx",
+    "ps_set_ssx", "ps_destroy_ssx", "zor_set_cw_ssx", "zor_set_rc_ssx", "zor_clear_ssx", "zor_tst_daz_ssx",
+    "zor_control87", "zor_status87", "zor_clear87", "zor_set_rcpc_fpu", "zor_set_cw_fpu", "zor_isnan",
+    "zor_finite", "zorFpuSsx4TS",
 };
 
 // The public names, each level's body of them and the services: the own*
@@ -95,16 +85,9 @@ TEST(Binary, ExportsExactlyTheIntendedNames) {
         for (const zortest::Level& level : zortest::all_levels())
             expected.insert(std::string(level.name) + "_" + name);
     }
-    std::set<std::string> exported;
-    for (const std::string& line : lines(run("nm -D --defined-only " + library))) {
-        std::istringstream in(line);
-        std::string address, type, name;
-        if (in >> address >> type >> name) exported.insert(name);
-    }
-    for (const std::string& name : exported)
-        EXPECT_TRUE(expected.count(name)) << "unexpected export " << name;
-    for (const std::string& name : expected)
-        EXPECT_TRUE(exported.count(name)) << "missing export " << name;
+    const auto exported = symbols("-D --defined-only");
+    for (const auto& [name, symbol] : exported) EXPECT_TRUE(expected.count(name)) << "unexpected export " << name;
+    for (const std::string& name : expected) EXPECT_TRUE(exported.count(name)) << "missing export " << name;
     EXPECT_NE(run("readelf -d " + library).find("Library soname: [libzor.so.1]"), std::string::npos);
 }
 
@@ -155,19 +138,18 @@ TEST(Binary, LevelsNeverReachEachOther) {
         EXPECT_GT(checked, 0u) << level;
     }
     // Inside a level's code only its own prefixed entries are global.
-    for (const auto& [name, symbol] : symbols()) {
+    for (const auto& [name, symbol] : symbols(""))
         for (const auto& [level, own] : ranges)
             for (const Range& r : own)
                 if (r.contains(symbol.address) && isupper((unsigned char)symbol.type))
                     EXPECT_EQ(name.rfind(level + "_", 0), 0u) << name << " is global in " << level;
-    }
 }
 
 TEST(Binary, StubsAndTables) {
     Dl_info info;
     ASSERT_NE(dladdr((void*)&zorInit, &info), 0);
     const uint64_t base = (uint64_t)info.dli_fbase;
-    const auto& table = symbols();
+    const auto table = symbols("");
     for (const std::string& name : public_names()) {
         ASSERT_TRUE(table.count(name) && table.count("in_" + name) && table.count("jmp_" + name)) << name;
         EXPECT_EQ(table.at(name).address % 32, 0u) << name;
