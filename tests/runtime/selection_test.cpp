@@ -92,6 +92,12 @@ TEST(Cpu, DetectedWordAndRegisters) {
         if (c.word != getinfo) r[1] &= 0x00ffffffu;  // leaf 1: APIC id
         EXPECT_EQ(std::memcmp(r, c.want.r, 16), 0) << std::hex << c.word << " leaf " << c.leaf;
     }
+    for (uint32_t leaf : {0u, 1u, 7u, 0x80000000u}) {
+        uint32_t raw[4];
+        EXPECT_EQ(zor_get_cpuid(raw, leaf, 0), 0);
+        raw[1] &= leaf == 1 ? 0x00ffffffu : ~0u;
+        EXPECT_EQ(std::memcmp(raw, cpuid(leaf).r, 16), 0) << std::hex << leaf;
+    }
 }
 
 TEST(Cpu, SingleBitTestsAndIdentity) {
