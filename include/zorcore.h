@@ -34,11 +34,6 @@ void zorSafeInit(void);
  * enabled mask the detected word for the rest of the process. */
 ZorStatus zorSetCpuFeatures(uint64_t features);
 
-/* The steps below zorSetCpuFeatures: validation against the detected word,
- * and the row table from a word to a level (may add bits to *features). */
-ZorStatus ownSetCpuFeaturesAndIdx(uint64_t features, int32_t* index);
-ZorStatus ownFeaturesToIdx(uint64_t* features, int32_t* index);
-
 /* Load-time hook; its whole body is zorInit(). */
 void my_init(void);
 
@@ -53,16 +48,7 @@ uint64_t zorGetEnabledCpuFeatures(void);
 /* Stores the enabled mask only; the level does not move. Always 0. */
 ZorStatus zorSetCpuFeaturesMask(uint64_t features);
 
-int32_t ownSetFeatureMask(uint64_t features);
-/* 1 if all given bits are enabled (so 1 for 0). */
-int32_t ownGetFeature(uint64_t features);
-/* Detection, cached for the process; 1 on success. */
-int32_t ownGetMaskFeatures(uint64_t* features);
-/* The enabled mask becomes the detected word. */
-void ownMaskIsFeatures(void);
-
 /* CPUID: regs receive EAX, EBX, ECX, EDX. */
-void ownGetReg(uint32_t regs[4], uint32_t leaf, uint32_t subleaf);
 int32_t zor_get_cpuid(uint32_t regs[4], uint32_t leaf, uint32_t subleaf);
 uint32_t zor_max_cpuid_input(void);
 int32_t zor_has_cpuid(void);
@@ -165,7 +151,6 @@ uint64_t zorStopTscp(void);
 
 /* The library is single-threaded: the count is always 1, and
  * zorGetNumThreads returns 1 (zorStsNoOperation). */
-int32_t ownGetNumThreads(void);
 ZorStatus zorGetNumThreads(int32_t* pNumThr);
 ZorStatus zorSetNumThreads(int32_t numThr);
 

@@ -16,7 +16,7 @@ inline void take(uint64_t& word, uint32_t reg, int bit, uint64_t value) {
 
 }  // namespace
 
-ZOR_EXPORT int32_t ownGetMaskFeatures(uint64_t* features) {
+int32_t ownGetMaskFeatures(uint64_t* features) {
     if (ownFeaturesAreValid) {
         *features = ownFeatures;
         return 1;
@@ -85,16 +85,16 @@ ZOR_EXPORT int32_t ownGetMaskFeatures(uint64_t* features) {
     return 1;
 }
 
-ZOR_EXPORT void ownMaskIsFeatures(void) {
+void ownMaskIsFeatures(void) {
     ownFeatures = ownFeaturesMask;
     ownFeaturesAreValid = 1;
 }
 
-ZOR_EXPORT int32_t ownSetFeatureMask(uint64_t features) {
+int32_t ownSetFeatureMask(uint64_t features) {
     ownFeaturesMask = features;
     return 1;
 }
 
-ZOR_EXPORT int32_t ownGetFeature(uint64_t features) {
+int32_t ownGetFeature(uint64_t features) {
     return (ownFeaturesMask & features) == features ? 1 : 0;
 }

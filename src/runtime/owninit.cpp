@@ -1,5 +1,6 @@
 // From a feature word to a level index. General registers only.
 #include "runtime_internal.h"
+#include "zor_levels.h"
 
 namespace {
 
@@ -14,22 +15,13 @@ struct LevelRow {
 };
 
 // First matching row wins; AVX-512 with BW/DQ/VL is preferred over ER/PF.
-const LevelRow levelRows[] = {
-    {0x7300000, 6, 0x73081df},
-    {0xf00000, 5, 0xf081df},
-    {0x8000, 4, 0x81df},
-    {0x100, 3, 0x1df},
-    {0x80, 2, 0xdf},
-    {0x40, 1, 0x5f},
-    {0x20, 1, 0x3f},
-    {0x10, 1, 0x1f},
-    {0x8, 0, 0xf},
-    {0x4, 0, 0x7},
-};
+#define ZOR_ROW(test, index, required) {test, index, required},
+const LevelRow levelRows[] = {ZOR_SELECT_ROWS(ZOR_ROW)};
+#undef ZOR_ROW
 
 }  // namespace
 
-ZOR_EXPORT ZorStatus ownFeaturesToIdx(uint64_t* features, int32_t* index) {
+ZorStatus ownFeaturesToIdx(uint64_t* features, int32_t* index) {
     uint64_t f = *features;
     for (const LevelRow& row : levelRows) {
         if ((f & row.test) == row.test) {
@@ -43,7 +35,7 @@ ZOR_EXPORT ZorStatus ownFeaturesToIdx(uint64_t* features, int32_t* index) {
     return zorStsNotSupportedCpu;
 }
 
-ZOR_EXPORT ZorStatus ownSetCpuFeaturesAndIdx(uint64_t features, int32_t* index) {
+ZorStatus ownSetCpuFeaturesAndIdx(uint64_t features, int32_t* index) {
     uint64_t f = features;
     ZorStatus status = zorStsNoErr;
     *index = 0;

@@ -8,6 +8,25 @@
 // Services are exported by this mark; everything else stays hidden.
 #define ZOR_EXPORT extern "C" __attribute__((visibility("default")))
 
+// Internal steps, hidden from the library's users (the build hides
+// every name it does not export).
+extern "C" {
+// Below zorSetCpuFeatures: validation against the detected word, and the
+// row table from a word to a level (may add bits to *features).
+ZorStatus ownSetCpuFeaturesAndIdx(uint64_t features, int32_t* index);
+ZorStatus ownFeaturesToIdx(uint64_t* features, int32_t* index);
+int32_t ownSetFeatureMask(uint64_t features);
+// 1 if all given bits are enabled (so 1 for 0).
+int32_t ownGetFeature(uint64_t features);
+// Detection, cached for the process; 1 on success.
+int32_t ownGetMaskFeatures(uint64_t* features);
+// The enabled mask becomes the detected word.
+void ownMaskIsFeatures(void);
+// CPUID: regs receive EAX, EBX, ECX, EDX.
+void ownGetReg(uint32_t regs[4], uint32_t leaf, uint32_t subleaf);
+int32_t ownGetNumThreads(void);
+}
+
 // Process-wide feature words (owncpufeatures.cpp).
 extern "C" uint64_t ownFeatures;
 extern "C" int32_t ownFeaturesAreValid;

@@ -49,7 +49,7 @@ ZOR_EXPORT uint64_t zorStopTscp(void) {
     return t;
 }
 
-ZOR_EXPORT int32_t ownGetNumThreads(void) { return 1; }
+int32_t ownGetNumThreads(void) { return 1; }
 
 ZOR_EXPORT ZorStatus zorGetNumThreads(int32_t* pNumThr) {
     if (!pNumThr) return zorStsNullPtrErr;

@@ -20,7 +20,7 @@ uint32_t max_extended_leaf() {
 
 }  // namespace
 
-ZOR_EXPORT void ownGetReg(uint32_t regs[4], uint32_t leaf, uint32_t subleaf) {
+void ownGetReg(uint32_t regs[4], uint32_t leaf, uint32_t subleaf) {
     own_cpuid(regs, leaf, subleaf);
 }
 

@@ -7,7 +7,7 @@
 #include <stddef.h>
 #include <stdint.h>
 #include <string.h>
-
+#include "variant.h"  // first: the level frame the rest stands on
 #include "simd.h"
 
 ZOR_BEGIN

@@ -9,7 +9,7 @@
 
 #include <stddef.h>
 #include <stdint.h>
-
+#include "variant.h"  // first: the level frame the rest stands on
 #include "border_type.h"
 
 ZOR_BEGIN

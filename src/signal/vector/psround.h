@@ -2,11 +2,11 @@
 // (a*c - b*d, a*d + b*c) into fused multiply-adds on the FMA levels even
 // with contraction off, which would make those levels differ from the
 // others in the last bit. A product passed through rounded() is opaque to
-// the compiler, so it is rounded on its own before the sum. Include after
-// variant.h.
+// the compiler, so it is rounded on its own before the sum. It stands on
+// the level frame of variant.h.
 #ifndef ZOR_PSROUND_H
 #define ZOR_PSROUND_H
-
+#include "variant.h"  // first: the level frame the rest stands on
 ZOR_BEGIN
 
 template <typename T> inline T rounded(T x) {
