@@ -1,5 +1,5 @@
 // The exported border copies through the public stubs, every level forced
-// in turn, against the model of border_harness.h; and the shared test of
+// in turn, against the shared border model; and the shared test of
 // border-type values.
 #include "border_harness.h"
 #include "border_type.h"
@@ -25,40 +25,11 @@ const std::vector<Form>& forms() {
 
 using BorderPublic = zortest::LevelTest;
 
-TEST_P(BorderPublic, FramesLikeTheModel) {
-    const std::vector<Geometry> cases = geometries();
-    for (const Form& f : forms()) {
-        int seed = 0;
-        for (const Geometry& g : cases)
-            ASSERT_NO_FATAL_FAILURE(run_copy(f, GetParam().index, g, ++seed));
-    }
-}
-
-TEST_P(BorderPublic, ReplicateWithEqualPointersFramesInPlace) {
-    const std::vector<Geometry> cases = geometries();
-    for (const Form& f : forms()) {
-        if (f.kind != kRepl) continue;
-        int seed = 0;
-        for (const Geometry& g : cases)
-            ASSERT_NO_FATAL_FAILURE(run_in_place(f, GetParam().index, g, ++seed, true));
-    }
-}
+// Replicate with equal pointers frames in place.
+TEST_P(BorderPublic, FramesLikeTheModel) { run_sweep(forms(), GetParam().index); }
 
 TEST_P(BorderPublic, ChecksInOrderAndWritesNothingOnError) {
     for (const Form& f : forms()) run_checks(f, GetParam().index);
-}
-
-// Same sizes and no border: a plain copy, and in place nothing at all.
-TEST_P(BorderPublic, NoBorderIsAPlainCopy) {
-    const Zor16u src[2][3] = {{1, 2, 3}, {4, 5, 6}};
-    Zor16u dst[2][4] = {{9, 9, 9, 9}, {9, 9, 9, 9}};
-    ASSERT_EQ(zoriCopyConstBorder_16u_C1R(&src[0][0], 6, {3, 2}, &dst[0][0], 8, {3, 2}, 0, 0, 7),
-              zorStsNoErr);
-    const Zor16u want[2][4] = {{1, 2, 3, 9}, {4, 5, 6, 9}};
-    EXPECT_EQ(memcmp(dst, want, sizeof dst), 0);
-    ASSERT_EQ(zoriCopyReplicateBorder_16u_C1R(&dst[0][0], 8, {3, 2}, &dst[0][0], 8, {3, 2}, 0, 0),
-              zorStsNoErr);
-    EXPECT_EQ(memcmp(dst, want, sizeof dst), 0);
 }
 
 ZOR_INSTANTIATE_LEVELS(BorderPublic);
