@@ -179,9 +179,9 @@ inline void run_copy(const Form& f, int level, const Geometry& g, int seed) {
           value.data(), false);
     const Args a{src.ptr(), src.step, {g.srcW, g.srcH}, dst.ptr(), dst.step, {g.dstW(), g.dstH()},
                  g.top,     g.left,   value.data()};
-    ASSERT_EQ(f.copy(level, a), zorStsNoErr) << f.name << " " << describe(g);
-    ASSERT_TRUE(zortest::same_bytes(src, srcBefore)) << f.name << " wrote its source, " << describe(g);
-    ASSERT_TRUE(zortest::same_bytes(dst, want)) << f.name << " " << describe(g);
+    ASSERT_EQ(f.copy(level, a), zorStsNoErr);
+    ASSERT_TRUE(zortest::same_bytes(src, srcBefore)) << "wrote its source";
+    ASSERT_TRUE(zortest::same_bytes(dst, want));
 }
 
 // In place, through the in-place form or through the copying form with
@@ -198,9 +198,8 @@ inline void run_in_place(const Form& f, int level, const Geometry& g, int seed,
     const ZorStatus status =
         equalPointers ? f.copy(level, {roi, -7, s, roi, im.step, d, g.top, g.left, nullptr})
                       : f.inPlace(level, roi, im.step, s, d, g.top, g.left);
-    const char* how = equalPointers ? " (pSrc == pDst) " : " (in place) ";
-    ASSERT_EQ(status, zorStsNoErr) << f.name << how << describe(g);
-    ASSERT_TRUE(zortest::same_bytes(im, want)) << f.name << how << describe(g);
+    ASSERT_EQ(status, zorStsNoErr) << (equalPointers ? "pSrc == pDst" : "in place");
+    ASSERT_TRUE(zortest::same_bytes(im, want)) << (equalPointers ? "pSrc == pDst" : "in place");
 }
 
 // Every form over every frame: the copy, then in place by the form the
@@ -210,6 +209,7 @@ inline void run_sweep(const std::vector<Form>& forms, int level) {
     for (const Form& f : forms) {
         int seed = 0;
         for (const Geometry& g : frames) {
+            SCOPED_TRACE(std::string(f.name) + " " + describe(g));
             ASSERT_NO_FATAL_FAILURE(run_copy(f, level, g, ++seed));
             if (f.kind == kConst) continue;
             const bool equal = !f.inPlace || seed % 2;
