@@ -168,6 +168,24 @@
 #  define ZOR_SQR_WORKING_SET 0
 #endif
 
+/* Per-level rules of particular operations, named once here (they are
+ * facts of the levels, not instruction sets):
+ *   ZOR_FILTER_32F_SCALAR  the general filter takes its scalar path, even
+ *                          and odd taps summed apart, for all 32f data
+ *   ZOR_FILTER_REGS_TAPS   on the AVX levels, integer kernels of up to this
+ *                          many taps keep every sum in registers (where the
+ *                          turn lies was measured per level at 1920x1080) */
+#if defined(ZOR_LEVEL_m7)
+#  define ZOR_FILTER_32F_SCALAR 1
+#else
+#  define ZOR_FILTER_32F_SCALAR 0
+#endif
+#if defined(ZOR_LEVEL_l9)
+#  define ZOR_FILTER_REGS_TAPS (1 << 30)
+#else
+#  define ZOR_FILTER_REGS_TAPS 9
+#endif
+
 #define ZOR_PASTE_(a, b) a##_##b
 #define ZOR_PASTE(a, b) ZOR_PASTE_(a, b)
 /* ZOR_NAME(zoriAdd_32f_C1R) is e9_zoriAdd_32f_C1R in the e9 build. */

@@ -95,6 +95,48 @@ inline bool is_aligned(const void* p, uintptr_t a) { return ((uintptr_t)p & (a -
 
 namespace simd {
 
+// ---- row tails and fused arithmetic -------------------------------------------
+
+// The first n lanes (0 <= n <= lanes) at p, the others zero: a row's
+// tail. Levels with masked tails load just those lanes of 4-byte
+// elements; the others copy them.
+template <typename V> inline V load_n(const void* p, int n) {
+    typedef typename Lanes<V>::Element E;
+#if ZOR_HAS_MASKED_TAILS
+    if constexpr (sizeof(V) == 64 && sizeof(E) == 4)
+        return (V)_mm512_maskz_loadu_ps((__mmask16)((1u << n) - 1u), p);
+#endif
+    V v = V{};
+    memcpy(&v, p, (size_t)n * sizeof(E));
+    return v;
+}
+
+// The first n lanes of v to p; nothing past them is touched.
+template <typename V> inline void store_n(void* p, V v, int n) {
+    typedef typename Lanes<V>::Element E;
+#if ZOR_HAS_MASKED_TAILS
+    if constexpr (sizeof(V) == 64 && sizeof(E) == 4) {
+        _mm512_mask_storeu_ps(p, (__mmask16)((1u << n) - 1u), (__m512)v);
+        return;
+    }
+#endif
+    memcpy(p, &v, (size_t)n * sizeof(E));
+}
+
+#if ZOR_HAS_FMA
+// a * b + c of float lanes, rounded once. Nothing fuses by itself (the
+// build keeps -ffp-contract=off): call this where an operation's rule
+// says that a level fuses.
+template <typename V> inline V fma(V a, V b, V c) {
+    static_assert(std::is_same<typename Lanes<V>::Element, float>::value, "float lanes");
+    if constexpr (sizeof(V) == 16) return (V)_mm_fmadd_ps((__m128)a, (__m128)b, (__m128)c);
+    if constexpr (sizeof(V) == 32) return (V)_mm256_fmadd_ps((__m256)a, (__m256)b, (__m256)c);
+#if ZOR_HAS_AVX512
+    if constexpr (sizeof(V) == 64) return (V)_mm512_fmadd_ps((__m512)a, (__m512)b, (__m512)c);
+#endif
+}
+#endif
+
 }  // namespace simd
 }  // namespace ZOR_NS
 

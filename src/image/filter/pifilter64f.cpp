@@ -23,26 +23,8 @@ namespace {
 
 using simd::vf64;
 constexpr int kLanes = simd::Lanes<vf64>::count;
-
-// Rows may start anywhere (odd steps), so memory is only touched through
-// memcpy-sized accesses that carry no alignment promise.
-inline double ld(const char* p) {
-    double v;
-    memcpy(&v, p, sizeof v);
-    return v;
-}
-inline void st(char* p, double v) {
-    memcpy(p, &v, sizeof v);
-}
-inline vf64 vld(const char* p) {
-    return simd::load<vf64>(p);
-}
-// Lane by lane, not as 0 + x, which would turn a -0 tap into +0.
-inline vf64 splat(double x) {
-    vf64 v;
-    for (int i = 0; i < kLanes; ++i) v[i] = x;
-    return v;
-}
+// Rows may start anywhere (odd steps): memory is touched only through the
+// vector layer's loads and stores, which carry no alignment promise.
 
 // A run of four equal taps, as the column form lays them out in the work
 // buffer, as one vector of this level.
@@ -50,7 +32,7 @@ inline vf64 tap_run(const char* p) {
 #if ZOR_VECTOR_BYTES == 64
     return (vf64)_mm512_broadcast_f64x4(_mm256_loadu_pd((const double*)p));
 #else
-    return vld(p);
+    return simd::load<vf64>(p);
 #endif
 }
 
@@ -61,14 +43,14 @@ struct KernelTaps {
     const double* last;
     ptrdiff_t kw;
     double at(ptrdiff_t r, int k) const { return last[-(r * kw + k)]; }
-    vf64 vec(ptrdiff_t r, int k) const { return splat(at(r, k)); }
+    vf64 vec(ptrdiff_t r, int k) const { return simd::broadcast<vf64>(at(r, k)); }
 };
 
 // Column taps from the work buffer: 32 bytes per kernel row, flipped, so
 // the loop reads forward.
 struct BufferTaps {
     const char* buf;
-    double at(ptrdiff_t r, int) const { return ld(buf + r * 32); }
+    double at(ptrdiff_t r, int) const { return simd::load<double>(buf + r * 32); }
     vf64 vec(ptrdiff_t r, int) const { return tap_run(buf + r * 32); }
 };
 
@@ -88,15 +70,16 @@ int group_vec(const char* s, ptrdiff_t srcStep, char* d, int x, int width, Taps 
             const vf64 t = taps.vec(0, 0);
             #pragma GCC unroll 16
             for (int u = 0; u < U; ++u) {
-                const vf64 p = t * vld(sx + u * kLanes * 8);
-                acc[u] = Add ? vld(dx + u * kLanes * 8) + p : p;
+                const vf64 p = t * simd::load<vf64>(sx + u * kLanes * 8);
+                acc[u] = Add ? simd::load<vf64>(dx + u * kLanes * 8) + p : p;
             }
         }
         #pragma GCC unroll 16
         for (int k = 1; k < G; ++k) {
             const vf64 t = taps.vec(0, k);
             #pragma GCC unroll 16
-            for (int u = 0; u < U; ++u) acc[u] = acc[u] + t * vld(sx + (k + u * kLanes) * 8);
+            for (int u = 0; u < U; ++u)
+                acc[u] = acc[u] + t * simd::load<vf64>(sx + (k + u * kLanes) * 8);
         }
         for (int r = 1; r < kh; ++r) {
             const char* sr = sx + r * srcStep;
@@ -104,7 +87,8 @@ int group_vec(const char* s, ptrdiff_t srcStep, char* d, int x, int width, Taps 
             for (int k = 0; k < G; ++k) {
                 const vf64 t = taps.vec(r, k);
                 #pragma GCC unroll 16
-                for (int u = 0; u < U; ++u) acc[u] = acc[u] + t * vld(sr + (k + u * kLanes) * 8);
+                for (int u = 0; u < U; ++u)
+                    acc[u] = acc[u] + t * simd::load<vf64>(sr + (k + u * kLanes) * 8);
             }
         }
         #pragma GCC unroll 16
@@ -119,16 +103,16 @@ void group_row(const char* s, ptrdiff_t srcStep, char* d, int width, Taps taps, 
     x = group_vec<G, Add, 1>(s, srcStep, d, x, width, taps, kh);
     for (; x < width; ++x) {
         const char* sx = s + (ptrdiff_t)x * 8;
-        const double p = taps.at(0, 0) * ld(sx);
-        double a = Add ? ld(d + (ptrdiff_t)x * 8) + p : p;
+        const double p = taps.at(0, 0) * simd::load<double>(sx);
+        double a = Add ? simd::load<double>(d + (ptrdiff_t)x * 8) + p : p;
         #pragma GCC unroll 16
-        for (int k = 1; k < G; ++k) a = a + taps.at(0, k) * ld(sx + k * 8);
+        for (int k = 1; k < G; ++k) a = a + taps.at(0, k) * simd::load<double>(sx + k * 8);
         for (int r = 1; r < kh; ++r) {
             const char* sr = sx + r * srcStep;
             #pragma GCC unroll 16
-            for (int k = 0; k < G; ++k) a = a + taps.at(r, k) * ld(sr + k * 8);
+            for (int k = 0; k < G; ++k) a = a + taps.at(r, k) * simd::load<double>(sr + k * 8);
         }
-        st(d + (ptrdiff_t)x * 8, a);
+        simd::store(d + (ptrdiff_t)x * 8, a);
     }
 }
 
@@ -193,7 +177,7 @@ inline vf64 reversed(vf64 v) {
 
 // Flipped taps j .. j + kLanes - 1; `end` is the kernel's last element.
 inline vf64 flipped(const double* end, ptrdiff_t j) {
-    return reversed(vld((const char*)(end - j - (kLanes - 1))));
+    return reversed(simd::load<vf64>((const char*)(end - j - (kLanes - 1))));
 }
 
 // Partial sums over the full blocks for the P pixels from s on, into
@@ -205,7 +189,7 @@ void row_long_sums(const char* s, const double* end, ptrdiff_t blocks, double* s
     for (int v = 0; v < kSumVectors; ++v) {
         const vf64 t = flipped(end, v * kLanes);
         #pragma GCC unroll 16
-        for (int p = 0; p < P; ++p) acc[p][v] = t * vld(s + (p + v * kLanes) * 8);
+        for (int p = 0; p < P; ++p) acc[p][v] = t * simd::load<vf64>(s + (p + v * kLanes) * 8);
     }
     for (ptrdiff_t b = 1; b < blocks; ++b) {
         const char* sb = s + b * 16 * 8;
@@ -213,7 +197,8 @@ void row_long_sums(const char* s, const double* end, ptrdiff_t blocks, double* s
         for (int v = 0; v < kSumVectors; ++v) {
             const vf64 t = flipped(end, b * 16 + v * kLanes);
             #pragma GCC unroll 16
-            for (int p = 0; p < P; ++p) acc[p][v] = acc[p][v] + t * vld(sb + (p + v * kLanes) * 8);
+            for (int p = 0; p < P; ++p)
+                acc[p][v] = acc[p][v] + t * simd::load<vf64>(sb + (p + v * kLanes) * 8);
         }
     }
     #pragma GCC unroll 16
@@ -244,14 +229,15 @@ void filter_row_long(const Image& im, const double* kernel, int kw) {
             for (int i = 0; i < n; ++i, ++x) {
                 double* p = sums + i * 16;
                 const char* sr = s + ((ptrdiff_t)x + blocks * 16) * 8;
-                for (int t = 0; t < rest; ++t) p[t] = p[t] + fr[-t] * ld(sr + t * 8);
+                for (int t = 0; t < rest; ++t)
+                    p[t] = p[t] + fr[-t] * simd::load<double>(sr + t * 8);
                 #pragma GCC unroll 16
                 for (int k = 0; k < 8; ++k) p[k] = p[k] + p[k + 8];
                 #pragma GCC unroll 16
                 for (int k = 0; k < 4; ++k) p[k] = p[k] + p[k + 4];
                 #pragma GCC unroll 16
                 for (int k = 0; k < 2; ++k) p[k] = p[k] + p[k + 2];
-                st(d + (ptrdiff_t)x * 8, p[0] + p[1]);
+                simd::store(d + (ptrdiff_t)x * 8, p[0] + p[1]);
             }
         }
     }
@@ -338,7 +324,8 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriFilter_64f_C1R)(const Zor64f* pSrc, int32_t src
     if (kw == 1) {
         if (kh >= 3 && width >= 16 && pBuffer) {
             for (int32_t r = 0; r < kh; ++r)
-                for (int i = 0; i < 4; ++i) st((char*)pBuffer + (ptrdiff_t)r * 32 + i * 8, pKernel[kh - 1 - r]);
+                for (int i = 0; i < 4; ++i)
+                    simd::store((char*)pBuffer + (ptrdiff_t)r * 32 + i * 8, pKernel[kh - 1 - r]);
             filter_column(im, BufferTaps{(const char*)pBuffer}, kh);
         } else {
             filter_column(im, KernelTaps{pKernel + kh - 1, 1}, kh);

@@ -100,7 +100,7 @@ void scalar(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, i
 
 // ---- path choice per level ---------------------------------------------------
 
-#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_n8) || defined(ZOR_LEVEL_y8)
+#if !ZOR_HAS_AVX
 
 template <typename T>
 inline void run_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,
@@ -113,7 +113,7 @@ inline void run_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int3
 
 inline void run_flt(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
                     int32_t h, const Record& s, float*) {
-#if defined(ZOR_LEVEL_m7)
+#if ZOR_FILTER_32F_SCALAR
     scalar<Zor32f, true>(src, srcStep, dst, dstStep, w, h, s);
 #else
     if (w > s.kernelWidth + 8)
@@ -136,7 +136,7 @@ inline void run_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int3
 
 inline void run_flt(const Zor32f* src, int32_t srcStep, Zor32f* dst, int32_t dstStep, int32_t w,
                     int32_t h, const Record& s, float* work) {
-#if defined(ZOR_LEVEL_n0) || defined(ZOR_LEVEL_k0)
+#if ZOR_HAS_MASKED_TAILS
     // One masked kernel for every width.
     vec_avx(src, srcStep, dst, dstStep, w, h, s, work);
 #else

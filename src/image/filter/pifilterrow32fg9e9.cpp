@@ -11,8 +11,7 @@
 // and above use fused multiply-add, so their last bit may differ from e9.
 #include "variant.h"
 
-#if defined(ZOR_LEVEL_e9) || defined(ZOR_LEVEL_l9) || defined(ZOR_LEVEL_n0) || \
-    defined(ZOR_LEVEL_k0)
+#if ZOR_HAS_AVX
 
 #include <immintrin.h>
 #include <string.h>
@@ -24,66 +23,74 @@ ZOR_BEGIN
 namespace filt {
 namespace {
 
-// ---- per-level vector helpers -----------------------------------------------------
+// ---- pixels in and out of float vectors ----------------------------------------------
+
+typedef simd::vf32 vf;
+constexpr int VL = simd::Lanes<vf>::count;
+// A row's last partial vector goes under a mask, or (without masked
+// tails) the last whole vector is redone.
+constexpr bool kMasked = ZOR_HAS_MASKED_TAILS;
+
+// t * v + a: fused where the level has it (l9 and above), else rounded
+// twice; this is what makes the AVX2 levels' last bit differ from e9's.
+inline vf madd(vf t, vf v, vf a) {
+#if ZOR_HAS_FMA
+    return simd::fma(t, v, a);
+#else
+    return t * v + a;
+#endif
+}
+
+// 16s on AVX2 and above multiplies pixels standing in the upper half of a
+// lane by the record's table of taps scaled by 2^-16; the product is the
+// same as the plain one, both being exact powers of two apart.
+constexpr bool kScaled16s = ZOR_HAS_AVX2;
 
 #if ZOR_VECTOR_BYTES == 32
 
-typedef __m256 vf;
-constexpr int VL = 8;
-constexpr bool kMasked = false;
-
-inline vf vzero() { return _mm256_setzero_ps(); }
-inline vf vset(float x) { return _mm256_set1_ps(x); }
-inline vf vload(const float* p) { return _mm256_loadu_ps(p); }
-inline void vstore(float* p, vf v) { _mm256_storeu_ps(p, v); }
+// max with the bound second: a NaN lane takes the bound.
 inline vf vclamp(vf v, float lo, float hi) {
-    // max with the bound second: a NaN lane takes the bound.
-    return _mm256_min_ps(_mm256_max_ps(v, _mm256_set1_ps(lo)), _mm256_set1_ps(hi));
+    return (vf)_mm256_min_ps(_mm256_max_ps((__m256)v, _mm256_set1_ps(lo)), _mm256_set1_ps(hi));
 }
-#if defined(ZOR_LEVEL_l9)
-inline vf vfma(vf a, vf b, vf c) { return _mm256_fmadd_ps(a, b, c); }
-#else
-inline vf vfma(vf a, vf b, vf c) { return _mm256_add_ps(_mm256_mul_ps(a, b), c); }
-#endif
 
+#if ZOR_HAS_AVX2
+inline vf vpix(const Zor8u* p) {
+    return (vf)_mm256_cvtepi32_ps(_mm256_cvtepu8_epi32(_mm_loadl_epi64((const __m128i*)p)));
+}
+inline vf vpix(const Zor16u* p) {
+    return (vf)_mm256_cvtepi32_ps(_mm256_cvtepu16_epi32(_mm_loadu_si128((const __m128i*)p)));
+}
+// 16s pixels in the upper half of each lane, for the scaled taps.
+inline vf vpix(const Zor16s* p) {
+    return (vf)_mm256_cvtepi32_ps(
+        _mm256_slli_epi32(_mm256_cvtepi16_epi32(_mm_loadu_si128((const __m128i*)p)), 16));
+}
+#else  // AVX alone widens by halves
 inline __m256i join(__m128i lo, __m128i hi) {
     return _mm256_insertf128_si256(_mm256_castsi128_si256(lo), hi, 1);
 }
-
-#if defined(ZOR_LEVEL_e9)
 inline vf vpix(const Zor8u* p) {
     const __m128i v = _mm_loadl_epi64((const __m128i*)p);
-    return _mm256_cvtepi32_ps(join(_mm_cvtepu8_epi32(v), _mm_cvtepu8_epi32(_mm_srli_si128(v, 4))));
+    return (vf)_mm256_cvtepi32_ps(
+        join(_mm_cvtepu8_epi32(v), _mm_cvtepu8_epi32(_mm_srli_si128(v, 4))));
 }
 inline vf vpix(const Zor16u* p) {
     const __m128i v = _mm_loadu_si128((const __m128i*)p);
-    return _mm256_cvtepi32_ps(
+    return (vf)_mm256_cvtepi32_ps(
         join(_mm_cvtepu16_epi32(v), _mm_cvtepu16_epi32(_mm_srli_si128(v, 8))));
 }
 inline vf vpix(const Zor16s* p) {
     const __m128i v = _mm_loadu_si128((const __m128i*)p);
-    return _mm256_cvtepi32_ps(
+    return (vf)_mm256_cvtepi32_ps(
         join(_mm_cvtepi16_epi32(v), _mm_cvtepi16_epi32(_mm_srli_si128(v, 8))));
-}
-#else
-inline vf vpix(const Zor8u* p) {
-    return _mm256_cvtepi32_ps(_mm256_cvtepu8_epi32(_mm_loadl_epi64((const __m128i*)p)));
-}
-inline vf vpix(const Zor16u* p) {
-    return _mm256_cvtepi32_ps(_mm256_cvtepu16_epi32(_mm_loadu_si128((const __m128i*)p)));
-}
-// 16s pixels in the upper half of each lane, for the taps scaled by 2^-16.
-inline vf vpix(const Zor16s* p) {
-    return _mm256_cvtepi32_ps(
-        _mm256_slli_epi32(_mm256_cvtepi16_epi32(_mm_loadu_si128((const __m128i*)p)), 16));
 }
 #endif
 
 // Saturated and rounded to nearest, ties to even, whatever the caller's
 // rounding control says.
 inline __m256i vnear(vf v, float lo, float hi) {
-    return _mm256_cvttps_epi32(
-        _mm256_round_ps(vclamp(v, lo, hi), _MM_FROUND_TO_NEAREST_INT | _MM_FROUND_NO_EXC));
+    return _mm256_cvttps_epi32(_mm256_round_ps((__m256)vclamp(v, lo, hi),
+                                               _MM_FROUND_TO_NEAREST_INT | _MM_FROUND_NO_EXC));
 }
 inline void vput(Zor8u* p, vf v) {
     const __m256i i = vnear(v, 0.0f, 255.0f);
@@ -101,105 +108,69 @@ inline void vput(Zor16s* p, vf v) {
     _mm_storeu_si128((__m128i*)p,
                      _mm_packs_epi32(_mm256_castsi256_si128(i), _mm256_extractf128_si256(i, 1)));
 }
-
-// Partial vectors: staged through a local block.
-template <typename T> inline vf vpix_n(const T* p, int32_t n) {
-    T b[VL] = {};
-    memcpy(b, p, (size_t)n * sizeof(T));
-    return vpix(b);
-}
 template <typename T> inline void vput_n(T* p, vf v, int32_t n) {
     T b[VL];
     vput(b, v);
     memcpy(p, b, (size_t)n * sizeof(T));
 }
-inline vf vload_n(const float* p, int32_t n) {
-    float b[VL] = {};
-    memcpy(b, p, (size_t)n * sizeof(float));
-    return vload(b);
-}
-inline void vstore_n(float* p, vf v, int32_t n) {
-    float b[VL];
-    vstore(b, v);
-    memcpy(p, b, (size_t)n * sizeof(float));
-}
 
 #else  // 64-byte vectors: AVX-512F only, so n0 runs it too
 
-typedef __m512 vf;
-constexpr int VL = 16;
-constexpr bool kMasked = true;
-
-inline vf vzero() { return _mm512_setzero_ps(); }
-inline vf vset(float x) { return _mm512_set1_ps(x); }
-inline vf vload(const float* p) { return _mm512_loadu_ps(p); }
-inline void vstore(float* p, vf v) { _mm512_storeu_ps(p, v); }
 // Full-mask forms: the plain ones start from an undefined vector, which
 // GCC 12 reports as uninitialised once they are inlined deep enough.
 inline vf vclamp(vf v, float lo, float hi) {
-    return _mm512_maskz_min_ps(0xFFFF, _mm512_maskz_max_ps(0xFFFF, v, _mm512_set1_ps(lo)),
-                               _mm512_set1_ps(hi));
+    return (vf)_mm512_maskz_min_ps(
+        0xFFFF, _mm512_maskz_max_ps(0xFFFF, (__m512)v, _mm512_set1_ps(lo)), _mm512_set1_ps(hi));
 }
-inline vf vfma(vf a, vf b, vf c) { return _mm512_fmadd_ps(a, b, c); }
-
 inline __mmask16 lanes(int32_t n) { return (__mmask16)((1u << n) - 1u); }
 
 // Saturated and rounded to nearest, ties to even, whatever the caller's
 // rounding control says.
 inline __m512i vnear(vf v, float lo, float hi) {
-    return _mm512_maskz_cvt_roundps_epi32(0xFFFF, vclamp(v, lo, hi),
+    return _mm512_maskz_cvt_roundps_epi32(0xFFFF, (__m512)vclamp(v, lo, hi),
                                           _MM_FROUND_TO_NEAREST_INT | _MM_FROUND_NO_EXC);
 }
 
 inline vf vpix(const Zor8u* p) {
-    return _mm512_cvtepi32_ps(_mm512_cvtepu8_epi32(_mm_loadu_si128((const __m128i*)p)));
+    return (vf)_mm512_cvtepi32_ps(_mm512_cvtepu8_epi32(_mm_loadu_si128((const __m128i*)p)));
 }
 inline vf vpix(const Zor16u* p) {
-    return _mm512_cvtepi32_ps(_mm512_cvtepu16_epi32(_mm256_loadu_si256((const __m256i*)p)));
+    return (vf)_mm512_cvtepi32_ps(_mm512_cvtepu16_epi32(_mm256_loadu_si256((const __m256i*)p)));
 }
 inline vf vpix(const Zor16s* p) {
-    return _mm512_cvtepi32_ps(
+    return (vf)_mm512_cvtepi32_ps(
         _mm512_slli_epi32(_mm512_cvtepi16_epi32(_mm256_loadu_si256((const __m256i*)p)), 16));
 }
 
-// Narrowing stores (as the partial ones below, with every lane).
-inline void vput_n(Zor8u* p, vf v, int32_t n);
-inline void vput_n(Zor16u* p, vf v, int32_t n);
-inline void vput_n(Zor16s* p, vf v, int32_t n);
+// Narrowing stores under a mask; the whole-vector ones take every lane.
+inline void vput_n(Zor8u* p, vf v, int32_t n) {
+    _mm512_mask_cvtusepi32_storeu_epi8(p, lanes(n), vnear(v, 0.0f, 255.0f));
+}
+inline void vput_n(Zor16u* p, vf v, int32_t n) {
+    _mm512_mask_cvtusepi32_storeu_epi16(p, lanes(n), vnear(v, 0.0f, 65535.0f));
+}
+inline void vput_n(Zor16s* p, vf v, int32_t n) {
+    _mm512_mask_cvtsepi32_storeu_epi16(p, lanes(n), vnear(v, -32768.0f, 32767.0f));
+}
 inline void vput(Zor8u* p, vf v) { vput_n(p, v, VL); }
 inline void vput(Zor16u* p, vf v) { vput_n(p, v, VL); }
 inline void vput(Zor16s* p, vf v) { vput_n(p, v, VL); }
 
-// Byte and word loads under a mask need BW, which n0 lacks: stage them.
+#endif
+
+// 32f pixels are floats already.
+inline vf vpix(const Zor32f* p) { return simd::load<vf>(p); }
+inline void vput(Zor32f* p, vf v) { simd::store(p, v); }
+inline void vput_n(Zor32f* p, vf v, int32_t n) { simd::store_n(p, v, n); }
+
+// A partial vector of pixels: byte and word loads under a mask need BW,
+// which n0 lacks, so integers are staged.
+inline vf vpix_n(const Zor32f* p, int32_t n) { return simd::load_n<vf>(p, n); }
 template <typename T> inline vf vpix_n(const T* p, int32_t n) {
     T b[VL] = {};
     memcpy(b, p, (size_t)n * sizeof(T));
     return vpix(b);
 }
-inline void vput_n(Zor8u* p, vf v, int32_t n) {
-    _mm512_mask_cvtusepi32_storeu_epi8(p, lanes(n), vnear(v, 0.0f, 255.0f));
-}
-inline void vput_n(Zor16u* p, vf v, int32_t n) {
-    _mm512_mask_cvtusepi32_storeu_epi16(p, lanes(n),
-                                        vnear(v, 0.0f, 65535.0f));
-}
-inline void vput_n(Zor16s* p, vf v, int32_t n) {
-    _mm512_mask_cvtsepi32_storeu_epi16(p, lanes(n),
-                                       vnear(v, -32768.0f, 32767.0f));
-}
-inline vf vload_n(const float* p, int32_t n) { return _mm512_maskz_loadu_ps(lanes(n), p); }
-inline void vstore_n(float* p, vf v, int32_t n) { _mm512_mask_storeu_ps(p, lanes(n), v); }
-
-#endif
-
-// 16s on l9 and above multiplies pixels standing in the upper half of a
-// lane by the record's table of taps scaled by 2^-16; the product is the
-// same as the plain one, both being exact powers of two apart.
-#if defined(ZOR_LEVEL_e9)
-constexpr bool kScaled16s = false;
-#else
-constexpr bool kScaled16s = true;
-#endif
 
 // Taps in the caller's order, read in place from the record: tap k at
 // base[k * S] (S = -1: the reversed store walked backwards; S = 4: the
@@ -242,7 +213,7 @@ constexpr int NB = 8;  // vectors summed side by side in the wide loops
 // n pixels into floats; the row's spare lanes up to `len` are zeroed.
 template <typename T> void to_float(const T* p, float* out, int32_t n, int32_t len) {
     int32_t i = 0;
-    for (; i + VL <= n; i += VL) vstore(out + i, vpix(p + i));
+    for (; i + VL <= n; i += VL) simd::store(out + i, vpix(p + i));
     for (; i < n; ++i) out[i] = pix1(p[i]);
     for (; i < len; ++i) out[i] = 0.0f;
 }
@@ -266,19 +237,19 @@ inline void pass_block(const float* in, const Line<T>* ln, int32_t kw, int32_t x
     for (int l = 0; l < L; ++l)
 #pragma GCC unroll 16
         for (int k = 0; k < N; ++k)
-            a[l][k] = ln[l].first ? vzero() : vload(ln[l].acc + x + k * VL);
+            a[l][k] = ln[l].first ? vf{} : simd::load<vf>(ln[l].acc + x + k * VL);
     for (int32_t i = 0; i < kw; ++i) {
         vf v[N];
 #pragma GCC unroll 16
         for (int k = 0; k < N; ++k) {
-            v[k] = vload(in + x + i + k * VL);
+            v[k] = simd::load<vf>(in + x + i + k * VL);
             if (L > 1) keep(v[k]);
         }
 #pragma GCC unroll 4
         for (int l = 0; l < L; ++l) {
-            const vf t = vset(ln[l].taps[i]);
+            const vf t = simd::broadcast<vf>(ln[l].taps[i]);
 #pragma GCC unroll 16
-            for (int k = 0; k < N; ++k) a[l][k] = vfma(t, v[k], a[l][k]);
+            for (int k = 0; k < N; ++k) a[l][k] = madd(t, v[k], a[l][k]);
         }
     }
 #pragma GCC unroll 4
@@ -287,7 +258,7 @@ inline void pass_block(const float* in, const Line<T>* ln, int32_t kw, int32_t x
         for (int k = 0; k < N; ++k) {
             const int32_t at = x + k * VL;
             if (!ln[l].out)
-                vstore(ln[l].acc + at, a[l][k]);
+                simd::store(ln[l].acc + at, a[l][k]);
             else if (at + VL <= w)
                 vput(ln[l].out + at, a[l][k]);
             else if (at < w)
@@ -355,17 +326,6 @@ void filter_int(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t 
 
 // ---- all taps in registers ------------------------------------------------------
 
-// Loads and stores of the register blocks: 32f as it is, integer pixels
-// converted on the fly (nearest, saturated, on the way out).
-inline vf vsrc(const Zor32f* p) { return vload(p); }
-template <typename T> inline vf vsrc(const T* p) { return vpix(p); }
-inline vf vsrc_n(const Zor32f* p, int32_t n) { return vload_n(p, n); }
-template <typename T> inline vf vsrc_n(const T* p, int32_t n) { return vpix_n(p, n); }
-inline void vout(Zor32f* p, vf v) { vstore(p, v); }
-template <typename T> inline void vout(T* p, vf v) { vput(p, v); }
-inline void vout_n(Zor32f* p, vf v, int32_t n) { vstore_n(p, v, n); }
-template <typename T> inline void vout_n(T* p, vf v, int32_t n) { vput_n(p, v, n); }
-
 // One source row's taps into the R x N sums; kAll: every output row of
 // the block lies over this source row.
 template <int R, int N, bool kAll, typename T, typename C>
@@ -376,15 +336,15 @@ __attribute__((always_inline)) inline void source_row(const T* p, vf (&a)[R][N],
         vf v[N];
 #pragma GCC unroll 16
         for (int k = 0; k < N; ++k) {
-            v[k] = vsrc(p + i + k * VL);
+            v[k] = vpix(p + i + k * VL);
             if (R > 1) keep(v[k]);
         }
 #pragma GCC unroll 4
         for (int q = 0; q < R; ++q) {
             if (!kAll && !live[q]) continue;
-            const vf t = vset(rowTaps[q][i]);
+            const vf t = simd::broadcast<vf>(rowTaps[q][i]);
 #pragma GCC unroll 16
-            for (int k = 0; k < N; ++k) a[q][k] = vfma(t, v[k], a[q][k]);
+            for (int k = 0; k < N; ++k) a[q][k] = madd(t, v[k], a[q][k]);
         }
     }
 }
@@ -398,7 +358,7 @@ inline void block(const T* src, int32_t srcStep, T* dst, int32_t dstStep, C c, i
 #pragma GCC unroll 4
     for (int q = 0; q < R; ++q)
 #pragma GCC unroll 16
-        for (int k = 0; k < N; ++k) a[q][k] = vzero();
+        for (int k = 0; k < N; ++k) a[q][k] = vf{};
     for (int32_t r = 0; r < kh + R - 1; ++r) {
         const T* p = row_at(src, srcStep, r) + x;
         // Output row q takes this source row with kernel row r - q.
@@ -422,20 +382,20 @@ inline void block(const T* src, int32_t srcStep, T* dst, int32_t dstStep, C c, i
 #pragma GCC unroll 4
     for (int q = 0; q < R; ++q)
 #pragma GCC unroll 16
-        for (int k = 0; k < N; ++k) vout(row_at(dst, dstStep, q) + x + k * VL, a[q][k]);
+        for (int k = 0; k < N; ++k) vput(row_at(dst, dstStep, q) + x + k * VL, a[q][k]);
 }
 
 // The last n < VL outputs of one row (n0, k0).
 template <typename T, typename C>
 inline void tail(const T* src, int32_t srcStep, T* out, C c, int32_t kw, int32_t kh, int32_t x,
                  int32_t n) {
-    vf a = vzero();
+    vf a = vf{};
     for (int32_t j = 0; j < kh; ++j) {
         const T* p = row_at(src, srcStep, j) + x;
         const C cj = c.from(j * kw);
-        for (int32_t i = 0; i < kw; ++i) a = vfma(vset(cj[i]), vsrc_n(p + i, n), a);
+        for (int32_t i = 0; i < kw; ++i) a = madd(simd::broadcast<vf>(cj[i]), vpix_n(p + i, n), a);
     }
-    vout_n(out + x, a, n);
+    vput_n(out + x, a, n);
 }
 
 // R rows of output.
@@ -485,11 +445,7 @@ void filter_regs(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t
 // and convert the pixels as they load them; larger ones convert each row
 // once per pair of output rows and sum through float lines. Where the
 // turn lies was measured per level at 1920x1080.
-#if defined(ZOR_LEVEL_l9)
-constexpr int32_t kRegsTaps = 1 << 30;
-#else
-constexpr int32_t kRegsTaps = 9;
-#endif
+constexpr int32_t kRegsTaps = ZOR_FILTER_REGS_TAPS;
 
 template <typename T>
 void filter_any(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,

@@ -11,7 +11,7 @@
 // it is added, which is the scalar path's arithmetic.
 #include "variant.h"
 
-#if defined(ZOR_LEVEL_m7) || defined(ZOR_LEVEL_n8) || defined(ZOR_LEVEL_y8)
+#if !ZOR_HAS_AVX
 
 #include <emmintrin.h>
 
@@ -21,6 +21,8 @@
 ZOR_BEGIN
 namespace filt {
 namespace {
+
+typedef simd::vec<16, float> v4;
 
 // ---- pixels to floats (SSE2 only: m7 has no pmovzx) --------------------------
 
@@ -90,17 +92,16 @@ inline const float* taps_row(const Record& s, int32_t j) {
 // runs on spare lanes that are never converted.
 template <bool kFirst>
 void pass1(const float* in, float* line, const float* t, int32_t w, int32_t kw) {
-    int32_t x = 0;
-    for (; x < w; x += 8) {
-        __m128 a0 = kFirst ? _mm_setzero_ps() : _mm_load_ps(line + x);
-        __m128 a1 = kFirst ? _mm_setzero_ps() : _mm_load_ps(line + x + 4);
+    for (int32_t x = 0; x < w; x += 8) {
+        v4 a0 = kFirst ? v4{} : simd::load<v4>(line + x);
+        v4 a1 = kFirst ? v4{} : simd::load<v4>(line + x + 4);
         for (int32_t i = 0; i < kw; ++i) {
-            const __m128 c = _mm_set1_ps(t[-i]);
-            a0 = _mm_add_ps(a0, _mm_mul_ps(c, _mm_loadu_ps(in + x + i)));
-            a1 = _mm_add_ps(a1, _mm_mul_ps(c, _mm_loadu_ps(in + x + i + 4)));
+            const v4 c = simd::broadcast<v4>(t[-i]);
+            a0 = a0 + c * simd::load<v4>(in + x + i);
+            a1 = a1 + c * simd::load<v4>(in + x + i + 4);
         }
-        _mm_store_ps(line + x, a0);
-        _mm_store_ps(line + x + 4, a1);
+        simd::store(line + x, a0);
+        simd::store(line + x + 4, a1);
     }
 }
 
@@ -109,22 +110,22 @@ template <bool kFirst0, bool kFirst1>
 void pass2(const float* in, float* l0, const float* t0, float* l1, const float* t1, int32_t w,
            int32_t kw) {
     for (int32_t x = 0; x < w; x += 8) {
-        __m128 a0 = kFirst0 ? _mm_setzero_ps() : _mm_load_ps(l0 + x);
-        __m128 a1 = kFirst0 ? _mm_setzero_ps() : _mm_load_ps(l0 + x + 4);
-        __m128 b0 = kFirst1 ? _mm_setzero_ps() : _mm_load_ps(l1 + x);
-        __m128 b1 = kFirst1 ? _mm_setzero_ps() : _mm_load_ps(l1 + x + 4);
+        v4 a0 = kFirst0 ? v4{} : simd::load<v4>(l0 + x);
+        v4 a1 = kFirst0 ? v4{} : simd::load<v4>(l0 + x + 4);
+        v4 b0 = kFirst1 ? v4{} : simd::load<v4>(l1 + x);
+        v4 b1 = kFirst1 ? v4{} : simd::load<v4>(l1 + x + 4);
         for (int32_t i = 0; i < kw; ++i) {
-            const __m128 s0 = _mm_loadu_ps(in + x + i), s1 = _mm_loadu_ps(in + x + i + 4);
-            const __m128 c0 = _mm_set1_ps(t0[-i]), c1 = _mm_set1_ps(t1[-i]);
-            a0 = _mm_add_ps(a0, _mm_mul_ps(c0, s0));
-            a1 = _mm_add_ps(a1, _mm_mul_ps(c0, s1));
-            b0 = _mm_add_ps(b0, _mm_mul_ps(c1, s0));
-            b1 = _mm_add_ps(b1, _mm_mul_ps(c1, s1));
+            const v4 s0 = simd::load<v4>(in + x + i), s1 = simd::load<v4>(in + x + i + 4);
+            const v4 c0 = simd::broadcast<v4>(t0[-i]), c1 = simd::broadcast<v4>(t1[-i]);
+            a0 = a0 + c0 * s0;
+            a1 = a1 + c0 * s1;
+            b0 = b0 + c1 * s0;
+            b1 = b1 + c1 * s1;
         }
-        _mm_store_ps(l0 + x, a0);
-        _mm_store_ps(l0 + x + 4, a1);
-        _mm_store_ps(l1 + x, b0);
-        _mm_store_ps(l1 + x + 4, b1);
+        simd::store(l0 + x, a0);
+        simd::store(l0 + x + 4, a1);
+        simd::store(l1 + x, b0);
+        simd::store(l1 + x + 4, b1);
     }
 }
 
@@ -177,21 +178,20 @@ void rowacc_t(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w,
 template <int NB>
 inline void block_32f(const Zor32f* src, int32_t srcStep, Zor32f* out, int32_t x, const Record& s) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
-    __m128 acc[NB];
+    v4 acc[NB];
 #pragma GCC unroll 16
-    for (int k = 0; k < NB; ++k) acc[k] = _mm_setzero_ps();
+    for (int k = 0; k < NB; ++k) acc[k] = v4{};
     const float* t = s.pTaps + kw * kh - 1;
     for (int32_t j = 0; j < kh; ++j, t -= kw) {
         const Zor32f* p = row_at(src, srcStep, j) + x;
         for (int32_t i = 0; i < kw; ++i) {
-            const __m128 c = _mm_set1_ps(t[-i]);
+            const v4 c = simd::broadcast<v4>(t[-i]);
 #pragma GCC unroll 16
-            for (int k = 0; k < NB; ++k)
-                acc[k] = _mm_add_ps(acc[k], _mm_mul_ps(c, _mm_loadu_ps(p + i + 4 * k)));
+            for (int k = 0; k < NB; ++k) acc[k] = acc[k] + c * simd::load<v4>(p + i + 4 * k);
         }
     }
 #pragma GCC unroll 16
-    for (int k = 0; k < NB; ++k) _mm_storeu_ps(out + x + 4 * k, acc[k]);
+    for (int k = 0; k < NB; ++k) simd::store(out + x + 4 * k, acc[k]);
 }
 
 }  // namespace
