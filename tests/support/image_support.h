@@ -1,5 +1,4 @@
-// Small pieces the image tests share: running one templated body for each
-// element type of the image operations, and guard bytes behind buffers.
+// Guard bytes behind plain buffers; new tests use image.h directly.
 #ifndef ZOR_TEST_IMAGE_SUPPORT_H
 #define ZOR_TEST_IMAGE_SUPPORT_H
 
@@ -8,19 +7,10 @@
 
 #include <vector>
 
+#include "image.h"
 #include "zor.h"
 
 namespace zortest {
-
-// f(T()) for 8u, 16u, 16s and 32f in turn; the body takes its type from
-// the argument (decltype), so one generic lambda serves every type.
-template <typename F>
-void for_each_type(F f) {
-    f(Zor8u());
-    f(Zor16u());
-    f(Zor16s());
-    f(Zor32f());
-}
 
 constexpr uint8_t kGuardByte = 0xA5;
 
