@@ -121,13 +121,12 @@ ZorStatus zoriCopyReplicateBorder_32s_C4IR(Zor32s* pSrcDst, int32_t srcDstStep, 
                                            int32_t leftBorderWidth);
 
 /* ---- Mirrored frame ---------------------------------------------------- */
-/* Reflection about the edge pixel, which is not repeated. A border shorter
- * than the image on its axis (b < n) reads source pixels b, b-1, .., 1 from
- * the outer edge inwards (right and bottom: n-1-b .. n-2 mirrored). A
- * border of n or more follows a triangular wave of period 2n-2: frame
- * position t, counted from the outer edge, reads tri(b + t) with tri(k) =
- * k mod (2n-2), folded to 2n-2-k when >= n; right and bottom borders are the
- * mirror image of that rule. A one-pixel axis repeats its pixel.
+/* Reflection about the edge pixel, which is not repeated, at every
+ * distance: the frame pixel at distance d from the image (1 next to it)
+ * reads source pixel tri(d), with tri(k) = k mod (2n-2), folded to
+ * 2n-2-k when >= n; right and bottom borders are the mirror image (pixel
+ * n-1-tri(d)). A border shorter than the image is the plain reflection
+ * 1, 2, .. from the image outwards. A one-pixel axis repeats its pixel.
  * pSrc == pDst turns a call into the in-place form as for Replicate. 16s
  * runs the 16u body and 32f the 32s body. */
 ZorStatus zoriCopyMirrorBorder_8u_C1R(const Zor8u* pSrc, int32_t srcStep, ZoriSize srcRoiSize,

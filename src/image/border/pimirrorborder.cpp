@@ -1,10 +1,10 @@
 // Mirrored frame: reflection about the edge pixel, which is not repeated.
 // A border shorter than the image on its axis is a plain reflection. A
 // border as long as the image or longer reflects back and forth: the
-// source index runs as a triangular wave of period 2n-2, whose starting
-// point takes the one division of the axis; a one-pixel axis has no period
-// and simply repeats its pixel. One body per pixel size; 16s runs the 16u
-// form and 32f the 32s form.
+// source index runs as a triangular wave of period 2n-2 away from the
+// image, whose starting point at the outer edge takes the one division of
+// the axis; a one-pixel axis has no period and simply repeats its pixel.
+// One body per pixel size; 16s runs the 16u form and 32f the 32s form.
 #include "variant.h"
 
 #include "border_rows.h"
@@ -14,10 +14,13 @@ namespace {
 
 using namespace border;
 
-// Source index along one axis of n pixels, walked from the outer edge of
-// a border b >= n inwards: position t reads tri(b + t), where tri(k) is k
-// modulo 2n-2 folded back into 0..n-1. Right and bottom borders walk the
-// mirror image (index n-1-idx, from their outer edge).
+// Source index along one axis of n pixels for a border b >= n, walked from
+// the border's outer edge towards the image. The reflection holds at every
+// distance: distance d from the image reads tri(d), tri(k) being k modulo
+// 2n-2 folded back into 0..n-1, so the pixels next to the image are 1, 2,
+// .. whatever the border's length. The walk starts at tri(b) and each step
+// takes the distance down by one. Right and bottom borders walk the mirror
+// image (index n-1-idx).
 struct Wave {
     int32_t idx, dir;
 };
@@ -31,12 +34,14 @@ inline Wave wave_start(int32_t b, int32_t n) {
     }
     const int64_t period = 2 * (int64_t)n - 2;
     const int64_t m = b % period;
+    // On the rising half of the wave a falling distance lowers the index;
+    // on the folded half it raises it.
     if (m < n) {
         w.idx = (int32_t)m;
-        w.dir = 1;
+        w.dir = -1;
     } else {
         w.idx = (int32_t)(period - m);
-        w.dir = -1;
+        w.dir = 1;
     }
     return w;
 }

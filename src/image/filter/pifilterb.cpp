@@ -7,6 +7,7 @@
 
 #include <string.h>
 
+#include "bands.h"
 #include "border_type.h"
 #include "pifilter.h"
 
@@ -93,139 +94,25 @@ big kernel_x(int32_t kernelType, int32_t dataType, int32_t c, int32_t kw, int32_
 
 inline big round64(big x) { return (x + 63) & ~(big)63; }
 
-// The three frame copies per element type, as overloads.
-#define ZOR_FILTER_FRAMES(T, t)                                                                 \
-    inline void repl(const T* s, int32_t ss, ZoriSize sr, T* d, int32_t ds, ZoriSize dr,       \
-                     int32_t top, int32_t left) {                                               \
-        ZOR_NAME(zoriCopyReplicateBorder_##t##_C1R)(s, ss, sr, d, ds, dr, top, left);           \
-    }                                                                                           \
-    inline void mirr(const T* s, int32_t ss, ZoriSize sr, T* d, int32_t ds, ZoriSize dr,       \
-                     int32_t top, int32_t left) {                                               \
-        ZOR_NAME(zoriCopyMirrorBorder_##t##_C1R)(s, ss, sr, d, ds, dr, top, left);              \
-    }                                                                                           \
-    inline void cnst(const T* s, int32_t ss, ZoriSize sr, T* d, int32_t ds, ZoriSize dr,       \
-                     int32_t top, int32_t left, T v) {                                          \
-        ZOR_NAME(zoriCopyConstBorder_##t##_C1R)(s, ss, sr, d, ds, dr, top, left, v);            \
-    }
-ZOR_FILTER_FRAMES(Zor8u, 8u)
-ZOR_FILTER_FRAMES(Zor16u, 16u)
-ZOR_FILTER_FRAMES(Zor16s, 16s)
-ZOR_FILTER_FRAMES(Zor32f, 32f)
-#undef ZOR_FILTER_FRAMES
-
-// One framed temporary: a source rectangle at the temporary's (left, top),
-// the rest made up by the border kind. Rows of the temporary are exactly
-// its width apart.
+// The driver: the band cutter with the kernel's four reaches (the anchor
+// is the centre, so an even kernel reaches one more to the right and
+// down); each rectangle's kernel starts at its window's top-left pixel.
 template <typename T>
-void make_frame(int32_t kind, const T* src, int32_t srcStep, int32_t sw, int32_t sh, T* tmp,
-                int32_t tw, int32_t th, int32_t top, int32_t left, T value) {
-    const int32_t ts = tw * (int32_t)sizeof(T);
-    if (kind == zorBorderRepl)
-        repl(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left);
-    else if (kind == zorBorderMirror)
-        mirr(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left);
-    else
-        cnst(src, srcStep, {sw, sh}, tmp, ts, {tw, th}, top, left, value);
-}
-
-template <typename T> inline const T* at(const T* p, int32_t step, int32_t dy, int32_t dx) {
-    return (const T*)((const uint8_t*)p + (ptrdiff_t)dy * step) + dx;
-}
-template <typename T> inline T* at(T* p, int32_t step, int32_t dy, int32_t dx) {
-    return (T*)((uint8_t*)p + (ptrdiff_t)dy * step) + dx;
-}
-
-template <typename T>
-void drive(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t W, int32_t H,
-           int32_t borderType, T value, const Record& s, Zor8u* buffer) {
+ZorStatus drive(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t W, int32_t H,
+                int32_t borderType, T value, const Record& s, Zor8u* buffer) {
     const int32_t kw = s.kernelWidth, kh = s.kernelHeight;
     const int32_t ax = (kw - 1) >> 1, ay = (kh - 1) >> 1;
-    const int32_t kind = zorBorderKind(borderType);
-    const bool small = W <= kw || H <= kh;
-    // right0/bottom0: what the kernel reads beyond the ROI; right/bottom:
-    // the band widths, one more for a mirror with 2-wide kernels, whose
-    // band would otherwise frame a single column (or row) and replicate it.
-    const int32_t right0 = kw - ax - 1, bottom0 = kh - ay - 1;
-    int32_t right = right0, bottom = bottom0;
-    if (!small && kind == zorBorderMirror) {
-        if (kw == 2) right = 2;
-        if (kh == 2) bottom = 2;
-    }
-    // A side that needs no pixels counts as being in memory.
-    int32_t flags = borderType & zorBorderFlagMask;
-    if (ax == 0) {
-        flags |= zorBorderInMemLeft;
-        if (right == 0) flags |= zorBorderInMemRight;
-    }
-    if (ay == 0) {
-        flags |= zorBorderInMemTop;
-        if (bottom == 0) flags |= zorBorderInMemBottom;
-    }
-
     T* tmp = align_up((T*)buffer, 32);
     const big frameBytes = border_bytes(kw, kh, W, H, (int32_t)sizeof(T), 1);
     float* work = (float*)align_up((Zor8u*)tmp + (ptrdiff_t)frameBytes, 64);
-
-    if (flags == zorBorderInMem) {
-        run(at(src, srcStep, -ay, -ax), srcStep, dst, dstStep, W, H, s, work);
-        return;
-    }
-    const bool inT = flags & zorBorderInMemTop, inB = flags & zorBorderInMemBottom;
-    const bool inL = flags & zorBorderInMemLeft, inR = flags & zorBorderInMemRight;
-
-    if (small) {
-        // One frame for the whole ROI; sides in memory enlarge the copied
-        // rectangle instead of being made up.
-        const int32_t tw = W + kw - 1, th = H + kh - 1;
-        const int32_t sw = W + (inL ? ax : 0) + (inR ? right0 : 0);
-        const int32_t sh = H + (inT ? ay : 0) + (inB ? bottom0 : 0);
-        make_frame(kind, at(src, srcStep, inT ? -ay : 0, inL ? -ax : 0), srcStep, sw, sh, tmp, tw,
-                   th, inT ? 0 : ay, inL ? 0 : ax, value);
-        run(tmp, tw * (int32_t)sizeof(T), dst, dstStep, W, H, s, work);
-        return;
-    }
-
-    // Top and bottom bands span the full width; their corners come from
-    // memory where the left or right side is there, else from the frame.
-    const int32_t bandX = inL ? -ax : 0;
-    const int32_t bandW = W + (inL ? ax : 0) + (inR ? right0 : 0);
-    const int32_t bandLeft = inL ? 0 : ax;
-    const int32_t bandTw = W + kw - 1;
-    if (!inT) {
-        make_frame(kind, at(src, srcStep, 0, bandX), srcStep, bandW, kh - 1, tmp, bandTw,
-                   ay + kh - 1, ay, bandLeft, value);
-        run(tmp, bandTw * (int32_t)sizeof(T), dst, dstStep, W, ay, s, work);
-        src = at(src, srcStep, ay, 0);
-        dst = at(dst, dstStep, ay, 0);
-        H -= ay;
-    }
-    if (!inB) {
-        const int32_t rows = bottom + ay;  // kh - 1, or kh for the mirror case
-        make_frame(kind, at(src, srcStep, H - rows, bandX), srcStep, bandW, rows, tmp, bandTw,
-                   rows + bottom0, 0, bandLeft, value);
-        run(tmp, bandTw * (int32_t)sizeof(T), at(dst, dstStep, H - bottom, 0), dstStep, W, bottom,
-            s, work);
-        H -= bottom;
-    }
-    // Left and right bands need no vertical frame: the rows above and below
-    // what remains are real, taken off by the bands above or in memory.
-    if (!inL) {
-        const int32_t tw = kw + ax - 1, th = kh + H - 1;
-        make_frame(kind, at(src, srcStep, -ay, 0), srcStep, kw - 1, th, tmp, tw, th, 0, ax, value);
-        run(tmp, tw * (int32_t)sizeof(T), dst, dstStep, ax, H, s, work);
-        src += ax;
-        dst += ax;
-        W -= ax;
-    }
-    if (!inR) {
-        const int32_t cols = right + ax;  // kw - 1, or kw for the mirror case
-        const int32_t tw = cols + right0, th = kh + H - 1;
-        make_frame(kind, at(src, srcStep, -ay, W - cols), srcStep, cols, th, tmp, tw, th, 0, 0,
-                   value);
-        run(tmp, tw * (int32_t)sizeof(T), dst + (W - right), dstStep, right, H, s, work);
-        W -= right;
-    }
-    run(at(src, srcStep, -ay, -ax), srcStep, dst, dstStep, W, H, s, work);
+    const bands::Border<T> border = {zorBorderKind(borderType), borderType & zorBorderFlagMask,
+                                     value, bands::copies<T>()};
+    return bands::cut(
+        src, srcStep, W, H, bands::Reach{ax, kw - ax - 1, ay, kh - ay - 1}, border, tmp,
+        [&](int32_t, const T* p, int32_t ps, int32_t x, int32_t y, int32_t w, int32_t h) {
+            run(bands::at(p, ps, -ay, -ax), ps, bands::at(dst, dstStep, y, x), dstStep, w, h, s,
+                work);
+        });
 }
 
 template <typename T>
@@ -242,9 +129,12 @@ ZorStatus filter_entry(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep,
                            zorBorderLimit) != zorStsNoErr)
         return zorStsBorderErr;
     const T value = zorBorderKind(borderType) == zorBorderConst ? *pBorderValue : T();
-    drive(pSrc, srcStep, pDst, dstStep, roi.width, roi.height, borderType, value,
-          *record_of(pSpec), pBuffer);
-    return zorStsNoErr;
+    // No frame copy fails on a ROI that GetSize accepted: sizes are
+    // positive and a temporary's row is shorter than the buffer. Their
+    // status is passed on all the same, for a ROI beyond what the buffer
+    // was sized for.
+    return drive(pSrc, srcStep, pDst, dstStep, roi.width, roi.height, borderType, value,
+                 *record_of(pSpec), pBuffer);
 }
 
 }  // namespace
@@ -322,7 +212,10 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriFilterBorderInit_32f)(const Zor32f* pKernel, Zo
     if (dataType != zor8u && dataType != zor16u && dataType != zor16s && dataType != zor32f)
         return zorStsDataTypeErr;
     if (numChannels < 1 || numChannels > 4) return zorStsChannelErr;
-    const int32_t hint = 0x10000;
+    // The accuracy hint is the value 16 added to a mode. There is no more
+    // accurate filter to give: the hint is taken off and answered with a
+    // warning, and the record works with the plain mode.
+    const int32_t hint = 16;
     const int32_t mode = roundMode & ~hint;
     if ((uint32_t)mode > 2) return zorStsRoundModeNotSupportedErr;
 

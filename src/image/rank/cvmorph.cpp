@@ -9,8 +9,8 @@
 #include <string.h>
 
 #include "border_type.h"
+#include "bands.h"
 #include "morph_internal.h"
-#include "rank_bands.h"
 
 ZOR_BEGIN
 namespace morph {
@@ -199,8 +199,7 @@ ZorStatus init(ZoriSize roi, const Zor8u* pMask, ZoriSize mask, ZoriMorphState* 
 
 // ---- the driver ---------------------------------------------------------------
 
-using rank::at;
-using rank::Copies;
+using bands::at;
 
 template <typename T> using Kernel = void (*)(const Job<T>&);
 
@@ -226,15 +225,14 @@ Kernel<T> pick(const Head& h) {
 // borderType arrives checked, with kind 5 already turned into 6 and value
 // set; only the low eight bits are looked at here.
 template <typename T, typename Op>
-void drive(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t W, int32_t H,
-           int32_t borderType, T value, const ZoriMorphState* state, Zor8u* buffer) {
+ZorStatus drive(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t W, int32_t H,
+                int32_t borderType, T value, const ZoriMorphState* state, Zor8u* buffer) {
     Head hd;
     memcpy(&hd, state, sizeof hd);
     const int32_t mw = hd.maskWidth, mh = hd.maskHeight;
-    if ((mw == 1 && mh == 1) || (hd.maskFeature & kEmpty)) {
-        Copies<T>::copy(src, srcStep, dst, dstStep, {W, H});
-        return;
-    }
+    const bands::Copies<T> copies = bands::copies<T>();
+    if ((mw == 1 && mh == 1) || (hd.maskFeature & kEmpty))
+        return copies.plain(src, srcStep, dst, dstStep, {W, H});
     const Kernel<T> kernel = pick<T, Op>(hd);
     const int32_t ax = (mw - 1) >> 1, ay = (mh - 1) >> 1;
     T* tmp = align32((T*)buffer);
@@ -242,9 +240,10 @@ void drive(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t W, in
     job.head = &hd;
     job.ring = (uint8_t*)tmp + round32(frame_elems(mw, mh, ax, ay, W, H) * (int64_t)sizeof(T));
     job.dstStep = dstStep;
-    rank::cut_bands<T>(
-        src, srcStep, W, H, ax, ay, borderType & zorBorderFlagMask, zorBorderKind(borderType),
-        value, tmp,
+    const bands::Border<T> border = {zorBorderKind(borderType), borderType & zorBorderFlagMask,
+                                     value, copies};
+    return bands::cut<T>(
+        src, srcStep, W, H, bands::Reach{ax, ax, ay, ay}, border, tmp,
         [&](int32_t, const T* s, int32_t ss, int32_t x, int32_t y, int32_t w, int32_t h) {
             job.src = at(s, ss, -ay, -ax);
             job.srcStep = ss;
@@ -283,9 +282,11 @@ ZorStatus entry(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriSi
     } else if (zorBorderKind(border) == zorBorderConst) {
         value = borderValue;
     }
-    drive<T, Op>(pSrc, srcStep, pDst, dstStep, roi.width, roi.height, border, value, pState,
-                 pBuffer);
-    return zorStsNoErr;
+    // The copies see the steps and sizes checked above, positive and at
+    // least a row long, so they do not fail on a buffer of the size asked
+    // for; their status is passed on all the same.
+    return drive<T, Op>(pSrc, srcStep, pDst, dstStep, roi.width, roi.height, border, value,
+                        pState, pBuffer);
 }
 
 }  // namespace

@@ -7,8 +7,8 @@
 #include "variant.h"
 
 #include "border_type.h"
+#include "bands.h"
 #include "median_internal.h"
-#include "rank_bands.h"
 
 ZOR_BEGIN
 namespace {
@@ -85,8 +85,6 @@ int64_t multi_channel_bytes(int64_t W, int64_t H, int64_t kw, int64_t kh, int32_
 }
 
 // ---- the driver -------------------------------------------------------------
-
-using rank::Copies;
 
 template <typename T> Kernel<T> general(int32_t kw, int32_t kh);
 template <> Kernel<Zor8u> general<Zor8u>(int32_t, int32_t) { return general_8u; }
@@ -167,7 +165,7 @@ ZorStatus median_filter(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep
     const int32_t kw = mask.width, kh = mask.height, W = roi.width, H = roi.height;
     if (kw == 1 && kh == 1) {
         if ((const void*)pSrc == (const void*)pDst) return zorStsNoErr;
-        return Copies<T>::copy(pSrc, srcStep, pDst, dstStep, roi);
+        return bands::copies<T>().plain(pSrc, srcStep, pDst, dstStep, roi);
     }
 
     int32_t flags = borderType == zorBorderInMem ? (int32_t)zorBorderInMem : borderType & 0xF0;
@@ -213,35 +211,36 @@ ZorStatus median_filter(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep
     }
     // Bands go to their result bands, the centre through the ring when in
     // place; a whole frame has been read completely, so it goes to pDst.
-    const ZorStatus status = rank::cut_bands<T>(
-        pSrc, srcStep, W, H, rx, ry, flags, borderType & 0x0F, borderValue, (T*)frame,
+    struct Band {
+        T* at;
+        ptrdiff_t step;
+        int32_t x, y, w, h;
+    } band[4] = {{topBand, (ptrdiff_t)W * e, 0, 0, 0, 0},
+                 {bottomBand, (ptrdiff_t)W * e, 0, 0, 0, 0},
+                 {leftBand, (ptrdiff_t)rx * e, 0, 0, 0, 0},
+                 {rightBand, (ptrdiff_t)rx * e, 0, 0, 0, 0}};
+    const bands::Border<T> border = {borderType & zorBorderKindMask, flags, borderValue,
+                                     bands::copies<T>()};
+    const ZorStatus status = bands::cut<T>(
+        pSrc, srcStep, W, H, bands::Reach{rx, rx, ry, ry}, border, (T*)frame,
         [&](int32_t part, const T* s, int32_t ss, int32_t x, int32_t y, int32_t w, int32_t h) {
-            Job<T> job = {s, ss, rank::at(pDst, dstStep, y, x), dstStep, w, h, kw, kh, scratch};
-            switch (part) {
-                case rank::kTop: job.dst = topBand, job.dstStep = (ptrdiff_t)W * e; break;
-                case rank::kBottom: job.dst = bottomBand, job.dstStep = (ptrdiff_t)W * e; break;
-                case rank::kLeft: job.dst = leftBand, job.dstStep = (ptrdiff_t)rx * e; break;
-                case rank::kRight: job.dst = rightBand, job.dstStep = (ptrdiff_t)rx * e; break;
-                case rank::kCentre: run_in_memory(kernel, job, ring); return;
-                default: break;
+            Job<T> job = {s, ss, bands::at(pDst, dstStep, y, x), dstStep, w, h, kw, kh, scratch};
+            if (part == bands::kCentre) {
+                run_in_memory(kernel, job, ring);
+            } else if (part == bands::kWhole) {
+                kernel(job);
+            } else {
+                Band& b = band[part];
+                b.x = x, b.y = y, b.w = w, b.h = h;
+                job.dst = b.at;
+                job.dstStep = b.step;
+                kernel(job);
             }
-            kernel(job);
         });
-    if (status != zorStsNoErr || !large) return status;
-
+    if (status != zorStsNoErr) return status;
     // Bands last: every source pixel has been read by now.
-    const bool inTop = flags & zorBorderInMemTop || kh == 1;
-    const bool inBottom = flags & zorBorderInMemBottom || kh == 1;
-    const bool inLeft = flags & zorBorderInMemLeft || kw == 1;
-    const bool inRight = flags & zorBorderInMemRight || kw == 1;
-    const int32_t y0 = inTop ? 0 : ry, rows = H - (inTop ? 0 : ry) - (inBottom ? 0 : ry);
-    if (!inTop) copy_rows(topBand, (ptrdiff_t)W * e, pDst, dstStep, W, ry);
-    if (!inBottom)
-        copy_rows(bottomBand, (ptrdiff_t)W * e, row_at(pDst, dstStep, H - ry), dstStep, W, ry);
-    if (!inLeft) copy_rows(leftBand, (ptrdiff_t)rx * e, row_at(pDst, dstStep, y0), dstStep, rx, rows);
-    if (!inRight)
-        copy_rows(rightBand, (ptrdiff_t)rx * e, row_at(pDst, dstStep, y0) + (W - rx), dstStep, rx,
-                  rows);
+    for (const Band& b : band)
+        copy_rows(b.at, b.step, bands::at(pDst, dstStep, b.y, b.x), dstStep, b.w, b.h);
     return zorStsNoErr;
 }
 

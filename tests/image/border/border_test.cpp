@@ -1,5 +1,5 @@
 // The exported border copies through the public stubs, every level forced
-// in turn, against the model of border_harness.h; and the shared test of
+// in turn, against the shared border model; and the shared test of
 // border-type values.
 #include "border_harness.h"
 #include "border_type.h"
@@ -25,99 +25,47 @@ const std::vector<Form>& forms() {
 
 using BorderPublic = zortest::LevelTest;
 
-TEST_P(BorderPublic, FramesLikeTheModel) {
-    const std::vector<Geometry> cases = geometries();
-    for (const Form& f : forms()) {
-        int seed = 0;
-        for (const Geometry& g : cases)
-            ASSERT_NO_FATAL_FAILURE(run_copy(f, GetParam().index, g, ++seed));
-    }
-}
-
-TEST_P(BorderPublic, ReplicateWithEqualPointersFramesInPlace) {
-    const std::vector<Geometry> cases = geometries();
-    for (const Form& f : forms()) {
-        if (f.kind != kRepl) continue;
-        int seed = 0;
-        for (const Geometry& g : cases)
-            ASSERT_NO_FATAL_FAILURE(run_in_place(f, GetParam().index, g, ++seed, true));
-    }
-}
+// Replicate with equal pointers frames in place.
+TEST_P(BorderPublic, FramesLikeTheModel) { run_sweep(forms(), GetParam().index); }
 
 TEST_P(BorderPublic, ChecksInOrderAndWritesNothingOnError) {
     for (const Form& f : forms()) run_checks(f, GetParam().index);
-}
-
-// Same sizes and no border: a plain copy, and in place nothing at all.
-TEST_P(BorderPublic, NoBorderIsAPlainCopy) {
-    const Zor16u src[2][3] = {{1, 2, 3}, {4, 5, 6}};
-    Zor16u dst[2][4] = {{9, 9, 9, 9}, {9, 9, 9, 9}};
-    ASSERT_EQ(zoriCopyConstBorder_16u_C1R(&src[0][0], 6, {3, 2}, &dst[0][0], 8, {3, 2}, 0, 0, 7),
-              zorStsNoErr);
-    const Zor16u want[2][4] = {{1, 2, 3, 9}, {4, 5, 6, 9}};
-    EXPECT_EQ(memcmp(dst, want, sizeof dst), 0);
-    ASSERT_EQ(zoriCopyReplicateBorder_16u_C1R(&dst[0][0], 8, {3, 2}, &dst[0][0], 8, {3, 2}, 0, 0),
-              zorStsNoErr);
-    EXPECT_EQ(memcmp(dst, want, sizeof dst), 0);
 }
 
 ZOR_INSTANTIATE_LEVELS(BorderPublic);
 
 // ---- border-type values -------------------------------------------------
 
-const uint32_t kReplMirrorConst =
-    zorBorderAcceptRepl | zorBorderAcceptMirror | zorBorderAcceptConst;
-
 TEST(BorderType, KindMustBeInTheCallersSet) {
-    struct Case {
+    const uint32_t rmc = zorBorderAcceptRepl | zorBorderAcceptMirror | zorBorderAcceptConst;
+    const int32_t L = zorBorderLimit, LM = zorBorderLimitMorph, T = zorBorderInMemTop;
+    const ZorStatus E = zorStsBorderErr;
+    const struct {
         int32_t value;
-        uint32_t accepted, limit;
+        uint32_t accepted;
+        int32_t limit;
         ZorStatus expect;
     } cases[] = {
-        {zorBorderRepl, kReplMirrorConst, zorBorderLimit, zorStsNoErr},
-        {zorBorderMirror, kReplMirrorConst, zorBorderLimit, zorStsNoErr},
-        {zorBorderConst, kReplMirrorConst, zorBorderLimit, zorStsNoErr},
-        {zorBorderTransp, kReplMirrorConst, zorBorderLimit, zorStsBorderErr},
-        {zorBorderTransp, zorBorderAcceptTransp, zorBorderLimit, zorStsNoErr},
-        {zorBorderDefault, kReplMirrorConst, zorBorderLimit, zorStsBorderErr},
-        {zorBorderDefault, zorBorderAcceptDefault, zorBorderLimitMorph, zorStsNoErr},
+        {1, rmc, L, 0}, {3, rmc, L, 0}, {6, rmc, L, 0}, {7, rmc, L, E}, {7, zorBorderAcceptTransp, L, 0},
+        {5, rmc, L, E}, {5, zorBorderAcceptDefault, LM, 0},
         // Kinds no operation takes, whatever the set says.
-        {0, kReplMirrorConst, zorBorderLimit, zorStsBorderErr},
-        {2, kReplMirrorConst, zorBorderLimit, zorStsBorderErr},
-        {4, kReplMirrorConst, zorBorderLimit, zorStsBorderErr},
-        {8, kReplMirrorConst, zorBorderLimit, zorStsBorderErr},
-        {15, kReplMirrorConst, zorBorderLimit, zorStsBorderErr},
+        {0, rmc, L, E}, {2, rmc, L, E}, {4, rmc, L, E}, {8, rmc, L, E}, {15, rmc, L, E},
         // Flags go with any accepted kind; alone only as the full 240.
-        {zorBorderRepl | zorBorderInMemTop | zorBorderInMemLeft, kReplMirrorConst, zorBorderLimit,
-         zorStsNoErr},
-        {zorBorderConst | zorBorderInMem, kReplMirrorConst, zorBorderLimit, zorStsNoErr},
-        {zorBorderInMem, kReplMirrorConst, zorBorderLimit, zorStsNoErr},
-        {zorBorderInMem, 0, zorBorderLimit, zorStsNoErr},
-        {zorBorderInMemTop, kReplMirrorConst, zorBorderLimit, zorStsBorderErr},
-        {zorBorderInMemTop | zorBorderInMemBottom | zorBorderInMemLeft, kReplMirrorConst,
-         zorBorderLimit, zorStsBorderErr},
+        {1 | T | zorBorderInMemLeft, rmc, L, 0}, {6 | 240, rmc, L, 0}, {240, 0, L, 0},
+        {T, rmc, L, E}, {T | zorBorderInMemBottom | zorBorderInMemLeft, rmc, L, E},
         // The range comes first: morphology's wider limit, negative values.
-        {256 + zorBorderRepl, kReplMirrorConst, zorBorderLimit, zorStsBorderErr},
-        {256 + zorBorderRepl, kReplMirrorConst, zorBorderLimitMorph, zorStsNoErr},
-        {4096 + zorBorderRepl, kReplMirrorConst, zorBorderLimitMorph, zorStsBorderErr},
-        {256 + zorBorderInMem, kReplMirrorConst, zorBorderLimitMorph, zorStsBorderErr},
-        {-1, ~0u, zorBorderLimitMorph, zorStsBorderErr},
-        {INT32_MIN | zorBorderRepl, kReplMirrorConst, zorBorderLimitMorph, zorStsBorderErr},
+        {256 + 1, rmc, L, E}, {256 + 1, rmc, LM, 0}, {4096 + 1, rmc, LM, E},
+        {256 + 240, rmc, LM, E}, {-1, ~0u, LM, E}, {INT32_MIN | 1, rmc, LM, E},
     };
-    for (const Case& c : cases)
-        EXPECT_EQ(zorBorderTypeCheck(c.value, c.accepted, c.limit), c.expect)
+    for (const auto& c : cases)
+        EXPECT_EQ(zorBorderTypeCheck(c.value, c.accepted, (uint32_t)c.limit), c.expect)
             << "value " << c.value << " set 0x" << std::hex << c.accepted << " limit " << std::dec
             << c.limit;
-}
-
-TEST(BorderType, KindAndSides) {
-    const int32_t v = zorBorderMirror | zorBorderInMemTop | zorBorderInMemRight;
+    const int32_t v = zorBorderMirror | T | zorBorderInMemRight;
     EXPECT_EQ(zorBorderKind(v), zorBorderMirror);
     EXPECT_EQ(zorBorderKind(zorBorderInMem), 0);
-    EXPECT_TRUE(zorBorderSideInMem(v, zorBorderInMemTop));
-    EXPECT_TRUE(zorBorderSideInMem(v, zorBorderInMemRight));
-    EXPECT_FALSE(zorBorderSideInMem(v, zorBorderInMemBottom));
-    EXPECT_FALSE(zorBorderSideInMem(v, zorBorderInMemLeft));
+    EXPECT_TRUE(zorBorderSideInMem(v, T) && zorBorderSideInMem(v, zorBorderInMemRight));
+    EXPECT_FALSE(zorBorderSideInMem(v, zorBorderInMemBottom) || zorBorderSideInMem(v, zorBorderInMemLeft));
     EXPECT_FALSE(zorBorderSideInMem(zorBorderTransp, 4));  // a kind bit is no side
 }
 
