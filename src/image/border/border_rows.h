@@ -9,7 +9,7 @@
 #include <stddef.h>
 #include <stdint.h>
 #include <string.h>
-#include "variant.h"  // first: the level frame the rest stands on
+#include "variant.h"
 #include "simd.h"
 
 ZOR_BEGIN

@@ -18,13 +18,13 @@ MORPH_INLINE void rect3_pair(const T* r0, const T* r1, const T* r2, const T* r3,
     V c0[3], c1[3];
 #pragma GCC unroll 3
     for (int k = 0; k < 3; ++k) {
-        const V a = ld<V>(r0 + k), b = ld<V>(r1 + k), c = ld<V>(r2 + k), d = ld<V>(r3 + k);
+        const V a = simd::load<V>(r0 + k), b = simd::load<V>(r1 + k), c = simd::load<V>(r2 + k), d = simd::load<V>(r3 + k);
         const V m = Op::f(b, c);
         c0[k] = Op::f(a, m);
         c1[k] = Op::f(m, d);
     }
-    st(d0, Op::f(Op::f(c0[0], c0[1]), c0[2]));
-    st(d1, Op::f(Op::f(c1[0], c1[1]), c1[2]));
+    simd::store(d0, Op::f(Op::f(c0[0], c0[1]), c0[2]));
+    simd::store(d1, Op::f(Op::f(c1[0], c1[1]), c1[2]));
 }
 
 template <typename V, typename Op, typename T>
@@ -32,8 +32,8 @@ MORPH_INLINE void rect3_one(const T* r0, const T* r1, const T* r2, T* d0) {
     V c0[3];
 #pragma GCC unroll 3
     for (int k = 0; k < 3; ++k)
-        c0[k] = Op::f(ld<V>(r0 + k), Op::f(ld<V>(r1 + k), ld<V>(r2 + k)));
-    st(d0, Op::f(Op::f(c0[0], c0[1]), c0[2]));
+        c0[k] = Op::f(simd::load<V>(r0 + k), Op::f(simd::load<V>(r1 + k), simd::load<V>(r2 + k)));
+    simd::store(d0, Op::f(Op::f(c0[0], c0[1]), c0[2]));
 }
 
 }  // namespace
@@ -75,9 +75,9 @@ namespace {
 template <int MW, typename V, typename Op, typename T>
 MORPH_INLINE V row_fold(const T* s, int32_t mw) {
     if (MW) mw = MW;
-    V acc = ld<V>(s);
+    V acc = simd::load<V>(s);
 #pragma GCC unroll 8
-    for (int32_t c = 1; c < mw; ++c) acc = Op::f(acc, ld<V>(s + c));
+    for (int32_t c = 1; c < mw; ++c) acc = Op::f(acc, simd::load<V>(s + c));
     return acc;
 }
 
@@ -107,18 +107,18 @@ MORPH_INLINE void sep_pair(const T* sA, const T* sB, const RingRows& r, int32_t 
     const ptrdiff_t xb = x * (ptrdiff_t)sizeof(T);
     const V a = row_fold<MW, V, Op>(sA + x, mw), b = row_fold<MW, V, Op>(sB + x, mw);
     uint8_t* p = r.next;
-    V mid = ld<V>(p + xb);
+    V mid = simd::load<V>(p + xb);
 #pragma GCC unroll 8
     for (int32_t k = 2; k <= mh - 2; ++k) {
         p = wrap(p, r);
-        mid = Op::f(mid, ld<V>(p + xb));
+        mid = Op::f(mid, simd::load<V>(p + xb));
     }
     mid = Op::f(mid, a);
-    const V top = ld<V>(r.top + xb);
-    st(d0 + x, Op::f(top, mid));
-    st(d1 + x, Op::f(mid, b));
-    st(r.fresh + xb, a);
-    st(r.top + xb, b);
+    const V top = simd::load<V>(r.top + xb);
+    simd::store(d0 + x, Op::f(top, mid));
+    simd::store(d1 + x, Op::f(mid, b));
+    simd::store(r.fresh + xb, a);
+    simd::store(r.top + xb, b);
 }
 
 // A last single output (window rows 0 .. mh - 1).
@@ -129,18 +129,18 @@ MORPH_INLINE void sep_one(const T* sA, const RingRows& r, int32_t mw, int32_t mh
     const ptrdiff_t xb = x * (ptrdiff_t)sizeof(T);
     const V a = row_fold<MW, V, Op>(sA + x, mw);
     uint8_t* p = r.top;
-    V acc = ld<V>(p + xb);
+    V acc = simd::load<V>(p + xb);
 #pragma GCC unroll 8
     for (int32_t k = 1; k <= mh - 2; ++k) {
         p = wrap(p, r);
-        acc = Op::f(acc, ld<V>(p + xb));
+        acc = Op::f(acc, simd::load<V>(p + xb));
     }
-    st(d0 + x, Op::f(acc, a));
+    simd::store(d0 + x, Op::f(acc, a));
 }
 
 template <int MW, typename V, typename Op, typename T>
 MORPH_INLINE void row_only(const T* s, int32_t mw, int32_t x, T* d) {
-    st(d + x, row_fold<MW, V, Op>(s + x, mw));
+    simd::store(d + x, row_fold<MW, V, Op>(s + x, mw));
 }
 
 template <int MW, int MH, typename T, typename Op> void separable(const Job<T>& j) {
@@ -221,11 +221,11 @@ template <int MW, int MH, typename T, typename Op> bool columns_first(const Job<
                 rows[i] = row_at(j.src, j.srcStep, y + i);
             for_row<T>(x0, x1 + MW - 1, true, line0, [&](auto tag, int32_t x) MORPH_LAMBDA {
                 typedef typename decltype(tag)::type U;
-                U mid = ld<U>(rows[1] + x);
+                U mid = simd::load<U>(rows[1] + x);
 #pragma GCC unroll 8
-                for (int k = 2; k < MH; ++k) mid = Op::f(mid, ld<U>(rows[k] + x));
-                st(line0 + x, Op::f(ld<U>(rows[0] + x), mid));
-                if (pair) st(line1 + x, Op::f(mid, ld<U>(rows[MH] + x)));
+                for (int k = 2; k < MH; ++k) mid = Op::f(mid, simd::load<U>(rows[k] + x));
+                simd::store(line0 + x, Op::f(simd::load<U>(rows[0] + x), mid));
+                if (pair) simd::store(line1 + x, Op::f(mid, simd::load<U>(rows[MH] + x)));
             });
             T* d0 = row_at(j.dst, j.dstStep, y);
             for_row<T>(x0, x1, true, d0, [&](auto tag, int32_t x) MORPH_LAMBDA {
@@ -298,10 +298,10 @@ MORPH_INLINE void fixed_block(const Zor8u* const* rows, Zor8u* const* drows, int
     for (int i = 0; i < R + MH - 1; ++i) {
         const Zor8u* p = rows[i] + x + c;
         V h[Shape<MH>::maxHw + 1];
-        h[0] = ld<V>(p);
+        h[0] = simd::load<V>(p);
 #pragma GCC unroll 4
         for (int k = 1; k <= Shape<MH>::maxHw; ++k)
-            h[k] = Op::f(Op::f(h[k - 1], ld<V>(p - k)), ld<V>(p + k));
+            h[k] = Op::f(Op::f(h[k - 1], simd::load<V>(p - k)), simd::load<V>(p + k));
 #pragma GCC unroll 16
         for (int o = 0; o < R; ++o) {
             const int r = i - o;
@@ -311,7 +311,7 @@ MORPH_INLINE void fixed_block(const Zor8u* const* rows, Zor8u* const* drows, int
         }
     }
 #pragma GCC unroll 16
-    for (int o = 0; o < R; ++o) st(drows[o] + x, acc[o]);
+    for (int o = 0; o < R; ++o) simd::store(drows[o] + x, acc[o]);
 }
 
 template <typename Op, int MH, int R>
@@ -344,7 +344,9 @@ template <typename Op> void fixed_8u(const Job<Zor8u>& j) {
 // ---- 8u mask kernels with per-row data from the record -------------------------
 // Blocks of kBlock output rows (then single rows) keep their results in
 // registers while the mask is walked. 8u starts from the neutral value,
-// which changes nothing for integers.
+// which changes nothing for integers. The bodies also serve single
+// elements, so the start is V{} + value, not a broadcast: exact for every
+// neutral value.
 
 namespace {
 
@@ -366,7 +368,7 @@ MORPH_INLINE void cross_block(const RowSet& rows, Zor8u* const* drows, int32_t x
 #pragma GCC unroll 16
     for (int o = 0; o < R; ++o) col[o] = V{} + neutral8<Op>();
     for (int32_t i = 0; i < R + mh - 1; ++i) {
-        const V v = ld<V>(rows[i] + x + fc);
+        const V v = simd::load<V>(rows[i] + x + fc);
 #pragma GCC unroll 16
         for (int o = 0; o < R; ++o)
             if (i >= o && i - o < mh) col[o] = Op::f(col[o], v);
@@ -375,8 +377,8 @@ MORPH_INLINE void cross_block(const RowSet& rows, Zor8u* const* drows, int32_t x
     for (int o = 0; o < R; ++o) {
         const Zor8u* p = rows[o + fr] + x;
         V acc = col[o];
-        for (int32_t c = 0; c < mw; ++c) acc = Op::f(acc, ld<V>(p + c));
-        st(drows[o] + x, acc);
+        for (int32_t c = 0; c < mw; ++c) acc = Op::f(acc, simd::load<V>(p + c));
+        simd::store(drows[o] + x, acc);
     }
 }
 
@@ -387,7 +389,7 @@ MORPH_INLINE void cross_block_sq(const RowSet& rows, Zor8u* const* drows, int32_
     V col[R];
 #pragma GCC unroll 16
     for (int i = 0; i < R + S - 1; ++i) {
-        const V v = ld<V>(rows[i] + x + fc);
+        const V v = simd::load<V>(rows[i] + x + fc);
 #pragma GCC unroll 16
         for (int o = 0; o < R; ++o) {
             if (i < o || i - o >= S) continue;
@@ -399,8 +401,8 @@ MORPH_INLINE void cross_block_sq(const RowSet& rows, Zor8u* const* drows, int32_
         const Zor8u* p = rows[o + fr] + x;
         V acc = col[o];
 #pragma GCC unroll 16
-        for (int c = 0; c < S; ++c) acc = Op::f(acc, ld<V>(p + c));
-        st(drows[o] + x, acc);
+        for (int c = 0; c < S; ++c) acc = Op::f(acc, simd::load<V>(p + c));
+        simd::store(drows[o] + x, acc);
     }
 }
 
@@ -418,12 +420,12 @@ MORPH_INLINE void runs_block(const RowSet& rows, Zor8u* const* drows, int32_t x,
         for (int o = 0; o < R; ++o) {
             const Zor8u* p = rows[o + r] + x;
             V a = acc[o];
-            for (int32_t c = first; c <= last; ++c) a = Op::f(a, ld<V>(p + c));
+            for (int32_t c = first; c <= last; ++c) a = Op::f(a, simd::load<V>(p + c));
             acc[o] = a;
         }
     }
 #pragma GCC unroll 16
-    for (int o = 0; o < R; ++o) st(drows[o] + x, acc[o]);
+    for (int o = 0; o < R; ++o) simd::store(drows[o] + x, acc[o]);
 }
 
 template <typename V, typename Op, int R>
@@ -438,11 +440,11 @@ MORPH_INLINE void list_block(const RowSet& rows, Zor8u* const* drows, int32_t x,
         for (int32_t k = 1; k <= n; ++k) {
             const int32_t c = rd16u(list, k);
 #pragma GCC unroll 16
-            for (int o = 0; o < R; ++o) acc[o] = Op::f(acc[o], ld<V>(rows[o + r] + x + c));
+            for (int o = 0; o < R; ++o) acc[o] = Op::f(acc[o], simd::load<V>(rows[o + r] + x + c));
         }
     }
 #pragma GCC unroll 16
-    for (int o = 0; o < R; ++o) st(drows[o] + x, acc[o]);
+    for (int o = 0; o < R; ++o) simd::store(drows[o] + x, acc[o]);
 }
 
 enum MaskKind { kindCross, kindCross5, kindCross7, kindRuns, kindList };
@@ -553,13 +555,13 @@ MORPH_INLINE void block_step(const T* s, T* d, ptrdiff_t dstStep, const Load* lo
     for (int o = 0; o < R; ++o)
 #pragma GCC unroll 4
         for (int u = 0; u < U; ++u)
-            acc[o][u] = first ? V{} + Neutral<T, Op>::v : ld<V>(row_at(d, dstStep, o) + u * N);
+            acc[o][u] = first ? V{} + Neutral<T, Op>::v : simd::load<V>(row_at(d, dstStep, o) + u * N);
     for (int32_t k = 0; k < n; ++k) {
         const T* p = (const T*)((const uint8_t*)s + loads[k].off);
         const uint32_t rows = loads[k].rows;
         V v[U];
 #pragma GCC unroll 4
-        for (int u = 0; u < U; ++u) v[u] = ld<V>(p + u * N);
+        for (int u = 0; u < U; ++u) v[u] = simd::load<V>(p + u * N);
 #pragma GCC unroll 8
         for (int o = 0; o < R; ++o)
             if (rows & (1u << o))
@@ -569,14 +571,14 @@ MORPH_INLINE void block_step(const T* s, T* d, ptrdiff_t dstStep, const Load* lo
 #pragma GCC unroll 8
     for (int o = 0; o < R; ++o)
 #pragma GCC unroll 4
-        for (int u = 0; u < U; ++u) st(row_at(d, dstStep, o) + u * N, acc[o][u]);
+        for (int u = 0; u < U; ++u) simd::store(row_at(d, dstStep, o) + u * N, acc[o][u]);
 }
 
 // Output rows y .. y + R - 1 over the whole width.
 template <typename T, typename Op, int R>
 void block_rows(const Job<T>& j, int32_t y, const Load* loads, int32_t n, bool first) {
-    typedef typename VecOf<T>::type V;
-    constexpr int N = lanes<T>();
+    typedef MorphVec<T> V;
+    constexpr int N = simd::Lanes<V>::count;
     constexpr int U = kSideBySide;
     const T* s = row_at(j.src, j.srcStep, y);
     T* d = row_at(j.dst, j.dstStep, y);

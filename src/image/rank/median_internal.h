@@ -7,8 +7,11 @@
 #include <stddef.h>
 #include <stdint.h>
 #include <string.h>
-#include "variant.h"  // first: the level frame the rest stands on
+
+#include <type_traits>
+
 #include "simd.h"
+#include "variant.h"
 
 ZOR_BEGIN
 namespace median {
@@ -51,33 +54,16 @@ void general_16u(const Job<Zor16u>& j);
 void general_16s(const Job<Zor16s>& j);
 void general_32f(const Job<Zor32f>& j);
 
+// Scratch of the float masks of 625 values and more: the three counter
+// tables of the key histogram, then the window's keys.
+constexpr int32_t kKeyTableBytes = 28672;
+
 // ---- vectors of the networks ----------------------------------------------
-// n0 has no byte or word operations in 512-bit form: its integer networks
-// run at AVX2 width.
-#if defined(ZOR_LEVEL_n0)
-constexpr int kIntVectorBytes = 32;
-#else
-constexpr int kIntVectorBytes = ZOR_VECTOR_BYTES;
-#endif
-
-template <typename T> struct VecOf;
-template <> struct VecOf<Zor8u> {
-    typedef Zor8u type __attribute__((vector_size(kIntVectorBytes)));
-};
-template <> struct VecOf<Zor16u> {
-    typedef Zor16u type __attribute__((vector_size(kIntVectorBytes)));
-};
-template <> struct VecOf<Zor16s> {
-    typedef Zor16s type __attribute__((vector_size(kIntVectorBytes)));
-};
-template <> struct VecOf<Zor32f> {
-    typedef Zor32f type __attribute__((vector_size(ZOR_VECTOR_BYTES)));
-};
-
+// Integer networks run at the level's byte and word width (16 bytes on e9,
+// 32 on n0), floats at the full width.
 template <typename T>
-constexpr int lanes() {
-    return (int)(sizeof(typename VecOf<T>::type) / sizeof(T));
-}
+using NetVec = typename std::conditional<sizeof(T) == 4, simd::vec<ZOR_VECTOR_BYTES, T>,
+                                         simd::ivec<T>>::type;
 
 // One definition of min and max for scalars and vectors alike, so that a
 // row's tail gives exactly what the vector body gives (NaN included: the
@@ -92,14 +78,6 @@ template <typename V> inline void cex(V& a, V& b) {
 template <typename V> inline V med3(V a, V b, V c) {
     return vmax(vmin(a, b), vmin(vmax(a, b), c));
 }
-
-// Loads of one vector or one element from a byte address.
-template <typename V> inline V ld(const void* p) {
-    V v;
-    memcpy(&v, p, sizeof v);
-    return v;
-}
-template <typename V> inline void st(void* p, V v) { memcpy(p, &v, sizeof v); }
 
 }  // namespace median
 ZOR_END

@@ -7,8 +7,11 @@
 #include <stddef.h>
 #include <stdint.h>
 #include <string.h>
-#include "variant.h"  // first: the level frame the rest stands on
+
+#include <type_traits>
+
 #include "simd.h"
+#include "variant.h"
 
 // The helpers are small and called per vector: always inlined, so that
 // their loops unroll into registers.
@@ -65,39 +68,13 @@ MORPH_INLINE int32_t rd16s(const uint8_t* p, ptrdiff_t i) {
 }
 
 // ---- vectors ----------------------------------------------------------------
-// Integer min/max in 256 bits needs AVX2 and in 512 bits AVX-512BW: e9 runs
-// its byte and word kernels at 16 bytes and n0 at 32. Floats use the full
-// width everywhere.
-#if defined(ZOR_LEVEL_e9)
-constexpr int kIntBytes = 16;
-#elif defined(ZOR_LEVEL_n0)
-constexpr int kIntBytes = 32;
-#else
-constexpr int kIntBytes = ZOR_VECTOR_BYTES;
-#endif
+// Integer min/max runs at the level's byte and word width (16 bytes on e9,
+// 32 on n0); floats use the full width everywhere.
+template <typename T>
+using MorphVec = typename std::conditional<sizeof(T) == 4, simd::vec<ZOR_VECTOR_BYTES, T>,
+                                           simd::ivec<T>>::type;
 
-template <typename T> struct VecOf {
-    typedef T type __attribute__((vector_size(kIntBytes)));
-};
-template <> struct VecOf<Zor32f> {
-    typedef Zor32f type __attribute__((vector_size(ZOR_VECTOR_BYTES)));
-};
-
-template <typename T> constexpr int lanes() {
-    return (int)(sizeof(typename VecOf<T>::type) / sizeof(T));
-}
-
-template <typename V> MORPH_INLINE V ld(const void* p) {
-    V v;
-    memcpy(&v, p, sizeof v);
-    return v;
-}
-template <typename V> MORPH_INLINE void st(void* p, V v) { memcpy(p, &v, sizeof v); }
-
-// Narrower vectors for the end of a row.
-template <typename T, int Bytes> struct VecN {
-    typedef T type __attribute__((vector_size(Bytes)));
-};
+// The type a kernel body is instantiated with: a vector, or the element.
 template <typename V> struct Tag {
     typedef V type;
 };
@@ -106,22 +83,22 @@ template <typename V> struct Tag {
 // one vector: halves of the vector down to 8 bytes, then single elements.
 template <typename T, typename F>
 MORPH_INLINE void for_part(int32_t x, int32_t end, F& f) {
-    constexpr int B = (int)sizeof(typename VecOf<T>::type), E = (int)sizeof(T);
+    constexpr int B = (int)sizeof(MorphVec<T>), E = (int)sizeof(T);
     if constexpr (B > 32) {
         if (x + 32 / E <= end) {
-            f(Tag<typename VecN<T, 32>::type>(), x);
+            f(Tag<simd::vec<32, T>>(), x);
             x += 32 / E;
         }
     }
     if constexpr (B > 16) {
         if (x + 16 / E <= end) {
-            f(Tag<typename VecN<T, 16>::type>(), x);
+            f(Tag<simd::vec<16, T>>(), x);
             x += 16 / E;
         }
     }
     if constexpr (E < 4) {
         if (x + 8 / E <= end) {
-            f(Tag<typename VecN<T, 8>::type>(), x);
+            f(Tag<simd::vec<8, T>>(), x);
             x += 8 / E;
         }
     }
@@ -137,7 +114,7 @@ MORPH_INLINE void for_part(int32_t x, int32_t end, F& f) {
 // sees the same operations in the same order whichever width takes it.
 template <typename T, typename F>
 MORPH_INLINE void for_row(int32_t from, int32_t W, bool overlap, const T* aligned, F f) {
-    typedef typename VecOf<T>::type V;
+    typedef MorphVec<T> V;
     constexpr int B = (int)sizeof(V), E = (int)sizeof(T), N = B / E;
     int32_t x = from;
     if (W - x >= 2 * N && ((uintptr_t)aligned % E) == 0) {

@@ -117,6 +117,9 @@ struct KeyTables {
     int32_t l2[2048];  // (key >> 10) & 0x7ff, keys of the median's l1 bin
     int32_t l3[1024];  // key & 0x3ff, keys of the median's l2 bin
 };
+// The buffer query reserves kKeyTableBytes for them ahead of the keys (a
+// share sized for the documented buffer, 8 KiB more than the tables take).
+static_assert(sizeof(KeyTables) <= kKeyTableBytes, "key tables fit their scratch share");
 
 struct KeyHist {
     KeyTables* tab;
@@ -239,7 +242,7 @@ void general_32f(const Job<Zor32f>& j) {
             KeyTables tables;
             key_histogram(j, &tables, (uint32_t*)j.scratch);
         } else {
-            key_histogram(j, (KeyTables*)j.scratch, (uint32_t*)(j.scratch + 28672));
+            key_histogram(j, (KeyTables*)j.scratch, (uint32_t*)(j.scratch + kKeyTableBytes));
         }
     } else if (line) {
         line_bubble(j);

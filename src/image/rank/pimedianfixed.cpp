@@ -15,8 +15,8 @@ namespace {
 // or step(i, T()) for each element when count is below one vector.
 template <typename T, typename Step>
 inline void sweep(int32_t count, Step step) {
-    typedef typename VecOf<T>::type V;
-    constexpr int32_t L = lanes<T>();
+    typedef NetVec<T> V;
+    constexpr int32_t L = simd::Lanes<V>::count;
     if (count >= L) {
         int32_t i = 0;
         for (; i + L <= count; i += L) step(i, V());
@@ -62,37 +62,53 @@ void run_taps(const Job<T>& j, ptrdiff_t tap) {
         uint8_t* d = (uint8_t*)row_at(j.dst, j.dstStep, y);
         sweep<T>(j.width, [&](int32_t x, auto tag) {
             typedef decltype(tag) X;
-            st<X>(d + x * sizeof(T), Net::template at<X>(s + x * sizeof(T), tap));
+            simd::store(d + x * sizeof(T), Net::template at<X>(s + x * sizeof(T), tap));
         });
     }
 }
 
 struct Net3 {
     template <typename X> static X at(const uint8_t* p, ptrdiff_t t) {
-        return med3(ld<X>(p - t), ld<X>(p), ld<X>(p + t));
+        return med3(simd::load<X>(p - t), simd::load<X>(p), simd::load<X>(p + t));
     }
 };
 struct Net5 {
     template <typename X> static X at(const uint8_t* p, ptrdiff_t t) {
-        return med5(ld<X>(p - 2 * t), ld<X>(p - t), ld<X>(p), ld<X>(p + t), ld<X>(p + 2 * t));
+        return med5(simd::load<X>(p - 2 * t), simd::load<X>(p - t), simd::load<X>(p), simd::load<X>(p + t), simd::load<X>(p + 2 * t));
     }
 };
 struct Net7 {
     template <typename X> static X at(const uint8_t* p, ptrdiff_t t) {
-        return med7(ld<X>(p - 3 * t), ld<X>(p - 2 * t), ld<X>(p - t), ld<X>(p), ld<X>(p + t),
-                    ld<X>(p + 2 * t), ld<X>(p + 3 * t));
+        return med7(simd::load<X>(p - 3 * t), simd::load<X>(p - 2 * t), simd::load<X>(p - t), simd::load<X>(p), simd::load<X>(p + t),
+                    simd::load<X>(p + 2 * t), simd::load<X>(p + 3 * t));
     }
 };
 
 // Output columns per pass of the sorted-column kernels.
 constexpr int32_t kChunk = 256;
 
-// 3x3: every column of three is sorted once into low, middle and high
-// rows; an output is the median of the greatest low, the median middle and
-// the least high of its three columns.
+// A column of three sorted by three compare-exchanges, and the 3x3 median
+// of three neighbouring sorted columns: the median of the greatest low,
+// the median middle and the least high.
+template <typename X> struct Sorted3 {
+    X lo, mid, hi;
+};
+template <typename X> inline Sorted3<X> sort3(X a, X b, X c) {
+    const X ab = vmin(a, b), ba = vmax(a, b);
+    return {vmin(ab, c), vmax(ab, vmin(ba, c)), vmax(ba, c)};
+}
+template <typename X>
+inline X combine3(const Sorted3<X>& l, const Sorted3<X>& m, const Sorted3<X>& r) {
+    const X lo = vmax(vmax(l.lo, m.lo), r.lo);
+    const X hi = vmin(vmin(l.hi, m.hi), r.hi);
+    return med3(lo, med3(l.mid, m.mid, r.mid), hi);
+}
+
+// 3x3: every column is sorted once into low, middle and high rows, which
+// the outputs of a pass then combine.
 template <typename T>
 void square3(const Job<T>& j) {
-    constexpr int32_t L = lanes<T>();
+    constexpr int32_t L = simd::Lanes<NetVec<T>>::count;
     T lo[kChunk + 2 + L], mid[kChunk + 2 + L], hi[kChunk + 2 + L];
     for (int32_t y = 0; y < j.height; ++y) {
         const uint8_t* r1 = (const uint8_t*)row_at(j.src, j.srcStep, y);
@@ -109,18 +125,20 @@ void square3(const Job<T>& j) {
                 // on their way in while this row is worked on.
                 __builtin_prefetch(r2 + j.srcStep + o);
                 __builtin_prefetch(d + j.dstStep + o, 1);
-                const X a = ld<X>(r0 + o), b = ld<X>(r1 + o), c = ld<X>(r2 + o);
-                const X ab = vmin(a, b), ba = vmax(a, b);
-                st<X>(lo + i, vmin(ab, c));
-                st<X>(hi + i, vmax(ba, c));
-                st<X>(mid + i, vmax(ab, vmin(ba, c)));
+                const Sorted3<X> c = sort3(simd::load<X>(r0 + o), simd::load<X>(r1 + o),
+                                           simd::load<X>(r2 + o));
+                simd::store(lo + i, c.lo);
+                simd::store(mid + i, c.mid);
+                simd::store(hi + i, c.hi);
             });
             sweep<T>(n, [&](int32_t i, auto tag) {
                 typedef decltype(tag) X;
-                const X l = vmax(vmax(ld<X>(lo + i), ld<X>(lo + i + 1)), ld<X>(lo + i + 2));
-                const X h = vmin(vmin(ld<X>(hi + i), ld<X>(hi + i + 1)), ld<X>(hi + i + 2));
-                const X m = med3(ld<X>(mid + i), ld<X>(mid + i + 1), ld<X>(mid + i + 2));
-                st<X>(d + (ptrdiff_t)(x0 + i) * (ptrdiff_t)sizeof(T), med3(l, m, h));
+                Sorted3<X> c[3];
+                for (int k = 0; k < 3; ++k)
+                    c[k] = {simd::load<X>(lo + i + k), simd::load<X>(mid + i + k),
+                            simd::load<X>(hi + i + k)};
+                simd::store(d + (ptrdiff_t)(x0 + i) * (ptrdiff_t)sizeof(T),
+                            combine3(c[0], c[1], c[2]));
             });
         }
     }
@@ -133,9 +151,9 @@ void square3(const Job<T>& j) {
 // Only 64-byte vectors gain: narrower levels shuffle across lanes in
 // several instructions and keep square3.
 #if ZOR_VECTOR_BYTES == 64
-typedef VecOf<Zor32f>::type VF;
-typedef int32_t VI __attribute__((vector_size(sizeof(VF))));
-constexpr int kFloatLanes = (int)(sizeof(VF) / sizeof(Zor32f));
+typedef NetVec<Zor32f> VF;
+typedef simd::vec<sizeof(VF), int32_t> VI;
+constexpr int kFloatLanes = simd::Lanes<VF>::count;
 
 // Lane i of the result is lane i + by of the concatenation (a, b).
 template <int By> inline VF lanes_from(VF a, VF b) {
@@ -143,22 +161,13 @@ template <int By> inline VF lanes_from(VF a, VF b) {
     for (int i = 0; i < kFloatLanes; ++i) m[i] = i + By;
     return __builtin_shuffle(a, b, m);
 }
-
-struct Sorted3 {
-    VF lo, mid, hi;
-};
-
-inline Sorted3 sort_column(const uint8_t* r0, ptrdiff_t step, ptrdiff_t o) {
-    const VF a = ld<VF>(r0 + o), b = ld<VF>(r0 + step + o), c = ld<VF>(r0 + 2 * step + o);
-    const VF ab = vmin(a, b), ba = vmax(a, b);
-    return {vmin(ab, c), vmax(ab, vmin(ba, c)), vmax(ba, c)};
+template <int By> inline Sorted3<VF> lanes_from(const Sorted3<VF>& a, const Sorted3<VF>& b) {
+    return {lanes_from<By>(a.lo, b.lo), lanes_from<By>(a.mid, b.mid), lanes_from<By>(a.hi, b.hi)};
 }
 
-inline VF combine3(const Sorted3& l, const Sorted3& m, const Sorted3& r) {
-    const VF lo = vmax(vmax(l.lo, m.lo), r.lo);
-    const VF hi = vmin(vmin(l.hi, m.hi), r.hi);
-    const VF mid = med3(l.mid, m.mid, r.mid);
-    return med3(lo, mid, hi);
+inline Sorted3<VF> sort_column(const uint8_t* r0, ptrdiff_t step, ptrdiff_t o) {
+    return sort3(simd::load<VF>(r0 + o), simd::load<VF>(r0 + step + o),
+                 simd::load<VF>(r0 + 2 * step + o));
 }
 
 void square3_32f(const Job<Zor32f>& j) {
@@ -167,26 +176,24 @@ void square3_32f(const Job<Zor32f>& j) {
     for (int32_t y = 0; y < j.height; ++y) {
         const uint8_t* r0 = (const uint8_t*)row_at(j.src, j.srcStep, (ptrdiff_t)y - 1);
         uint8_t* d = (uint8_t*)row_at(j.dst, j.dstStep, y);
-        // prev holds columns x - L .. x - 1, cur x .. x + L - 1.
-        Sorted3 prev = sort_column(r0, j.srcStep, -L * E), cur = sort_column(r0, j.srcStep, 0);
+        // left holds columns x - 1 .. x + L - 2, cur x .. x + L - 1. The
+        // first left is loaded: column -1 is the only one left of the ROI
+        // that may be read.
+        Sorted3<VF> left = sort_column(r0, j.srcStep, -E), cur = sort_column(r0, j.srcStep, 0);
         int32_t x = 0;
         for (; x + 2 * L <= j.width; x += L) {
-            const Sorted3 next = sort_column(r0, j.srcStep, (x + L) * E);
-            const Sorted3 left = {lanes_from<L - 1>(prev.lo, cur.lo),
-                                  lanes_from<L - 1>(prev.mid, cur.mid),
-                                  lanes_from<L - 1>(prev.hi, cur.hi)};
-            const Sorted3 right = {lanes_from<1>(cur.lo, next.lo), lanes_from<1>(cur.mid, next.mid),
-                                   lanes_from<1>(cur.hi, next.hi)};
-            st<VF>(d + x * E, combine3(left, cur, right));
-            prev = cur;
+            const Sorted3<VF> next = sort_column(r0, j.srcStep, (x + L) * E);
+            simd::store(d + x * E, combine3(left, cur, lanes_from<1>(cur, next)));
+            left = lanes_from<L - 1>(cur, next);
             cur = next;
         }
         // The last vector ends at the row's end; its neighbours are loaded.
         for (; x < j.width; x += L) {
             if (x + L > j.width) x = j.width - L;
             const ptrdiff_t o = x * E;
-            st<VF>(d + o, combine3(sort_column(r0, j.srcStep, o - E), sort_column(r0, j.srcStep, o),
-                                   sort_column(r0, j.srcStep, o + E)));
+            simd::store(d + o, combine3(sort_column(r0, j.srcStep, o - E),
+                                        sort_column(r0, j.srcStep, o),
+                                        sort_column(r0, j.srcStep, o + E)));
         }
     }
 }
@@ -301,7 +308,7 @@ inline X select25(const X* c0, const X* c1, const X* c2, const X* c3, const X* c
 
 template <typename T>
 void square5(const Job<T>& j) {
-    constexpr int32_t L = lanes<T>();
+    constexpr int32_t L = simd::Lanes<NetVec<T>>::count;
     T col[5][kChunk + 4 + L];
     for (int32_t y = 0; y < j.height; ++y) {
         const uint8_t* r[5];
@@ -315,8 +322,8 @@ void square5(const Job<T>& j) {
             sweep<T>(n + 4, [&](int32_t i, auto tag) {
                 typedef decltype(tag) X;
                 const ptrdiff_t o = at + (ptrdiff_t)i * (ptrdiff_t)sizeof(T);
-                X p0 = ld<X>(r[0] + o), p1 = ld<X>(r[1] + o), p2 = ld<X>(r[2] + o),
-                  p3 = ld<X>(r[3] + o), p4 = ld<X>(r[4] + o);
+                X p0 = simd::load<X>(r[0] + o), p1 = simd::load<X>(r[1] + o), p2 = simd::load<X>(r[2] + o),
+                  p3 = simd::load<X>(r[3] + o), p4 = simd::load<X>(r[4] + o);
                 cex(p0, p1);
                 cex(p3, p4);
                 cex(p2, p4);
@@ -326,18 +333,18 @@ void square5(const Job<T>& j) {
                 cex(p1, p4);
                 cex(p1, p3);
                 cex(p1, p2);
-                st<X>(col[0] + i, p0);
-                st<X>(col[1] + i, p1);
-                st<X>(col[2] + i, p2);
-                st<X>(col[3] + i, p3);
-                st<X>(col[4] + i, p4);
+                simd::store(col[0] + i, p0);
+                simd::store(col[1] + i, p1);
+                simd::store(col[2] + i, p2);
+                simd::store(col[3] + i, p3);
+                simd::store(col[4] + i, p4);
             });
             sweep<T>(n, [&](int32_t i, auto tag) {
                 typedef decltype(tag) X;
                 X c[5][5];
                 for (int k = 0; k < 5; ++k)
-                    for (int r = 0; r < 5; ++r) c[k][r] = ld<X>(col[r] + i + k);
-                st<X>(d + (ptrdiff_t)(x0 + i) * (ptrdiff_t)sizeof(T),
+                    for (int r = 0; r < 5; ++r) c[k][r] = simd::load<X>(col[r] + i + k);
+                simd::store(d + (ptrdiff_t)(x0 + i) * (ptrdiff_t)sizeof(T),
                       select25<X>(c[0], c[1], c[2], c[3], c[4]));
             });
         }
@@ -353,7 +360,7 @@ template <typename X>
 inline X forget49(const uint8_t* p, ptrdiff_t step) {
     X s[26];
 #pragma GCC unroll 26
-    for (int k = 0; k < 26; ++k) s[k] = ld<X>(p + (k / 7) * step + k % 7);
+    for (int k = 0; k < 26; ++k) s[k] = simd::load<X>(p + (k / 7) * step + k % 7);
 #pragma GCC unroll 23
     for (int r = 0; r < 23; ++r) {
 #pragma GCC unroll 25
@@ -361,7 +368,7 @@ inline X forget49(const uint8_t* p, ptrdiff_t step) {
 #pragma GCC unroll 24
         for (int i = r + 1; i < 25; ++i) cex(s[i], s[25]);
         const int k = 26 + r;
-        s[25] = ld<X>(p + (k / 7) * step + k % 7);
+        s[25] = simd::load<X>(p + (k / 7) * step + k % 7);
     }
     return med3(s[23], s[24], s[25]);
 }
@@ -370,14 +377,14 @@ inline X forget49(const uint8_t* p, ptrdiff_t step) {
 
 // Rows of at least one vector; the last vector ends at the row's end.
 void square7_8u(const Job<Zor8u>& j) {
-    typedef VecOf<Zor8u>::type V;
-    constexpr int32_t L = lanes<Zor8u>();
+    typedef NetVec<Zor8u> V;
+    constexpr int32_t L = simd::Lanes<V>::count;
     for (int32_t y = 0; y < j.height; ++y) {
         const uint8_t* top = row_at(j.src, j.srcStep, (ptrdiff_t)y - 3) - 3;
         uint8_t* d = row_at(j.dst, j.dstStep, y);
         for (int32_t x = 0;; x += L) {
             if (x + L > j.width) x = j.width - L;
-            st<V>(d + x, forget49<V>(top + x, j.srcStep));
+            simd::store(d + x, forget49<V>(top + x, j.srcStep));
             if (x + L == j.width) break;
         }
     }

@@ -294,7 +294,7 @@ void general_8u(const Job<Zor8u>& j) {
         column_bubble_8u(j);
         return;
     }
-    if (j.kw == 7 && j.kh == 7 && j.width >= lanes<Zor8u>()) {
+    if (j.kw == 7 && j.kh == 7 && j.width >= simd::Lanes<NetVec<Zor8u>>::count) {
         square7_8u(j);
         return;
     }

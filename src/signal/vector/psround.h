@@ -6,7 +6,7 @@
 // the level frame of variant.h.
 #ifndef ZOR_PSROUND_H
 #define ZOR_PSROUND_H
-#include "variant.h"  // first: the level frame the rest stands on
+#include "variant.h"
 ZOR_BEGIN
 
 template <typename T> inline T rounded(T x) {
