@@ -3,7 +3,7 @@
 // at the sides that need made-up pixels (top, bottom, left, right), each run
 // over a small temporary that a border copy has framed, and the centre, run
 // straight on the caller's image. A ROI not larger than the window is framed
-// whole. So no kernel ever tests a coordinate. Include after variant.h.
+// whole. So no kernel ever tests a coordinate.
 #ifndef ZOR_BANDS_H
 #define ZOR_BANDS_H
 
@@ -12,6 +12,7 @@
 
 #include "border_type.h"
 #include "simd.h"
+#include "variant.h"
 
 ZOR_BEGIN
 namespace bands {

@@ -2,7 +2,7 @@
 // rectangle. A record is laid out the same on every level (it may be made
 // under one level and used under another), so its head is a fixed struct
 // of 128 bytes at the first 64-byte boundary of the caller's block.
-// Included by variant sources only, after variant.h.
+// Included by variant sources only.
 #ifndef ZOR_PIFILTER_H
 #define ZOR_PIFILTER_H
 

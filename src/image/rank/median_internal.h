@@ -1,6 +1,6 @@
 // Median filter, shared by the driver and the kernel sources of one level:
 // the job a kernel gets, the kernel table and the vector helpers of the
-// min/max networks. Include after variant.h.
+// min/max networks.
 #ifndef ZOR_MEDIAN_INTERNAL_H
 #define ZOR_MEDIAN_INTERNAL_H
 

@@ -1,6 +1,6 @@
 // Erosion and dilation, shared by the driver (cvmorph.cpp) and the kernels
 // (cvmorph_new.cpp) of one level: the record's head, the job a kernel gets,
-// and the min/max and vector helpers. Include after variant.h.
+// and the min/max and vector helpers.
 #ifndef ZOR_MORPH_INTERNAL_H
 #define ZOR_MORPH_INTERNAL_H
 
