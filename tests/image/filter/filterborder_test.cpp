@@ -468,7 +468,7 @@ TEST_P(FilterBorder, SizeChecksInOrder) {
         row(zorStsDataTypeErr, "64f data, float taps", {3, 3}, {5, 5}, 19, 13, 0, nullptr, nullptr),
         row(zorStsDataTypeErr, "kernel type", {3, 3}, {5, 5}, 1, 5, 0, nullptr, nullptr),
         row(zorStsChannelErr, "channels", {3, 3}, {5, 5}, 13, 13, 5, nullptr, nullptr),
-        row(zorStsNullPtrErr, "spec size", {3, 3}, {5, 5}, 13, 13, 4, nullptr, &buf),
+        row(zorStsNullPtrErr, "record size", {3, 3}, {5, 5}, 13, 13, 4, nullptr, &buf),
         row(zorStsNullPtrErr, "buffer size", {3, 3}, {5, 5}, 13, 13, 4, &rec, nullptr),
         row(zorStsNoErr, "valid", {3, 3}, {5, 5}, 13, 13, 4, &rec, &buf),
     });
