@@ -89,8 +89,9 @@ inline int32_t band_width(int32_t outer, int32_t inner, bool mirror) {
 // the larger of a top or bottom band of W + left + right pixels by up +
 // down + (the band's rows) rows and a side band of left + right + (its
 // columns) pixels by H + up + down rows. A failing frame copy stops the
-// cut with its status; the first copy is the widest, so a failure comes
-// before any output is made.
+// cut with its status. After the callers' checks only a temporary row too
+// long for a 32-bit step can fail, and the full-width bands, which come
+// first, have the longest rows: a failure comes before any output.
 template <typename T, typename Run>
 ZorStatus cut(const T* src, int32_t srcStep, int32_t W, int32_t H, Reach r, const Border<T>& b,
               T* tmp, Run run) {

@@ -39,6 +39,12 @@ template <int W, typename T> using vec = typename VecType<W, T>::type;
 // Integer vectors at the width the level's byte and word instructions have.
 template <typename T> using ivec = vec<ZOR_INT_VECTOR_BYTES, T>;
 
+// T at the width the level computes it in: floating point at the full
+// width, integers at the width of the integer instructions.
+template <typename T>
+using native = typename std::conditional<std::is_floating_point<T>::value,
+                                         vec<ZOR_VECTOR_BYTES, T>, ivec<T>>::type;
+
 template <typename V> struct Lanes {
     typedef __typeof__((*(V*)0)[0]) Element;
     static constexpr int count = sizeof(V) / sizeof(Element);
@@ -61,6 +67,21 @@ template <typename V> inline V broadcast(typename Lanes<V>::Element x) {
     V v = V{};
     for (int i = 0; i < Lanes<V>::count; ++i) v[i] = x;
     return v;
+}
+
+// Lane i of the result is lane i + By of the concatenation (a, b): the
+// vector By lanes further along a row whose neighbouring vectors are a, b.
+template <int By, typename V> inline V lanes_from(V a, V b) {
+    typedef typename Lanes<V>::Element E;
+    typedef typename std::conditional<
+        sizeof(E) == 1, int8_t,
+        typename std::conditional<sizeof(E) == 2, int16_t,
+                                  typename std::conditional<sizeof(E) == 4, int32_t,
+                                                            int64_t>::type>::type>::type I;
+    static_assert(By >= 0 && By <= Lanes<V>::count, "a shift within the two vectors");
+    vec<sizeof(V), I> m;
+    for (int i = 0; i < Lanes<V>::count; ++i) m[i] = (I)(i + By);
+    return __builtin_shuffle(a, b, m);
 }
 
 // Store past the caches (p vector aligned); a store_fence() orders such

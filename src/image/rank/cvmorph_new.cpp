@@ -577,7 +577,7 @@ MORPH_INLINE void block_step(const T* s, T* d, ptrdiff_t dstStep, const Load* lo
 // Output rows y .. y + R - 1 over the whole width.
 template <typename T, typename Op, int R>
 void block_rows(const Job<T>& j, int32_t y, const Load* loads, int32_t n, bool first) {
-    typedef MorphVec<T> V;
+    typedef simd::native<T> V;
     constexpr int N = simd::Lanes<V>::count;
     constexpr int U = kSideBySide;
     const T* s = row_at(j.src, j.srcStep, y);

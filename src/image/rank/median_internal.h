@@ -8,8 +8,6 @@
 #include <stdint.h>
 #include <string.h>
 
-#include <type_traits>
-
 #include "simd.h"
 #include "variant.h"
 
@@ -59,11 +57,8 @@ void general_32f(const Job<Zor32f>& j);
 constexpr int32_t kKeyTableBytes = 28672;
 
 // ---- vectors of the networks ----------------------------------------------
-// Integer networks run at the level's byte and word width (16 bytes on e9,
-// 32 on n0), floats at the full width.
-template <typename T>
-using NetVec = typename std::conditional<sizeof(T) == 4, simd::vec<ZOR_VECTOR_BYTES, T>,
-                                         simd::ivec<T>>::type;
+// simd::native<T>: integer networks run at the level's byte and word width
+// (16 bytes on e9, 32 on n0), floats at the full width.
 
 // One definition of min and max for scalars and vectors alike, so that a
 // row's tail gives exactly what the vector body gives (NaN included: the

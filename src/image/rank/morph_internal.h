@@ -8,8 +8,6 @@
 #include <stdint.h>
 #include <string.h>
 
-#include <type_traits>
-
 #include "simd.h"
 #include "variant.h"
 
@@ -68,11 +66,8 @@ MORPH_INLINE int32_t rd16s(const uint8_t* p, ptrdiff_t i) {
 }
 
 // ---- vectors ----------------------------------------------------------------
-// Integer min/max runs at the level's byte and word width (16 bytes on e9,
-// 32 on n0); floats use the full width everywhere.
-template <typename T>
-using MorphVec = typename std::conditional<sizeof(T) == 4, simd::vec<ZOR_VECTOR_BYTES, T>,
-                                           simd::ivec<T>>::type;
+// simd::native<T>: integer min/max runs at the level's byte and word width
+// (16 bytes on e9, 32 on n0); floats use the full width everywhere.
 
 // The type a kernel body is instantiated with: a vector, or the element.
 template <typename V> struct Tag {
@@ -83,7 +78,7 @@ template <typename V> struct Tag {
 // one vector: halves of the vector down to 8 bytes, then single elements.
 template <typename T, typename F>
 MORPH_INLINE void for_part(int32_t x, int32_t end, F& f) {
-    constexpr int B = (int)sizeof(MorphVec<T>), E = (int)sizeof(T);
+    constexpr int B = (int)sizeof(simd::native<T>), E = (int)sizeof(T);
     if constexpr (B > 32) {
         if (x + 32 / E <= end) {
             f(Tag<simd::vec<32, T>>(), x);
@@ -114,7 +109,7 @@ MORPH_INLINE void for_part(int32_t x, int32_t end, F& f) {
 // sees the same operations in the same order whichever width takes it.
 template <typename T, typename F>
 MORPH_INLINE void for_row(int32_t from, int32_t W, bool overlap, const T* aligned, F f) {
-    typedef MorphVec<T> V;
+    typedef simd::native<T> V;
     constexpr int B = (int)sizeof(V), E = (int)sizeof(T), N = B / E;
     int32_t x = from;
     if (W - x >= 2 * N && ((uintptr_t)aligned % E) == 0) {

@@ -15,7 +15,7 @@ namespace {
 // or step(i, T()) for each element when count is below one vector.
 template <typename T, typename Step>
 inline void sweep(int32_t count, Step step) {
-    typedef NetVec<T> V;
+    typedef simd::native<T> V;
     constexpr int32_t L = simd::Lanes<V>::count;
     if (count >= L) {
         int32_t i = 0;
@@ -108,7 +108,7 @@ inline X combine3(const Sorted3<X>& l, const Sorted3<X>& m, const Sorted3<X>& r)
 // the outputs of a pass then combine.
 template <typename T>
 void square3(const Job<T>& j) {
-    constexpr int32_t L = simd::Lanes<NetVec<T>>::count;
+    constexpr int32_t L = simd::Lanes<simd::native<T>>::count;
     T lo[kChunk + 2 + L], mid[kChunk + 2 + L], hi[kChunk + 2 + L];
     for (int32_t y = 0; y < j.height; ++y) {
         const uint8_t* r1 = (const uint8_t*)row_at(j.src, j.srcStep, y);
@@ -151,18 +151,13 @@ void square3(const Job<T>& j) {
 // Only 64-byte vectors gain: narrower levels shuffle across lanes in
 // several instructions and keep square3.
 #if ZOR_VECTOR_BYTES == 64
-typedef NetVec<Zor32f> VF;
-typedef simd::vec<sizeof(VF), int32_t> VI;
+typedef simd::native<Zor32f> VF;
 constexpr int kFloatLanes = simd::Lanes<VF>::count;
 
-// Lane i of the result is lane i + by of the concatenation (a, b).
-template <int By> inline VF lanes_from(VF a, VF b) {
-    VI m;
-    for (int i = 0; i < kFloatLanes; ++i) m[i] = i + By;
-    return __builtin_shuffle(a, b, m);
-}
+// The sorted columns By lanes further along.
 template <int By> inline Sorted3<VF> lanes_from(const Sorted3<VF>& a, const Sorted3<VF>& b) {
-    return {lanes_from<By>(a.lo, b.lo), lanes_from<By>(a.mid, b.mid), lanes_from<By>(a.hi, b.hi)};
+    return {simd::lanes_from<By>(a.lo, b.lo), simd::lanes_from<By>(a.mid, b.mid),
+            simd::lanes_from<By>(a.hi, b.hi)};
 }
 
 inline Sorted3<VF> sort_column(const uint8_t* r0, ptrdiff_t step, ptrdiff_t o) {
@@ -308,7 +303,7 @@ inline X select25(const X* c0, const X* c1, const X* c2, const X* c3, const X* c
 
 template <typename T>
 void square5(const Job<T>& j) {
-    constexpr int32_t L = simd::Lanes<NetVec<T>>::count;
+    constexpr int32_t L = simd::Lanes<simd::native<T>>::count;
     T col[5][kChunk + 4 + L];
     for (int32_t y = 0; y < j.height; ++y) {
         const uint8_t* r[5];
@@ -377,7 +372,7 @@ inline X forget49(const uint8_t* p, ptrdiff_t step) {
 
 // Rows of at least one vector; the last vector ends at the row's end.
 void square7_8u(const Job<Zor8u>& j) {
-    typedef NetVec<Zor8u> V;
+    typedef simd::native<Zor8u> V;
     constexpr int32_t L = simd::Lanes<V>::count;
     for (int32_t y = 0; y < j.height; ++y) {
         const uint8_t* top = row_at(j.src, j.srcStep, (ptrdiff_t)y - 3) - 3;

@@ -98,18 +98,21 @@ inline uint64_t word_at(const uint16_t* counts, int32_t w) {
     return v;
 }
 
+// Window rows a block keeps pointers for: kh + R - 1 of them.
+constexpr int32_t kBlockWindowRows = 64;
+
 template <int R>
 void sliding_8u_rows(const Job<Zor8u>& j, int32_t y) {
     const int32_t kw = j.kw, kh = j.kh, rx = kw >> 1, ry = kh >> 1;
     const uint32_t t = (uint32_t)(kw * kh) >> 1;
     const ptrdiff_t step = j.srcStep;
     uint16_t shared[256], own[R][256];
-    uint64_t under[64];  // lane i: word under median i's word
+    uint64_t under[256 / 4];  // per word of bins, lane i: under median i's word
     // Window rows u = 0 .. kh + R - 2 from the first output row's top; row u
     // belongs to outputs lo .. hi. Rows of all outputs come first.
     const Zor8u* top = row_at(j.src, step, (ptrdiff_t)y - ry);
-    const Zor8u* rows[64];  // kh + R - 1 of them, at most 64
-    int32_t lo[64], hi[64];
+    const Zor8u* rows[kBlockWindowRows];
+    int32_t lo[kBlockWindowRows], hi[kBlockWindowRows];
     int32_t nShared = 0, nRows = 0;
     for (int32_t u = R - 1; u < kh; ++u, ++nShared, ++nRows) rows[nRows] = row_at(top, step, u);
     for (int32_t u = 0; u < kh + R - 1; ++u) {
@@ -294,14 +297,14 @@ void general_8u(const Job<Zor8u>& j) {
         column_bubble_8u(j);
         return;
     }
-    if (j.kw == 7 && j.kh == 7 && j.width >= simd::Lanes<NetVec<Zor8u>>::count) {
+    if (j.kw == 7 && j.kh == 7 && j.width >= simd::Lanes<simd::native<Zor8u>>::count) {
         square7_8u(j);
         return;
     }
     // A mask one row high shares nothing between rows; 16-bit counters
-    // hold n below 32768.
+    // hold n below 32768; a block of four outputs has kh + 3 window rows.
     int32_t y = 0;
-    if (j.kh > 1 && j.kw * j.kh < 32768 && j.kh < 61) {
+    if (j.kh > 1 && j.kw * j.kh < 32768 && j.kh + 3 < kBlockWindowRows) {
         for (; y + 3 < j.height; y += 4) sliding_8u_rows<4>(j, y);
         for (; y + 1 < j.height; y += 2) sliding_8u_rows<2>(j, y);
     }
