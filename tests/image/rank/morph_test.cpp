@@ -369,7 +369,7 @@ TEST(MorphRecord, SizeAndInitChecksInOrder) {
         auto init = [](ZoriSize r, const Zor8u* mk, ZoriSize k, ZoriMorphState* sp, Zor8u* p) {
             return [=] { return Api<T>::init(r, mk, k, sp, p); };
         };
-        zortest::run_checks({{zorStsNullPtrErr, "spec", size({0, 5}, {3, 3}, nullptr, &b)},
+        zortest::run_checks({{zorStsNullPtrErr, "record", size({0, 5}, {3, 3}, nullptr, &b)},
                              {zorStsNullPtrErr, "buf", size({0, 5}, {3, 3}, &s, nullptr)},
                              {zorStsSizeErr, "roi", size({0, 5}, {3, 0}, &s, &b)},
                              {zorStsSizeErr, "mask", size({5, 5}, {3, 0}, &s, &b)},
