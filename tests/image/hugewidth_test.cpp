@@ -55,12 +55,10 @@ std::vector<Op> ops() {
         {"Abs_32f", {P, P}, CALL(zoriAbs_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r))},
         {"Sqr_32f", {P, P}, CALL(zoriSqr_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r))},
         {"Div_8u_Sfs", {P, P, P}, CALL(zoriDiv_8u_C1RSfs(A(Zor8u), S(0), A(Zor8u), S(1), A(Zor8u), S(2), r, 0))},
-        {"Div_16s_Sfs", {P, P, P}, CALL(zoriDiv_16s_C1RSfs(A(Zor16s), S(0), A(Zor16s), S(1), A(Zor16s), S(2), r, 0))},
         {"CompareC_32f", {P, P}, CALL(zoriCompareC_32f_C1R(A(Zor32f), S(0), A(Zor8u), S(1), r, 0, 1.0f))},
+        // The thresholds share one check; so do the scaled divisions, and
+        // the morphology and filter forms across types of one width rule.
         {"Threshold_GT_32f", {P, P}, CALL(zoriThreshold_GT_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f))},
-        {"Threshold_LT_32f", {P, P}, CALL(zoriThreshold_LT_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f))},
-        {"Threshold_GTVal_32f", {P, P}, CALL(zoriThreshold_GTVal_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f, 2.0f))},
-        {"Threshold_LTVal_32f", {P, P}, CALL(zoriThreshold_LTVal_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, 1.0f, 2.0f))},
         {"Not_8u", {P, P}, CALL(zoriNot_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), r))},
         {"CopyConstBorder_8u", {P, P}, CALL(zoriCopyConstBorder_8u_C1R(A(Zor8u), S(0), r, A(Zor8u), S(1), r, 0, 0, 7))},
         {"CopyConstBorder_32f", {P, P}, CALL(zoriCopyConstBorder_32f_C1R(A(Zor32f), S(0), r, A(Zor32f) + 4, S(1), r, 0, 0, 7.0f))},
@@ -68,13 +66,11 @@ std::vector<Op> ops() {
         {"FilterMedianBorder_16u", {E2, E2}, CALL(zoriFilterMedianBorder_16u_C1R(A(Zor16u), S(0), A(Zor16u), S(1), r, {3, 3}, (ZoriBorderType)repl, 0, p))},
         {"FilterMedianBorder_32f", {E4, E4}, CALL(zoriFilterMedianBorder_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, {3, 3}, (ZoriBorderType)repl, 0, p))},
         {"FilterBorder_8u", {P, R1}, CALL(zoriFilterBorder_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), r, repl, A(Zor8u), A(const ZoriFilterBorderSpec), p))},
-        {"FilterBorder_16s", {P, R2}, CALL(zoriFilterBorder_16s_C1R(A(Zor16s), S(0), A(Zor16s), S(1), r, repl, A(Zor16s), A(const ZoriFilterBorderSpec), p))},
         {"FilterBorder_32f", {P, R4}, CALL(zoriFilterBorder_32f_C1R(A(Zor32f), S(0), A(Zor32f), S(1), r, repl, A(Zor32f), A(const ZoriFilterBorderSpec), p))},
         // A one-pixel kernel: the source row is as long as the destination's.
         {"Filter_64f", {R8, R8}, CALL(zoriFilter_64f_C1R(A(Zor64f), S(0), A(Zor64f), S(1), r, A(Zor64f), {1, 1}, {0, 0}, p))},
         {"ErodeBorder_8u", {R1, R1}, CALL(zoriErodeBorder_8u_C1R(A(Zor8u), S(0), A(Zor8u), S(1), r, repl, 0, A(const ZoriMorphState), p))},
         {"DilateBorder_16u", {R2E, R2E}, CALL(zoriDilateBorder_16u_C1R(A(Zor16u), S(0), A(Zor16u) + 8, S(1), r, repl, 0, A(const ZoriMorphState), p))},
-        {"ErodeBorder_16s", {R2E, R2E}, CALL(zoriErodeBorder_16s_C1R(A(Zor16s), S(0), A(Zor16s) + 8, S(1), r, repl, 0, A(const ZoriMorphState), p))},
         {"DilateBorder_32f", {R4E, R4E}, CALL(zoriDilateBorder_32f_C1R(A(Zor32f), S(0), A(Zor32f) + 4, S(1), r, repl, 0, A(const ZoriMorphState), p))},
     };
 }

@@ -424,6 +424,9 @@ TEST_P(Point, MinMaxMatchesTheLaneModel) {
         for (int32_t step : steps_for(g.width * 4, 4, kFree)) {
             Image<float> src = image<float>(g.width, g.height, step, misalign(4, false, turn++));
             src.randomize(r);
+            // Now and then one infinity throughout: it cannot be reported
+            // past the start constants.
+            if (turn % 9 == 0) src.fill([&](int32_t, int32_t) { return bits_f(turn % 2 ? 0x7f800000u : 0xff800000u); });
             const Image<float> before = src;
             float mn = 0, mx = 0, wantMin, wantMax;
             minmax_model(src, &wantMin, &wantMax);
@@ -431,15 +434,6 @@ TEST_P(Point, MinMaxMatchesTheLaneModel) {
             ASSERT_EQ(f_bits(mn), f_bits(wantMin)) << g.width << "x" << g.height << " step " << step;
             ASSERT_EQ(f_bits(mx), f_bits(wantMax)) << g.width << "x" << g.height << " step " << step;
             ASSERT_TRUE(same_bytes(src, before));
-        }
-    // Images of one infinity cannot report it past the start constants.
-    for (int32_t w : {1, 50})
-        for (uint32_t inf : {0x7f800000u, 0xff800000u}) {
-            std::vector<float> img((size_t)w * 2, bits_f(inf));
-            float mn, mx;
-            ASSERT_EQ(zoriMinMax_32f_C1R(img.data(), w * 4, {w, 2}, &mn, &mx), zorStsNoErr);
-            EXPECT_EQ(f_bits(mn), inf == 0x7f800000u ? 0x7f7fffffu : inf);
-            EXPECT_EQ(f_bits(mx), inf == 0xff800000u ? 0xff7fffffu : inf);
         }
     float src[2] = {1, 2}, mn = 9, mx = 9;
     run_checks({{zorStsNullPtrErr, "src", [&] { return zoriMinMax_32f_C1R(nullptr, 8, {0, 0}, &mn, &mx); }},

@@ -5,9 +5,6 @@
 #include <math.h>
 
 #include <algorithm>
-#include <map>
-#include <string>
-#include <typeinfo>
 
 #include "sweep.h"
 #include "zortest.h"
@@ -71,65 +68,17 @@ int64_t div_model(int64_t d, int64_t n, int s) {
 template <typename T>
 using SfsFn = ZorStatus (*)(const T*, int32_t, const T*, int32_t, T*, int32_t, ZoriSize, int32_t);
 
-// ---- all pairs of a list, laid out row after row --------------------------------
+// ---- one sweep per operation ----------------------------------------------------
 
-// Runs fn on the pairs (a[k], b[k]) laid out in rows of width w and
-// compares each result with model. Returns the status.
-// The model's results for the pairs at scale s, computed once per process
-// (every level compares with the same table).
-template <typename T, typename Model>
-const std::vector<int64_t>& expected(const std::vector<T>& a, const std::vector<T>& b, int s,
-                                     Model model, const char* what) {
-    static std::map<std::pair<std::string, int>, std::vector<int64_t>> tables;
-    std::vector<int64_t>& t = tables[{std::string(what) + typeid(T).name(), s}];
-    if (t.size() != a.size()) {
-        t.resize(a.size());
-        for (size_t k = 0; k < a.size(); ++k) t[k] = model(a[k], b[k], s);
-    }
-    return t;
-}
-
-template <typename T, typename Model>
-ZorStatus run_pairs(SfsFn<T> fn, const std::vector<T>& a, const std::vector<T>& b, int32_t w,
-                    int s, Model model, const char* what) {
-    const std::vector<int64_t>& want = expected(a, b, s, model, what);
-    const int32_t h = (int32_t)((a.size() + (size_t)w - 1) / (size_t)w);
-    std::vector<T> A((size_t)w * h, 0), B((size_t)w * h, 0), D((size_t)w * h, 0);
-    std::copy(a.begin(), a.end(), A.begin());
-    std::copy(b.begin(), b.end(), B.begin());
-    const int32_t step = w * (int32_t)sizeof(T);
-    const ZorStatus st = fn(A.data(), step, B.data(), step, D.data(), step, {w, h}, s);
-    for (size_t k = 0; k < a.size(); ++k) {
-        if (D[k] != want[k]) {
-            ADD_FAILURE() << what << " " << (int64_t)A[k] << ", " << (int64_t)B[k] << " scale "
-                          << s << " width " << w << ": got " << (int64_t)D[k] << ", expected "
-                          << want[k];
-            break;
-        }
-    }
-    return st;
-}
-
-std::vector<int> scales(int from, int to) {
-    std::vector<int> s;
-    for (int i = from; i <= to; ++i) s.push_back(i);
-    for (int i : {INT_MIN, -1000, 1000, INT_MAX}) s.push_back(i);
-    return s;
-}
-
-void all_8u_pairs(std::vector<Zor8u>& a, std::vector<Zor8u>& b) {
-    for (int k = 0; k < 65536; ++k) {
-        a.push_back((Zor8u)(k & 255));
-        b.push_back((Zor8u)(k >> 8));
-    }
-}
-
-// Edge values of a 16-bit type crossed with each other, then random pairs.
-template <typename T>
-void sampled_pairs(std::vector<T>& a, std::vector<T>& b, uint64_t seed) {
-    std::vector<int64_t> edges = {0, 1, 2, 3, 5, 127, 128, 181, 182, 255, 256, 257, 4095, 4096,
-                                  32767};
-    if (std::numeric_limits<T>::is_signed) {
+// Edge values of the type crossed with each other (all 256 x 256 for
+// 8u), then random pairs, small magnitudes as often as large ones so that
+// quotients are not all 0.
+template <typename T> void pairs_of(std::vector<T>& a, std::vector<T>& b) {
+    std::vector<int64_t> edges = {0, 1, 2, 3, 5, 127, 128, 181, 182, 255, 256, 257, 4095, 4096, 32767};
+    if (sizeof(T) == 1) {
+        edges.clear();
+        for (int v = 0; v < 256; ++v) edges.push_back(v);
+    } else if (std::numeric_limits<T>::is_signed) {
         for (int64_t v : {-1, -2, -3, -181, -182, -256, -32767, -32768}) edges.push_back(v);
     } else {
         for (int64_t v : {32768, 46340, 46341, 65534, 65535}) edges.push_back(v);
@@ -139,63 +88,55 @@ void sampled_pairs(std::vector<T>& a, std::vector<T>& b, uint64_t seed) {
             a.push_back((T)x);
             b.push_back((T)y);
         }
-    Rng r(seed);
-    for (int k = 0; k < 6000; ++k) {
-        // Small magnitudes as often as large ones, so quotients are not all 0.
-        const uint32_t m1 = r.below(3) == 0 ? 0xff : 0xffff, m2 = r.below(3) == 0 ? 0xff : 0xffff;
-        a.push_back((T)(r.next() & m1));
-        b.push_back((T)(r.next() & m2));
+    Rng r(sizeof(T) + std::numeric_limits<T>::is_signed);
+    for (int k = 0; k < (sizeof(T) == 1 ? 0 : 6000); ++k) {
+        a.push_back((T)(r.next() & (r.below(3) ? 0xffff : 0xff)));
+        b.push_back((T)(r.next() & (r.below(3) ? 0xffff : 0xff)));
     }
 }
 
-using Sfs = zortest::LevelTest;
-
-// Every scale from lo to hi and the extremes, on rows of two widths; the
-// divisors hold zeros, so every division reports status 2.
+// Every pair at every scale from lo to hi and far beyond, in rows of two
+// widths; then every layout of the sweep with pixels drawn from the pairs'
+// values and the scale stepping through lo..hi. The pairs hold zero
+// divisors, so every division of them reports status 2.
 template <typename T, typename Model>
-void pairs_at_scales(SfsFn<T> fn, Model model, const std::vector<T>& a, const std::vector<T>& b,
-                     int lo, int hi, bool division, const char* what) {
-    for (int s : scales(lo, hi))
-        for (int32_t w : {sizeof(T) == 1 ? 256 : 64, sizeof(T) == 1 ? 7 : 5})
-            ASSERT_EQ(run_pairs<T>(fn, a, b, w, s, model, what),
+void sweep(SfsFn<T> fn, Model model, int lo, int hi, bool division, StepRule rule) {
+    std::vector<T> pa, pb;
+    pairs_of(pa, pb);
+    std::vector<int> scales = {INT_MIN, -1000, 1000, INT_MAX};
+    for (int s = lo; s <= hi; ++s) scales.push_back(s);
+    for (int s : scales)
+        for (int32_t w : {sizeof(T) == 1 ? 256 : 64, sizeof(T) == 1 ? 7 : 5}) {
+            const int32_t h = (int32_t)((pa.size() + (size_t)w - 1) / (size_t)w);
+            auto from = [&](const std::vector<T>& p) {
+                return [&p, w](int32_t x, int32_t y) {
+                    const size_t k = (size_t)y * w + x;
+                    return k < p.size() ? p[k] : T(1);
+                };
+            };
+            Image<T> a(w, h), b(w, h), d(w, h);
+            a.fill(from(pa));
+            b.fill(from(pb));
+            Image<T> want = d;
+            for (int32_t y = 0; y < h; ++y)
+                for (int32_t x = 0; x < w; ++x) want.set(x, y, (T)model(a.get(x, y), b.get(x, y), s));
+            ASSERT_EQ(fn(a.ptr(), a.step, b.ptr(), b.step, d.ptr(), d.step, {w, h}, s),
                       division ? zorStsDivByZero : zorStsNoErr);
-}
-
-TEST_P(Sfs, Every8uPairSampled16bitPairs) {
-    std::vector<Zor8u> a, b;
-    all_8u_pairs(a, b);
-    pairs_at_scales(zoriMul_8u_C1RSfs, mul_model<Zor8u>, a, b, -10, 20, false, "mul");
-    pairs_at_scales(zoriDiv_8u_C1RSfs, div_model<Zor8u>, a, b, -18, 11, true, "div");
-    std::vector<Zor16u> ua, ub;
-    sampled_pairs(ua, ub, 11);
-    pairs_at_scales(zoriMul_16u_C1RSfs, mul_model<Zor16u>, ua, ub, -20, 36, false, "mul");
-    pairs_at_scales(zoriDiv_16u_C1RSfs, div_model<Zor16u>, ua, ub, -35, 20, true, "div");
-    std::vector<Zor16s> sa, sb;
-    sampled_pairs(sa, sb, 12);
-    pairs_at_scales(zoriMul_16s_C1RSfs, mul_model<Zor16s>, sa, sb, -20, 34, false, "mul");
-    pairs_at_scales(zoriDiv_16s_C1RSfs, div_model<Zor16s>, sa, sb, -34, 19, true, "div");
-}
-
-// ---- guarded geometries -----------------------------------------------------------
-
-template <typename T, typename Model>
-void check_geometries(SfsFn<T> fn, Model model, bool division, const std::vector<int>& ss,
-                      StepRule rule, uint64_t seed) {
-    Rng r(seed);
+            ASSERT_TRUE(same_bytes(d, want)) << "scale " << s << " width " << w;
+        }
+    Rng r(lo + 100);
     size_t turn = 0;
     const int32_t e = (int32_t)sizeof(T);
     for (ZoriSize g : geometries()) {
         const std::vector<int32_t> steps = steps_for(g.width * e, e, rule);
         for (size_t k = 0; k < steps.size(); ++k, ++turn) {
-            const int s = ss[turn % ss.size()];
+            const int s = lo + (int)(turn * 7 % (size_t)(hi - lo + 1));
             const int32_t st[3] = {steps[k], steps[(k + 1) % steps.size()], steps[(k + 2) % steps.size()]};
             Image<T> a = image<T>(g.width, g.height, st[0], misalign(e, false, k));
             Image<T> b = image<T>(g.width, g.height, st[1], misalign(e, false, k + 1));
             Image<T> d = image<T>(g.width, g.height, st[2], misalign(e, false, k + 2));
-            // Small values now and then, so that every rule sees both.
-            const bool small = turn % 3 == 0;
-            a.fill([&](int32_t, int32_t) { return small ? r.below(4) : r.next(); });
-            b.fill([&](int32_t, int32_t) { return small ? r.below(40) : r.next(); });
+            a.fill([&](int32_t, int32_t) { return pa[r.below((uint32_t)pa.size())]; });
+            b.fill([&](int32_t, int32_t) { return pb[r.below((uint32_t)pb.size())]; });
             Image<T> want = d;
             bool zero = false;
             for (int32_t y = 0; y < g.height; ++y)
@@ -203,26 +144,22 @@ void check_geometries(SfsFn<T> fn, Model model, bool division, const std::vector
                     want.set(x, y, (T)model(a.get(x, y), b.get(x, y), s));
                     zero |= a.get(x, y) == 0;
                 }
-            const ZorStatus st0 = fn(a.ptr(), st[0], b.ptr(), st[1], d.ptr(), st[2], g, s);
+            ASSERT_EQ(fn(a.ptr(), st[0], b.ptr(), st[1], d.ptr(), st[2], g, s),
+                      division && zero ? zorStsDivByZero : zorStsNoErr) << "scale " << s;
             ASSERT_TRUE(same_bytes(d, want)) << "scale " << s << " steps " << st[0] << " " << st[2];
-            ASSERT_EQ(st0, division && zero ? zorStsDivByZero : zorStsNoErr) << "scale " << s;
         }
     }
 }
 
-TEST_P(Sfs, GuardedGeometries) {
-    check_geometries<Zor8u>(zoriMul_8u_C1RSfs, mul_model<Zor8u>, false,
-                            {0, 1, 2, 5, 8, 15, 16, 17, -1, -7, -8}, kFree, 21);
-    check_geometries<Zor16u>(zoriMul_16u_C1RSfs, mul_model<Zor16u>, false,
-                             {0, 1, 2, 16, 17, 31, 32, 33, -1, -15, -16}, kFree, 22);
-    check_geometries<Zor16s>(zoriMul_16s_C1RSfs, mul_model<Zor16s>, false,
-                             {0, 1, 2, 15, 30, 31, -1, -14, -15}, kFree, 23);
-    check_geometries<Zor8u>(zoriDiv_8u_C1RSfs, div_model<Zor8u>, true, {0, 1, 3, 8, 9, -1, -15, -16},
-                            kPositive, 24);
-    check_geometries<Zor16u>(zoriDiv_16u_C1RSfs, div_model<Zor16u>, true, {0, 1, 16, 17, -1, -31, -32},
-                             kFree, 25);
-    check_geometries<Zor16s>(zoriDiv_16s_C1RSfs, div_model<Zor16s>, true, {0, 2, 15, 16, -1, -30, -31},
-                             kPositive, 26);
+using Sfs = zortest::LevelTest;
+
+TEST_P(Sfs, EveryOperationAgainstItsModel) {
+    ASSERT_NO_FATAL_FAILURE(sweep<Zor8u>(zoriMul_8u_C1RSfs, mul_model<Zor8u>, -10, 20, false, kFree));
+    ASSERT_NO_FATAL_FAILURE(sweep<Zor8u>(zoriDiv_8u_C1RSfs, div_model<Zor8u>, -18, 11, true, kPositive));
+    ASSERT_NO_FATAL_FAILURE(sweep<Zor16u>(zoriMul_16u_C1RSfs, mul_model<Zor16u>, -20, 36, false, kFree));
+    ASSERT_NO_FATAL_FAILURE(sweep<Zor16u>(zoriDiv_16u_C1RSfs, div_model<Zor16u>, -35, 20, true, kFree));
+    ASSERT_NO_FATAL_FAILURE(sweep<Zor16s>(zoriMul_16s_C1RSfs, mul_model<Zor16s>, -20, 34, false, kFree));
+    ASSERT_NO_FATAL_FAILURE(sweep<Zor16s>(zoriDiv_16s_C1RSfs, div_model<Zor16s>, -34, 19, true, kPositive));
 }
 
 // Pointers, ROI, then steps where the operation tests them (the divisions

@@ -8,7 +8,6 @@
 #include <gtest/gtest.h>
 
 #include <stdint.h>
-#include <stdio.h>
 #include <string.h>
 
 #include <climits>
@@ -31,12 +30,9 @@ struct Geometry {
     int dstW() const { return left + srcW + right; }
     int dstH() const { return top + srcH + bottom; }
 };
-
-inline std::string describe(const Geometry& g) {
-    char t[96];
-    snprintf(t, sizeof t, "src %dx%d top %d left %d right %d bottom %d", g.srcW, g.srcH, g.top,
-             g.left, g.right, g.bottom);
-    return t;
+inline std::ostream& operator<<(std::ostream& o, const Geometry& g) {
+    return o << "src " << g.srcW << "x" << g.srcH << " top " << g.top << " left " << g.left
+             << " right " << g.right << " bottom " << g.bottom;
 }
 
 // The expected frame in `want`: each pixel from the source pixel the model
@@ -210,7 +206,7 @@ inline void run_sweep(const std::vector<Form>& forms, int level) {
     for (const Form& f : forms) {
         int seed = 0;
         for (const Geometry& g : frames) {
-            SCOPED_TRACE(std::string(f.name) + " " + describe(g));
+            SCOPED_TRACE(testing::Message() << f.name << " " << g);
             ASSERT_NO_FATAL_FAILURE(run_copy(f, level, g, ++seed));
             if (f.kind == kConst) continue;
             const bool equal = !f.inPlace || seed % 2;

@@ -59,21 +59,6 @@ TEST_P(BorderPrivate, ChecksInOrderAndWritesNothingOnError) {
     for (const Form& f : forms()) run_checks(f, GetParam().index);
 }
 
-// The frame from the image outwards reflects at every distance: source
-// a b c with a left border of 5 gives b c b a b next to the image, so
-// the row reads b a b c b, then a b c; the bottom is the same rule.
-TEST_P(BorderPrivate, MirrorBeyondTheImageReflectsAtEveryDistance) {
-    const Zor8u abc[3] = {'a', 'b', 'c'};
-    Zor8u row[13];
-    ASSERT_EQ(ZOR_BODY(zoriCopyMirrorBorder_8u_C1R)(abc, 3, {3, 1}, row, 13, {13, 1}, 0, 5),
-              zorStsNoErr);
-    EXPECT_EQ(std::string((const char*)row, 13), "babcbabcbabcb");
-    Zor8u column[8];
-    ASSERT_EQ(ZOR_BODY(zoriCopyMirrorBorder_8u_C1R)(abc, 1, {1, 3}, column, 1, {1, 8}, 0, 0),
-              zorStsNoErr);
-    EXPECT_EQ(std::string((const char*)column, 8), "abcbabcb");
-}
-
 ZOR_INSTANTIATE_LEVELS(BorderPrivate);
 
 }  // namespace
