@@ -20,15 +20,16 @@ template <typename T> std::vector<std::vector<T>> sources(int count) {
     return v;
 }
 
-// Two sources (or one and the destination) through fn against op.
-template <typename T, typename Fn, typename Op> void binary(Fn fn, Op op, bool inplace) {
+// Two sources (or one and the destination) through fn against op; unit 2
+// treats complex sums as real ones over both parts of each element.
+template <typename T, typename E = T, typename Fn, typename Op> void binary(Fn fn, Op op, bool inplace, int unit = 1) {
     const auto d = sources<T>(2);
-    sweep<T>(d, inplace, 1, false,
+    sweep<T>(d, inplace, unit, false,
              [&](const T* const* s, T* dst, int32_t n) {
-                 if constexpr (std::is_invocable_v<Fn, const T*, const T*, T*, int32_t>)
-                     return fn(s[0], s[1], dst, n);
+                 if constexpr (std::is_invocable_v<Fn, const E*, const E*, E*, int32_t>)
+                     return fn((const E*)s[0], (const E*)s[1], (E*)dst, n);
                  else
-                     return fn(s[1], dst, n);  // srcDst = srcDst op src
+                     return fn((const E*)s[1], (E*)dst, n);  // srcDst = srcDst op src
              },
              [&](size_t i) { return op(d[0][i], d[1][i]); });
 }
@@ -37,47 +38,33 @@ const auto add = [](auto x, auto y) { return x + y; };
 const auto mul = [](auto x, auto y) { return x * y; };
 
 TEST_P(Arith, SumsAndProducts) {
-    binary<float>(zorsAdd_32f, add, false);
-    binary<double>(zorsAdd_64f, add, false);
-    binary<float>(zorsMul_32f, mul, false);
-    binary<float>(zorsAdd_32f_I, add, true);
-    binary<double>(zorsAdd_64f_I, add, true);
-    binary<float>(zorsMul_32f_I, mul, true);
+    for (bool in : {false, true}) {
+        in ? binary<float>(zorsAdd_32f_I, add, in) : binary<float>(zorsAdd_32f, add, in);
+        in ? binary<double>(zorsAdd_64f_I, add, in) : binary<double>(zorsAdd_64f, add, in);
+        in ? binary<float>(zorsMul_32f_I, mul, in) : binary<float>(zorsMul_32f, mul, in);
+        in ? binary<float, Zor32fc>(zorsAdd_32fc_I, add, in, 2) : binary<float, Zor32fc>(zorsAdd_32fc, add, in, 2);
+        in ? binary<double, Zor64fc>(zorsAdd_64fc_I, add, in, 2) : binary<double, Zor64fc>(zorsAdd_64fc, add, in, 2);
+    }
 }
 
-// The complex sums are the real ones over both parts of each element.
-TEST_P(Arith, ComplexSums) {
-    const auto f = sources<float>(2);
-    const auto d = sources<double>(2);
-    auto f_sum = [&](size_t i) { return f[0][i] + f[1][i]; };
-    auto d_sum = [&](size_t i) { return d[0][i] + d[1][i]; };
-    sweep<float>(f, false, 2, false, [](const float* const* s, float* o, int32_t n) {
-        return zorsAdd_32fc((const Zor32fc*)s[0], (const Zor32fc*)s[1], (Zor32fc*)o, n); }, f_sum);
-    sweep<double>(d, false, 2, false, [](const double* const* s, double* o, int32_t n) {
-        return zorsAdd_64fc((const Zor64fc*)s[0], (const Zor64fc*)s[1], (Zor64fc*)o, n); }, d_sum);
-    sweep<float>(f, true, 2, false, [](const float* const* s, float* o, int32_t n) {
-        return zorsAdd_32fc_I((const Zor32fc*)s[1], (Zor32fc*)o, n); }, f_sum);
-    sweep<double>(d, true, 2, false, [](const double* const* s, double* o, int32_t n) {
-        return zorsAdd_64fc_I((const Zor64fc*)s[1], (Zor64fc*)o, n); }, d_sum);
-}
-
-// Values that take no short cut, the square, and complex products (where
-// 1 and 0 take none either).
+// Constant forms and the square. By 1 a copy and by +-0 a clear, bit for
+// bit whatever the elements hold (signalling NaNs too); subtracting +-0 a
+// copy. Complex products take no short cut, for 1 and 0 either.
 TEST_P(Arith, ConstantForms) {
     const auto f = sources<float>(1);
     const auto d = sources<double>(1);
-    for (float v : {2.5f, 1e30f, vt::f32(0x80000123u), std::numeric_limits<float>::quiet_NaN()}) {
-        auto times = [&](size_t i) { return f[0][i] * v; };
-        sweep<float>(f, false, 1, false, [v](const float* const* s, float* o, int32_t n) {
-            return zorsMulC_32f(s[0], o, n, v); }, times);
-        sweep<float>(f, true, 1, false, [v](const float* const*, float* o, int32_t n) {
-            return zorsMulC_32f_I(o, n, v); }, times);
-        sweep<float>(f, false, 1, false, [v](const float* const* s, float* o, int32_t n) {
-            return zorsSubC_32f(s[0], o, n, v); }, [&](size_t i) { return f[0][i] - v; });
-        sweep<double>(d, false, 1, false, [v](const double* const* s, double* o, int32_t n) {
-            return zorsMulC_64f(s[0], o, n, v); }, [&](size_t i) { return d[0][i] * (double)v; });
+    using F = const float* const*;
+    for (float v : {2.5f, 1e30f, vt::f32(0x80000123u), std::numeric_limits<float>::quiet_NaN(), 1.0f, 0.0f, -0.0f}) {
+        const bool cut = v == 1 || v == 0;
+        const auto times = [&](size_t i) { return v == 1 ? f[0][i] : v == 0 ? 0.0f : f[0][i] * v; };
+        sweep<float>(f, false, 1, cut, [v](F s, float* o, int32_t n) { return zorsMulC_32f(s[0], o, n, v); }, times);
+        sweep<float>(f, true, 1, cut, [v](F, float* o, int32_t n) { return zorsMulC_32f_I(o, n, v); }, times);
+        sweep<float>(f, false, 1, v == 0, [v](F s, float* o, int32_t n) { return zorsSubC_32f(s[0], o, n, v); },
+                     [&](size_t i) { return v == 0 ? f[0][i] : f[0][i] - v; });
+        sweep<double>(d, false, 1, cut, [v](const double* const* s, double* o, int32_t n) {
+            return zorsMulC_64f(s[0], o, n, v); }, [&](size_t i) { return v == 1 ? d[0][i] : v == 0 ? 0.0 : d[0][i] * v; });
     }
-    sweep<float>(f, true, 1, false, [](const float* const*, float* o, int32_t n) { return zorsSqr_32f_I(o, n); },
+    sweep<float>(f, true, 1, false, [](F, float* o, int32_t n) { return zorsSqr_32f_I(o, n); },
                  [&](size_t i) { return f[0][i] * f[0][i]; });
     const float cases[][2] = {{1.5f, -2.25f}, {1, 0}, {0, 0}, {-0.0f, 3}, {1e-40f, 7e30f}};
     for (const auto& c : cases) {
@@ -87,29 +74,11 @@ TEST_P(Arith, ConstantForms) {
                 return i % 2 ? y * re + x * im : x * re - y * im;
             };
         };
-        sweep<float>(f, false, 2, false, [&](const float* const* s, float* o, int32_t n) {
+        sweep<float>(f, false, 2, false, [&](F s, float* o, int32_t n) {
             return zorsMulC_32fc((const Zor32fc*)s[0], (Zor32fc*)o, n, Zor32fc{c[0], c[1]}); }, model(f[0], c[0], c[1]));
         sweep<double>(d, false, 2, false, [&](const double* const* s, double* o, int32_t n) {
             return zorsMulC_64fc((const Zor64fc*)s[0], (Zor64fc*)o, n, Zor64fc{c[0], c[1]}); },
                       model(d[0], (double)c[0], (double)c[1]));
-    }
-}
-
-// By 1 a copy and by +-0 a clear, bit for bit whatever the elements hold
-// (signalling NaNs too); subtracting +-0 a copy; in place by 1 nothing.
-TEST_P(Arith, ShortCutsForOneAndZero) {
-    const auto f = sources<float>(1);
-    const auto d = sources<double>(1);
-    using F = const float* const*;
-    for (float v : {1.0f, 0.0f, -0.0f}) {
-        const auto mul = [&](size_t i) { return v == 1 ? f[0][i] : 0.0f; };
-        sweep<float>(f, false, 1, true, [v](F s, float* o, int32_t n) { return zorsMulC_32f(s[0], o, n, v); }, mul);
-        sweep<float>(f, true, 1, true, [v](F, float* o, int32_t n) { return zorsMulC_32f_I(o, n, v); }, mul);
-        sweep<double>(d, false, 1, true, [v](const double* const* s, double* o, int32_t n) {
-            return zorsMulC_64f(s[0], o, n, v); }, [&](size_t i) { return v == 1 ? d[0][i] : 0.0; });
-        if (v == 0)
-            sweep<float>(f, false, 1, true, [v](F s, float* o, int32_t n) { return zorsSubC_32f(s[0], o, n, v); },
-                         [&](size_t i) { return f[0][i]; });
     }
 }
 
@@ -153,14 +122,10 @@ template <typename T> void overlap_walk(ZorStatus (*fn)(const T*, const T*, T*, 
 }
 
 TEST_P(MaxEvery, EveryTypeEveryLengthAndOverlap) {
-    max_sweep<Zor8u>(zorsMaxEvery_8u);
-    max_sweep<Zor16u>(zorsMaxEvery_16u);
-    max_sweep<Zor32f>(zorsMaxEvery_32f);
-    max_sweep<Zor64f>(zorsMaxEvery_64f);
-    overlap_walk<Zor8u>(zorsMaxEvery_8u);
-    overlap_walk<Zor16u>(zorsMaxEvery_16u);
-    overlap_walk<Zor32f>(zorsMaxEvery_32f);
-    overlap_walk<Zor64f>(zorsMaxEvery_64f);
+    max_sweep<Zor8u>(zorsMaxEvery_8u), overlap_walk<Zor8u>(zorsMaxEvery_8u);
+    max_sweep<Zor16u>(zorsMaxEvery_16u), overlap_walk<Zor16u>(zorsMaxEvery_16u);
+    max_sweep<Zor32f>(zorsMaxEvery_32f), overlap_walk<Zor32f>(zorsMaxEvery_32f);
+    max_sweep<Zor64f>(zorsMaxEvery_64f), overlap_walk<Zor64f>(zorsMaxEvery_64f);
 }
 
 // ---- reversal ---------------------------------------------------------------------
@@ -176,11 +141,12 @@ template <typename T> void flip_sweep(ZorStatus (*fn)(const T*, T*, int32_t)) {
                        [&](size_t i, int len) { return d[0][(len - 1 - i / sizeof(T)) * sizeof(T) + i % sizeof(T)]; });
 }
 
-TEST_P(Flip, EveryTypeOutOfPlaceAndInPlace) {
-    flip_sweep<Zor32f>(zorsFlip_32f);
-    flip_sweep<Zor32fc>(zorsFlip_32fc);
-    flip_sweep<Zor64f>(zorsFlip_64f);
-    flip_sweep<Zor64fc>(zorsFlip_64fc);
+// Reversals, copies and moves without overlap: byte patterns, every type.
+TEST_P(Flip, ReversalsAndCopiesEveryType) {
+    flip_sweep<Zor32f>(zorsFlip_32f), vt::copy_sweep(zorsCopy_32f), vt::copy_sweep(zorsMove_32f);
+    flip_sweep<Zor32fc>(zorsFlip_32fc), vt::copy_sweep(zorsCopy_32fc), vt::copy_sweep(zorsMove_32fc);
+    flip_sweep<Zor64f>(zorsFlip_64f), vt::copy_sweep(zorsCopy_64f), vt::copy_sweep(zorsMove_64f);
+    flip_sweep<Zor64fc>(zorsFlip_64fc), vt::copy_sweep(zorsCopy_64fc), vt::copy_sweep(zorsMove_64fc);
 }
 
 // ---- checks in their order ----------------------------------------------------------

@@ -6,6 +6,8 @@
 #include "vector_support.h"
 #include "zors.h"
 
+#include <cfloat>
+
 namespace {
 
 using Sum = zortest::LevelTest;
@@ -35,42 +37,27 @@ float accurate_model(const float* p, int len) {
                    ((lane[1] + lane[5]) + (lane[3] + lane[7])));
 }
 
-TEST_P(Sum, AccurateFormFollowsItsLaneOrderForEveryHintButOne) {
+// Every hint but 1 takes the accurate order bit for bit; hint 1 is within
+// the bound of single-precision addition. All -0 sums to -0 (the lanes
+// start there); beyond single precision the accurate form's double lanes
+// keep what float lanes would lose.
+TEST_P(Sum, AccurateOrderExactFastFormBounded) {
     const auto data = random_values<float>(16384 + 8, 7);
-    for (int offset = 0; offset < 4; ++offset) {
-        for (int len : vt::lengths(1)) {
-            const float* p = data.data() + offset;
-            const float expected = accurate_model(p, len);
-            for (int hint : {0, 2, -1, 77}) {
-                float s = 0;
-                ASSERT_EQ(zorsSum_32f(p, len, &s, hint), zorStsNoErr);
-                ASSERT_EQ(bits(s), bits(expected)) << "len " << len << " offset " << offset << " hint " << hint;
-            }
-        }
-    }
-}
-
-TEST_P(Sum, FastFormIsWithinTheBoundOfSinglePrecisionAddition) {
-    const auto data = random_values<float>(16384 + 8, 11);
-    for (int offset = 0; offset < 4; ++offset) {
+    for (int offset = 0; offset < 4; ++offset)
         for (int len : vt::lengths(1)) {
             const float* p = data.data() + offset;
             long double exact = 0, magnitude = 0;
-            for (int i = 0; i < len; ++i) {
-                exact += p[i];
-                magnitude += std::fabs(p[i]);
+            for (int i = 0; i < len; ++i) exact += p[i], magnitude += std::fabs(p[i]);
+            for (int hint : {0, 1, 2, -1, 77}) {
+                float s = 0;
+                ASSERT_EQ(zorsSum_32f(p, len, &s, hint), zorStsNoErr);
+                if (hint != 1)
+                    ASSERT_EQ(bits(s), bits(accurate_model(p, len))) << "len " << len << " at " << offset << " hint " << hint;
+                else
+                    ASSERT_LE(std::fabs((long double)s - exact), (len + 1) * (long double)FLT_EPSILON * magnitude)
+                        << "len " << len << " offset " << offset;
             }
-            float s = 0;
-            ASSERT_EQ(zorsSum_32f(p, len, &s, 1), zorStsNoErr);
-            const long double bound = (len + 1) * (long double)std::numeric_limits<float>::epsilon() * magnitude;
-            ASSERT_LE(std::fabs((long double)s - exact), bound) << "len " << len << " offset " << offset;
         }
-    }
-}
-
-// All -0 sums to -0 (the lanes start there); beyond single precision the
-// accurate form's double lanes keep what float lanes would lose.
-TEST_P(Sum, SignedZeroAndRangeOfTheLanes) {
     for (int hint : {0, 1})
         for (int len : {1, 9, 40}) {
             std::vector<float> v(len, -0.0f);
@@ -81,16 +68,6 @@ TEST_P(Sum, SignedZeroAndRangeOfTheLanes) {
             zorsSum_32f(v.data(), len, &s, hint);
             EXPECT_EQ(s, len == 1 ? 3e38f : std::numeric_limits<float>::infinity());
         }
-}
-
-TEST_P(Sum, ChecksPointersThenLength) {
-    float v[4] = {1, 2, 3, 4};
-    float s = 42;
-    EXPECT_EQ(zorsSum_32f(nullptr, 0, &s, 0), zorStsNullPtrErr);
-    EXPECT_EQ(zorsSum_32f(v, -1, nullptr, 1), zorStsNullPtrErr);
-    EXPECT_EQ(zorsSum_32f(v, 0, &s, 0), zorStsSizeErr);
-    EXPECT_EQ(zorsSum_32f(v, -5, &s, 1), zorStsSizeErr);
-    EXPECT_EQ(s, 42);
 }
 
 // ---- dot products -----------------------------------------------------------
@@ -157,33 +134,30 @@ TEST_P(DotProd, ShortOrderExactWideOrderBounded) {
     check_form<double, Zor64f, Zor64fc, Zor64fc, true>(zorsDotProd_64f64fc, 6);
 }
 
+// The sum's and the dot products' checks: pointers, then length; nothing
+// written on refusal.
 TEST_P(DotProd, ChecksPointersThenLength) {
-    float f[2] = {1, 2};
-    Zor32fc c[2] = {};
-    double d[2] = {1, 2};
-    Zor64fc z[2] = {};
-    float rf = 7;
-    Zor32fc rc = {7, 7};
-    double rd = 7;
-    Zor64fc rz = {7, 7};
-    EXPECT_EQ(zorsDotProd_32f(nullptr, f, 0, &rf), zorStsNullPtrErr);
-    EXPECT_EQ(zorsDotProd_32f(f, nullptr, 2, &rf), zorStsNullPtrErr);
-    EXPECT_EQ(zorsDotProd_32f(f, f, -1, nullptr), zorStsNullPtrErr);
-    EXPECT_EQ(zorsDotProd_32f(f, f, 0, &rf), zorStsSizeErr);
-    EXPECT_EQ(zorsDotProd_64f(d, nullptr, 0, &rd), zorStsNullPtrErr);
-    EXPECT_EQ(zorsDotProd_64f(d, d, -3, &rd), zorStsSizeErr);
-    EXPECT_EQ(zorsDotProd_32fc(c, c, 0, nullptr), zorStsNullPtrErr);
-    EXPECT_EQ(zorsDotProd_32fc(c, c, 0, &rc), zorStsSizeErr);
-    EXPECT_EQ(zorsDotProd_64fc(nullptr, z, 1, &rz), zorStsNullPtrErr);
-    EXPECT_EQ(zorsDotProd_64fc(z, z, 0, &rz), zorStsSizeErr);
-    EXPECT_EQ(zorsDotProd_32f32fc(f, nullptr, -1, &rc), zorStsNullPtrErr);
-    EXPECT_EQ(zorsDotProd_32f32fc(f, c, 0, &rc), zorStsSizeErr);
-    EXPECT_EQ(zorsDotProd_64f64fc(nullptr, z, 0, &rz), zorStsNullPtrErr);
-    EXPECT_EQ(zorsDotProd_64f64fc(d, z, INT32_MIN, &rz), zorStsSizeErr);
-    EXPECT_EQ(rf, 7);
-    EXPECT_EQ(rd, 7);
-    EXPECT_EQ(rc.re, 7);
-    EXPECT_EQ(rz.im, 7);
+    float f[2] = {1, 2}, rf = 7, s = 7;
+    double d[2] = {1, 2}, rd = 7;
+    Zor32fc c[2] = {}, rc = {7, 7};
+    Zor64fc z[2] = {}, rz = {7, 7};
+    const ZorStatus N = zorStsNullPtrErr, S = zorStsSizeErr;
+    const struct {
+        ZorStatus got, want;
+        int line;
+    } cases[] = {
+        {zorsSum_32f(nullptr, 0, &s, 0), N, __LINE__},         {zorsSum_32f(f, -1, nullptr, 1), N, __LINE__},
+        {zorsSum_32f(f, 0, &s, 0), S, __LINE__},               {zorsSum_32f(f, -5, &s, 1), S, __LINE__},
+        {zorsDotProd_32f(nullptr, f, 0, &rf), N, __LINE__},    {zorsDotProd_32f(f, nullptr, 2, &rf), N, __LINE__},
+        {zorsDotProd_32f(f, f, -1, nullptr), N, __LINE__},     {zorsDotProd_32f(f, f, 0, &rf), S, __LINE__},
+        {zorsDotProd_64f(d, nullptr, 0, &rd), N, __LINE__},    {zorsDotProd_64f(d, d, -3, &rd), S, __LINE__},
+        {zorsDotProd_32fc(c, c, 0, nullptr), N, __LINE__},     {zorsDotProd_32fc(c, c, 0, &rc), S, __LINE__},
+        {zorsDotProd_64fc(nullptr, z, 1, &rz), N, __LINE__},   {zorsDotProd_64fc(z, z, 0, &rz), S, __LINE__},
+        {zorsDotProd_32f32fc(f, nullptr, -1, &rc), N, __LINE__}, {zorsDotProd_32f32fc(f, c, 0, &rc), S, __LINE__},
+        {zorsDotProd_64f64fc(nullptr, z, 0, &rz), N, __LINE__}, {zorsDotProd_64f64fc(d, z, INT32_MIN, &rz), S, __LINE__},
+    };
+    for (const auto& k : cases) EXPECT_EQ(k.got, k.want) << "case at line " << k.line;
+    EXPECT_TRUE(s == 7 && rf == 7 && rd == 7 && rc.re == 7 && rz.im == 7);
 }
 
 ZOR_INSTANTIATE_LEVELS(Sum);
