@@ -1,7 +1,6 @@
-// Element-wise float arithmetic, maximum and reversal on every level,
-// against scalar models at every length and placement (vt::sweep), with
-// special values, the short cuts for special constants and the checks in
-// their order.
+// Element-wise float arithmetic, maximum, reversal, copies and moves on
+// every level against scalar models at every length and placement
+// (vt::sweep), and the checks in their order.
 
 #include "vector_support.h"
 #include "zors.h"
@@ -128,25 +127,32 @@ TEST_P(MaxEvery, EveryTypeEveryLengthAndOverlap) {
     max_sweep<Zor64f>(zorsMaxEvery_64f), overlap_walk<Zor64f>(zorsMaxEvery_64f);
 }
 
-// ---- reversal ---------------------------------------------------------------------
+// ---- reversal, copies and moves ------------------------------------------------
 
-// Elements are distinct byte patterns, compared as bytes; equal pointers
-// reverse in place.
-template <typename T> void flip_sweep(ZorStatus (*fn)(const T*, T*, int32_t)) {
-    std::vector<std::vector<uint8_t>> d(1, std::vector<uint8_t>(8200 * sizeof(T)));
-    for (size_t i = 0; i < d[0].size(); ++i) d[0][i] = (uint8_t)(i * 7 + i / 251);
-    for (bool inplace : {false, true})
-        sweep<uint8_t>(d, inplace, sizeof(T), true,
-                       [&](const uint8_t* const* s, uint8_t* o, int32_t n) { return fn((const T*)s[0], (T*)o, n); },
-                       [&](size_t i, int len) { return d[0][(len - 1 - i / sizeof(T)) * sizeof(T) + i % sizeof(T)]; });
+// A range moved onto itself shifted by every byte count up to 70 either
+// way gives the source's former content; every move is the same byte
+// move, so two element sizes suffice.
+template <typename T> void overlap(ZorStatus (*fn)(const T*, T*, int32_t)) {
+    for (int len = 1; len <= 1300; len += len < 70 ? 1 : 97)
+        for (long shift = -70; shift <= 70; ++shift)
+            for (size_t base : {(size_t)0, (size_t)5}) {
+                vt::Region r(len * sizeof(T) + 160, base, 21);
+                uint8_t* src = r.data() + 80;
+                auto want = r.raw;
+                std::memmove(r.in(want) + 80 + shift, r.in(want) + 80, len * sizeof(T));
+                ASSERT_EQ(fn((const T*)src, (T*)(src + shift), len), zorStsNoErr);
+                ASSERT_IMAGE(r, want) << "len " << len << " shift " << shift << " base " << base;
+            }
 }
 
-// Reversals, copies and moves without overlap: byte patterns, every type.
-TEST_P(Flip, ReversalsAndCopiesEveryType) {
-    flip_sweep<Zor32f>(zorsFlip_32f), vt::copy_sweep(zorsCopy_32f), vt::copy_sweep(zorsMove_32f);
-    flip_sweep<Zor32fc>(zorsFlip_32fc), vt::copy_sweep(zorsCopy_32fc), vt::copy_sweep(zorsMove_32fc);
-    flip_sweep<Zor64f>(zorsFlip_64f), vt::copy_sweep(zorsCopy_64f), vt::copy_sweep(zorsMove_64f);
-    flip_sweep<Zor64fc>(zorsFlip_64fc), vt::copy_sweep(zorsCopy_64fc), vt::copy_sweep(zorsMove_64fc);
+// Reversals (equal pointers reverse in place), copies and moves without
+// overlap as byte patterns of every type; then overlapping moves.
+TEST_P(Flip, ReversalsCopiesAndMoves) {
+    vt::copy_sweep(zorsFlip_32f, true), vt::copy_sweep(zorsCopy_32f), vt::copy_sweep(zorsMove_32f);
+    vt::copy_sweep(zorsFlip_32fc, true), vt::copy_sweep(zorsCopy_32fc), vt::copy_sweep(zorsMove_32fc);
+    vt::copy_sweep(zorsFlip_64f, true), vt::copy_sweep(zorsCopy_64f), vt::copy_sweep(zorsMove_64f);
+    vt::copy_sweep(zorsFlip_64fc, true), vt::copy_sweep(zorsCopy_64fc), vt::copy_sweep(zorsMove_64fc);
+    overlap(zorsMove_32f), overlap(zorsMove_64fc);
 }
 
 // ---- checks in their order ----------------------------------------------------------

@@ -6,6 +6,8 @@
 // against the runtime's. (Overlapping moves are swept through the public
 // moves.)
 
+#include <array>
+
 #include "vector_support.h"
 #include "zorinternal.h"
 
@@ -19,57 +21,35 @@ using MemKernel = zortest::LevelTest;
 typedef void (*CopyKernel)(const Zor8u*, Zor8u*, size_t);
 typedef void (*ZeroKernel)(Zor8u*, size_t);
 
-void copy_case(CopyKernel k, size_t n, size_t os, size_t od, size_t align = 64) {
-    Region rs(n, os, 1, align), rd(n, od, 2, align);
+// Kernel k (a copy, or with a null source a clear) of n bytes from offset
+// os to offset od, against memcpy or memset over the whole guarded buffer.
+void kernel_case(CopyKernel copy, ZeroKernel zero, size_t n, size_t os, size_t od) {
+    Region rs(n, os, 1), rd(n, od, 2);
     auto want = rd.raw;
-    std::memcpy(rd.in(want), rs.data(), n);
-    k(rs.data(), rd.data(), n);
-    ASSERT_IMAGE(rd, want) << "bytes " << n << " at " << os << ", " << od;
+    copy ? (void)std::memcpy(rd.in(want), rs.data(), n) : (void)std::memset(rd.in(want), 0, n);
+    copy ? copy(rs.data(), rd.data(), n) : zero(rd.data(), n);
+    ASSERT_IMAGE(rd, want) << (copy ? "copy " : "clear ") << n << " bytes at " << os << ", " << od;
 }
 
-void zero_case(ZeroKernel k, size_t n, size_t od) {
-    Region rd(n, od, 3);
-    auto want = rd.raw;
-    std::memset(rd.in(want), 0, n);
-    k(rd.data(), n);
-    ASSERT_IMAGE(rd, want) << "bytes " << n << " at " << od;
-}
-
-const size_t kOffsets[] = {0, 1, 2, 3, 4, 7, 8, 15, 16, 17, 31, 32, 33, 48, 63};
-const size_t kBigPlaces[][2] = {{0, 0}, {7, 33}, {63, 1}};
-
-// Lengths up to 200, then around multiples of 64 and the 256 KiB chunk.
-std::vector<size_t> kernel_lengths() {
-    std::vector<size_t> v;
-    for (size_t n = 0; n <= 200; ++n) v.push_back(n);
+// Every small length at many relative alignments; lengths around multiples
+// of 64 and the 256 KiB chunk at a few.
+TEST_P(MemKernel, EveryCopyAndClearKernel) {
+    const CopyKernel copies[] = {ZOR_BODY(ownsCopy_8u_E9), ZOR_BODY(ownsCopy_8u_repE9), ZOR_BODY(ownsCopy_8u_nt),
+                                 ZOR_BODY(ownsCopy_8u_inv), ZOR_BODY(ownsCopy_8u_ra), nullptr, nullptr, nullptr};
+    const ZeroKernel zeros[] = {ZOR_BODY(ownsZero_8u_E9), ZOR_BODY(ownsZero_8u_repE9), ZOR_BODY(ownsZero_8u_nt)};
+    std::vector<size_t> lengths;
+    for (size_t n = 0; n <= 200; ++n) lengths.push_back(n);
     for (size_t base : {(size_t)4096, (size_t)0x8000, (size_t)0x40000, (size_t)0x80000})
-        for (long d : {-65L, -64L, -63L, -1L, 0L, 1L, 63L, 64L, 65L, 129L}) v.push_back(base + d);
-    return v;
-}
-
-TEST_P(MemKernel, EveryCopyKernel) {
-    const CopyKernel kernels[] = {ZOR_BODY(ownsCopy_8u_E9), ZOR_BODY(ownsCopy_8u_repE9), ZOR_BODY(ownsCopy_8u_nt),
-                                  ZOR_BODY(ownsCopy_8u_inv), ZOR_BODY(ownsCopy_8u_ra)};
-    for (CopyKernel k : kernels)
-        for (size_t n : kernel_lengths()) {
-            if (n > 200) {  // the large ones at a few placements
-                for (const auto& p : kBigPlaces) copy_case(k, n, p[0], p[1]);
-                continue;
-            }
-            for (size_t os : {0, 1, 3, 8, 17, 33, 63})
-                for (size_t od : kOffsets) copy_case(k, n, os, od);
-        }
-}
-
-TEST_P(MemKernel, EveryClearKernel) {
-    const ZeroKernel kernels[] = {ZOR_BODY(ownsZero_8u_E9), ZOR_BODY(ownsZero_8u_repE9), ZOR_BODY(ownsZero_8u_nt)};
-    for (ZeroKernel k : kernels)
-        for (size_t n : kernel_lengths()) {
-            if (n > 200) {
-                for (const auto& p : kBigPlaces) zero_case(k, n, p[1]);
-                continue;
-            }
-            for (size_t od = 0; od < 64; ++od) zero_case(k, n, od);
+        for (long d : {-65L, -64L, -63L, -1L, 0L, 1L, 63L, 64L, 65L, 129L}) lengths.push_back(base + d);
+    for (int k = 0; k < 8; ++k)
+        for (size_t n : lengths) {
+            const CopyKernel c = copies[k];
+            const ZeroKernel z = k < 5 ? nullptr : zeros[k - 5];
+            if (n > 200)
+                for (const auto& p : {std::array<size_t, 2>{0, 0}, {7, 33}, {63, 1}}) kernel_case(c, z, n, p[0], p[1]);
+            else
+                for (size_t os : {0, 1, 3, 8, 17, 33, 63})
+                    for (size_t od : {0, 1, 2, 3, 4, 7, 8, 15, 16, 17, 31, 32, 33, 48, 63}) kernel_case(c, z, n, os, od);
         }
 }
 

@@ -157,14 +157,18 @@ void sweep(const std::vector<std::vector<T>>& data, bool inplace, int unit, bool
 #define EXPECT_IMAGE(r, want) EXPECT_TRUE(vt::matches<uint8_t>((r), (want), (r).bytes, true))
 #define ASSERT_IMAGE(r, want) ASSERT_TRUE(vt::matches<uint8_t>((r), (want), (r).bytes, true))
 
-// A copy (or move without overlap) of elements of type T: every length and
-// placement, compared as bytes; then the null check.
-template <typename T> void copy_sweep(ZorStatus (*fn)(const T*, T*, int32_t)) {
+// A copy (or move without overlap), or with flip a reversal, out of place
+// and then in place, of elements of type T: every length and placement,
+// compared as bytes; then the null check.
+template <typename T> void copy_sweep(ZorStatus (*fn)(const T*, T*, int32_t), bool flip = false) {
     std::vector<std::vector<uint8_t>> d(1, std::vector<uint8_t>(8200 * sizeof(T)));
-    for (size_t i = 0; i < d[0].size(); ++i) d[0][i] = (uint8_t)(i * 13 + 5);
-    sweep<uint8_t>(d, false, sizeof(T), true,
-                   [&](const uint8_t* const* s, uint8_t* o, int32_t n) { return fn((const T*)s[0], (T*)o, n); },
-                   [&](size_t i) { return d[0][i]; });
+    for (size_t i = 0; i < d[0].size(); ++i) d[0][i] = (uint8_t)(i * 7 + i / 251);
+    for (int inplace = 0; inplace <= flip; ++inplace)
+        sweep<uint8_t>(d, inplace, sizeof(T), true,
+                       [&](const uint8_t* const* s, uint8_t* o, int32_t n) { return fn((const T*)s[0], (T*)o, n); },
+                       [&](size_t i, int len) {
+                           return d[0][flip ? (len - 1 - i / sizeof(T)) * sizeof(T) + i % sizeof(T) : i];
+                       });
     EXPECT_EQ(fn(nullptr, nullptr, 0), zorStsNullPtrErr);
 }
 
