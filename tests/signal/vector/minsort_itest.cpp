@@ -28,21 +28,12 @@ std::vector<float> random_floats(size_t n, uint32_t seed, int range = 1000) {
 
 // ---- minimum -----------------------------------------------------------------
 
-void min_model(const float* p, int len, float* value, int* index) {
-    *value = p[0];
-    *index = 0;
-    for (int i = 1; i < len; ++i) {
-        if (p[i] < *value) {
-            *value = p[i];
-            *index = i;
-        }
-    }
-}
-
+// The model: a strict-below scan from the first element.
 void expect_like_model(const float* p, int len, const char* what, int level) {
-    float mv, v = 1234, w = 5678;
-    int mi, i = -7;
-    min_model(p, len, &mv, &mi);
+    float v = 1234, w = 5678;
+    int mi = 0, i = -7;
+    for (int k = 1; k < len; ++k) mi = p[k] < p[mi] ? k : mi;
+    const float mv = p[mi];
     ASSERT_EQ(ZOR_BODIES(zorsMinIndx_32f)[level](p, len, &v, &i), zorStsNoErr);
     ASSERT_EQ(ZOR_BODIES(zorsMin_32f)[level](p, len, &w), zorStsNoErr);
     ASSERT_EQ(bits(v), bits(mv)) << what << " len " << len;
@@ -76,28 +67,10 @@ TEST_P(MinSearch, AgreesWithTheStrictScanOnEveryPath) {
     }
 }
 
-TEST_P(MinSearch, ChecksAndNullIndex) {
-    const float v[3] = {3, 1, 2};
-    float m = 9;
-    int i = 9;
-    EXPECT_EQ(ZOR_BODY(zorsMin_32f)(nullptr, 0, &m), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsMin_32f)(v, 3, nullptr), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsMin_32f)(v, 0, &m), zorStsSizeErr);
-    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(nullptr, -1, &m, &i), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, -1, nullptr, &i), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, 0, &m, nullptr), zorStsSizeErr);
-    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, -4, &m, &i), zorStsSizeErr);
-    EXPECT_EQ(m, 9);
-    EXPECT_EQ(i, 9);
-    // A null index pointer is no error: the search acts as Min.
-    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, 3, &m, nullptr), zorStsNoErr);
-    EXPECT_EQ(m, 1);
-}
-
 // ---- quicksort ---------------------------------------------------------------
 
 // Patterns that trouble quicksorts: presorted runs, many equal keys,
-// organ pipes, sawtooth.
+// organ pipes, sawtooth, zeros of both signs, NaNs.
 std::vector<float> pattern(int kind, int n, uint32_t seed) {
     std::vector<float> v = random_floats(n, seed, 1 << 20);
     switch (kind) {
@@ -108,56 +81,40 @@ std::vector<float> pattern(int kind, int n, uint32_t seed) {
         case 4: std::fill(v.begin(), v.end(), 2.5f); break;
         case 5: for (int i = 0; i < n; ++i) v[i] = (float)std::min(i, n - i); break;
         case 6: for (int i = 0; i < n; ++i) v[i] = (float)(i % 17); break;
-        case 7: for (int i = 0; i < n; ++i) v[i] = (i % 2) ? -0.0f : 0.0f; break;
+        case 7: for (int i = 0; i < n; ++i) v[i] = (i % 3) ? v[i] : (i % 2) ? -0.0f : 0.0f; break;
+        case 8: for (int i = 0; i < n; i += 3) v[i] = kNaN; break;
     }
     return v;
 }
 
-// The bit patterns as a multiset: zeros of either sign compare equal, so
-// they may change places, never count.
-std::vector<uint32_t> sorted_bits(const std::vector<float>& v) {
+// The bit patterns, as a multiset unless sort is false: zeros of either
+// sign compare equal, so they may change places, never count.
+std::vector<uint32_t> sorted_bits(const std::vector<float>& v, bool sort = true) {
     std::vector<uint32_t> b;
     for (float x : v) b.push_back(bits(x));
-    std::sort(b.begin(), b.end());
+    if (sort) std::sort(b.begin(), b.end());
     return b;
 }
 
 
-// Every pattern at every length to 40 and a few large ones; NaNs (kind 8)
-// neither hang nor lose elements.
+// Every pattern at every length to 40 and a few large ones: sorted, the
+// same elements, and the first level's order bit for bit (which signed
+// zeros make observable: the algorithm fixes it). NaNs (kind 8) neither
+// hang nor lose elements.
 TEST_P(QuickSort, SortsEveryPattern) {
     std::vector<int> sizes = vt::lengths(1);
     sizes.resize(40);
     sizes.insert(sizes.end(), {63, 64, 65, 100, 1000, 4096, 100000});
     for (int kind = 0; kind < 9; ++kind)
         for (int n : sizes) {
-            auto in = pattern(kind, n, 100 + n);
-            if (kind == 8)
-                for (int i = 0; i < n; i += 3) in[i] = kNaN;
-            auto out = in;
+            const auto in = pattern(kind, n, 100 + n);
+            auto out = in, first = in;
             ASSERT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(out.data(), n), zorStsNoErr);
+            ZOR_BODIES(zorsSortAscend_32f_I)[0](first.data(), n);
             ASSERT_TRUE(kind == 8 || std::is_sorted(out.begin(), out.end())) << "kind " << kind << " n " << n;
             ASSERT_EQ(sorted_bits(in), sorted_bits(out)) << "kind " << kind << " n " << n;
+            ASSERT_EQ(sorted_bits(out, false), sorted_bits(first, false)) << "kind " << kind << " n " << n;
         }
-}
-
-TEST_P(QuickSort, SameOrderOnEveryLevel) {
-    // Signed zeros make the order observable; the algorithm fixes it.
-    auto in = random_floats(5000, 9, 3);
-    for (size_t i = 0; i < in.size(); i += 3) in[i] = (i % 2) ? -0.0f : 0.0f;
-    auto mine = in;
-    ZOR_BODY(zorsSortAscend_32f_I)(mine.data(), (int)mine.size());
-    auto first = in;
-    ZOR_BODIES(zorsSortAscend_32f_I)[0](first.data(), (int)first.size());
-    for (size_t i = 0; i < in.size(); ++i) ASSERT_EQ(bits(mine[i]), bits(first[i])) << i;
-}
-
-TEST_P(QuickSort, Checks) {
-    float v[2] = {2, 1};
-    EXPECT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(nullptr, 0), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(v, 0), zorStsSizeErr);
-    EXPECT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(v, 1), zorStsNoErr);
-    EXPECT_EQ(v[0], 2);
 }
 
 // ---- radix sort --------------------------------------------------------------
@@ -211,14 +168,28 @@ TEST_P(RadixSort, OrdersByBitPattern) {
     }
 }
 
-TEST_P(RadixSort, ChecksInOrder) {
-    float v[2] = {2, 1};
+// Pointers, then length, nothing written on refusal; a null index
+// pointer is no error: the search then acts as Min.
+TEST_P(MinSearch, ChecksOfTheSearchesAndSorts) {
+    float v[3] = {3, 1, 2}, m = 9;
+    int i = 9;
     Zor8u buf[20480 + 8];
+    EXPECT_EQ(ZOR_BODY(zorsMin_32f)(nullptr, 0, &m), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsMin_32f)(v, 3, nullptr), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsMin_32f)(v, 0, &m), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(nullptr, -1, &m, &i), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, -1, nullptr, &i), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, 0, &m, nullptr), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, -4, &m, &i), zorStsSizeErr);
+    EXPECT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(nullptr, 0), zorStsNullPtrErr);
+    EXPECT_EQ(ZOR_BODY(zorsSortAscend_32f_I)(v, 0), zorStsSizeErr);
     EXPECT_EQ(ZOR_BODY(zorsSortRadixAscend_32f_I)(nullptr, 2, buf), zorStsNullPtrErr);
     EXPECT_EQ(ZOR_BODY(zorsSortRadixAscend_32f_I)(v, 0, nullptr), zorStsNullPtrErr);
     EXPECT_EQ(ZOR_BODY(zorsSortRadixAscend_32f_I)(v, 0, buf), zorStsSizeErr);
     EXPECT_EQ(ZOR_BODY(zorsSortRadixAscend_32f_I)(v, -2, buf), zorStsSizeErr);
-    EXPECT_EQ(v[0], 2);
+    EXPECT_TRUE(m == 9 && i == 9 && v[0] == 3 && v[1] == 1);
+    EXPECT_EQ(ZOR_BODY(zorsMinIndx_32f)(v, 3, &m, nullptr), zorStsNoErr);
+    EXPECT_EQ(m, 1);
 }
 
 TEST_P(RadixSort, BufferSizeByType) {

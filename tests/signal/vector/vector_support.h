@@ -44,22 +44,14 @@ struct Region {
     uint8_t* in(std::vector<uint8_t>& image) const { return image.data() + offset; }
 };
 
-// Element access at any byte address.
+// Element access at any byte address; the bits of a float or double, and back.
 template <typename T> inline T get(const void* p, size_t i) {
     T x;
     std::memcpy(&x, static_cast<const uint8_t*>(p) + i * sizeof(T), sizeof(T));
     return x;
 }
-template <typename T> inline void put(void* p, size_t i, T x) {
-    std::memcpy(static_cast<uint8_t*>(p) + i * sizeof(T), &x, sizeof(T));
-}
-
-// The bits of a float or double, and back.
-template <typename T> inline auto bits(T x) {
-    std::conditional_t<sizeof(T) == 4, uint32_t, uint64_t> u;
-    std::memcpy(&u, &x, sizeof u);
-    return u;
-}
+template <typename T> inline void put(void* p, size_t i, T x) { std::memcpy(static_cast<uint8_t*>(p) + i * sizeof(T), &x, sizeof(T)); }
+template <typename T> inline auto bits(T x) { return get<std::conditional_t<sizeof(T) == 4, uint32_t, uint64_t>>(&x, 0); }
 inline float f32(uint32_t u) { return get<float>(&u, 0); }
 inline double f64(uint64_t u) { return get<double>(&u, 0); }
 
@@ -92,12 +84,7 @@ template <typename T> inline std::vector<T> values(size_t n, uint32_t seed) {
                     std::numeric_limits<T>::max(), -std::numeric_limits<T>::min(), T(1), T(-1)};
     if (sizeof(T) == 4) specials[4] = (T)f32(0x7fc12345u), specials[6] = (T)f32(0x7f812345u);
     std::vector<T> v(n);
-    for (size_t i = 0; i < n; ++i) {
-        if (gen() % 7 == 0)
-            v[i] = specials[gen() % (sizeof specials / sizeof specials[0])];
-        else
-            v[i] = std::ldexp(mant(gen), expo(gen));
-    }
+    for (T& x : v) x = gen() % 7 == 0 ? specials[gen() % std::size(specials)] : std::ldexp(mant(gen), expo(gen));
     return v;
 }
 
@@ -142,19 +129,15 @@ void sweep(const std::vector<std::vector<T>>& data, bool inplace, int unit, bool
                     src[k] = r.as<T>();
                 }
                 auto want = out.raw;
-                for (size_t i = 0; i < count; ++i) {
-                    if constexpr (std::is_invocable_v<Model, size_t, int>)
-                        put<T>(out.in(want), i, model(i, len));
-                    else
-                        put<T>(out.in(want), i, model(i));
-                }
+                for (size_t i = 0; i < count; ++i)
+                    if constexpr (std::is_invocable_v<Model, size_t, int>) put<T>(out.in(want), i, model(i, len));
+                    else put<T>(out.in(want), i, model(i));
                 ASSERT_EQ(call(src, out.as<T>(), len), len ? zorStsNoErr : zorStsSizeErr);
                 ASSERT_TRUE(matches<T>(out, want, count, exact)) << "len " << len << " at " << ps << ", " << pd;
             }
 }
 
 // The whole buffer of r against want, byte for byte.
-#define EXPECT_IMAGE(r, want) EXPECT_TRUE(vt::matches<uint8_t>((r), (want), (r).bytes, true))
 #define ASSERT_IMAGE(r, want) ASSERT_TRUE(vt::matches<uint8_t>((r), (want), (r).bytes, true))
 
 // A copy (or move without overlap), or with flip a reversal, out of place
