@@ -89,23 +89,18 @@ template <typename T> std::vector<std::vector<T>> max_sources() {
     if constexpr (std::is_floating_point_v<T>) return sources<T>(2);
     std::vector<std::vector<T>> v(2, std::vector<T>(16400));
     std::mt19937 gen(3);
-    for (auto& s : v)
-        for (auto& x : s) x = (T)gen();
+    for (auto& s : v) std::generate(s.begin(), s.end(), [&] { return (T)gen(); });
     return v;
 }
 
 // No tolerance: the rule picks one operand, bits and all; for NaN and
-// signed-zero pairs, which the values hold, the second.
-template <typename T> void max_sweep(ZorStatus (*fn)(const T*, const T*, T*, uint32_t)) {
-    const auto d = max_sources<T>();
-    sweep<T>(d, false, 1, true, [fn](const T* const* s, T* o, int32_t n) { return fn(s[0], s[1], o, n); },
-             [&](size_t i) { return larger(d[0][i], d[1][i]); });
-}
-
-// Overlap of destination and either source: the result is that of an
-// element by element walk from the first.
-template <typename T> void overlap_walk(ZorStatus (*fn)(const T*, const T*, T*, uint32_t)) {
+// signed-zero pairs, which the values hold, the second. With destination
+// and either source overlapping, the result is that of an element by
+// element walk from the first.
+template <typename T> void max_all(ZorStatus (*fn)(const T*, const T*, T*, uint32_t)) {
     const auto v = max_sources<T>();
+    sweep<T>(v, false, 1, true, [fn](const T* const* s, T* o, int32_t n) { return fn(s[0], s[1], o, n); },
+             [&](size_t i) { return larger(v[0][i], v[1][i]); });
     for (int shift = -20; shift <= 20; ++shift)
         for (int len : {7, 8, 9, 31, 64, 100})
             for (int which = 0; which < 2; ++which) {
@@ -121,10 +116,7 @@ template <typename T> void overlap_walk(ZorStatus (*fn)(const T*, const T*, T*, 
 }
 
 TEST_P(MaxEvery, EveryTypeEveryLengthAndOverlap) {
-    max_sweep<Zor8u>(zorsMaxEvery_8u), overlap_walk<Zor8u>(zorsMaxEvery_8u);
-    max_sweep<Zor16u>(zorsMaxEvery_16u), overlap_walk<Zor16u>(zorsMaxEvery_16u);
-    max_sweep<Zor32f>(zorsMaxEvery_32f), overlap_walk<Zor32f>(zorsMaxEvery_32f);
-    max_sweep<Zor64f>(zorsMaxEvery_64f), overlap_walk<Zor64f>(zorsMaxEvery_64f);
+    max_all(zorsMaxEvery_8u), max_all(zorsMaxEvery_16u), max_all(zorsMaxEvery_32f), max_all(zorsMaxEvery_64f);
 }
 
 // ---- reversal, copies and moves ------------------------------------------------
@@ -183,17 +175,13 @@ TEST_P(Checks, PointersThenLength) {
         {zorsSqr_32f_I(f, 0), S, __LINE__},
         // Complex sums: the length first, then the real form over 2 * len
         // (32 bits: from 0x40000000 on it wraps negative), pointers there.
-        {zorsAdd_32fc(nullptr, nullptr, nullptr, 0), S, __LINE__},
-        {zorsAdd_64fc(nullptr, z, z, -1), S, __LINE__},
-        {zorsAdd_32fc_I(nullptr, nullptr, 0), S, __LINE__},
-        {zorsAdd_32fc(c, nullptr, c, 1), N, __LINE__},
-        {zorsAdd_32fc(nullptr, c, c, 0x3fffffff), N, __LINE__},
-        {zorsAdd_32fc(c, c, c, 0x40000000), S, __LINE__},
+        {zorsAdd_32fc(nullptr, nullptr, nullptr, 0), S, __LINE__}, {zorsAdd_64fc(nullptr, z, z, -1), S, __LINE__},
+        {zorsAdd_32fc_I(nullptr, nullptr, 0), S, __LINE__},       {zorsAdd_32fc(c, nullptr, c, 1), N, __LINE__},
+        {zorsAdd_32fc(nullptr, c, c, 0x3fffffff), N, __LINE__},   {zorsAdd_32fc(c, c, c, 0x40000000), S, __LINE__},
         {zorsAdd_64fc(nullptr, nullptr, nullptr, 0x40000000), N, __LINE__},
-        {zorsAdd_32fc_I(c, c, 0x7fffffff), S, __LINE__},
-        {zorsAdd_64fc_I(z, z, 0x60000000), S, __LINE__},
+        {zorsAdd_32fc_I(c, c, 0x7fffffff), S, __LINE__},          {zorsAdd_64fc_I(z, z, 0x60000000), S, __LINE__},
         // Flip: equal pointers go to the in-place form and its checks.
-        {zorsFlip_32f(nullptr, nullptr, 0), N, __LINE__}, {zorsFlip_32f(f, f, 0), S, __LINE__},
+        {zorsFlip_32f(nullptr, nullptr, 0), N, __LINE__},  {zorsFlip_32f(f, f, 0), S, __LINE__},
         {zorsFlip_64fc(nullptr, nullptr, 5), N, __LINE__}, {zorsFlip_32fc(c, nullptr, 0), N, __LINE__},
         {zorsFlip_64f(d, d + 1, 0), S, __LINE__},
         {zorsCopy_32f(nf, f, 0), N, __LINE__},           {zorsCopy_64fc(z, z, 0), S, __LINE__},
