@@ -70,7 +70,6 @@ TEST_P(Sum, AccurateOrderExactFastFormBounded) {
         }
 }
 
-// ---- dot products -----------------------------------------------------------
 
 template <typename T> struct Cx { T re, im; };
 

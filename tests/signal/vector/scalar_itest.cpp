@@ -23,7 +23,6 @@ const double kNaN = std::numeric_limits<double>::quiet_NaN();
 using vt::bits;
 const auto from_bits = vt::f64;
 
-// ---- floor, ceiling, square root --------------------------------------------
 
 std::vector<double> rounding_cases() {
     std::vector<double> v = {0.0, -0.0, 0.5, -0.5, 0.3, -0.3, 1.0, -1.0, 1.5, -1.5, 2.5, -2.5,
@@ -55,7 +54,6 @@ TEST_P(ScalarOne, FloorCeilSqrtMatchTheLibrary) {
     }
 }
 
-// ---- sine and cosine ----------------------------------------------------------
 
 struct Hard {
     double x, sin, cos;  // correctly rounded results
