@@ -17,7 +17,6 @@ namespace {
 using vt::Region;
 
 using Elementwise = zortest::LevelTest;
-using Convert = zortest::LevelTest;
 
 // Adding +-0 and multiplying by 1 touch nothing and multiplying by +-0
 // clears, bit for bit whatever the elements hold (signalling NaNs too).
@@ -61,7 +60,6 @@ TEST_P(Elementwise, Checks) {
     EXPECT_TRUE(f[0] == 1 && f[1] == 2 && d[0] == 3 && one[0].im == 2 && b == 7);
 }
 
-
 // Clears: small lengths at many placements; around the kernel's thresholds
 // once per type family.
 template <typename T> void clear_case(ZorStatus (*fn)(T*, int32_t), long elements, size_t off) {
@@ -90,7 +88,6 @@ TEST_P(Elementwise, ClearsAndIntegerCopies) {
     clear_all(ZOR_BODY(zorsZero_32fc), false), clear_all(ZOR_BODY(zorsZero_64fc), true);
     vt::copy_sweep(ZOR_BODY(zorsCopy_8u)), vt::copy_sweep(ZOR_BODY(zorsCopy_16s)), vt::copy_sweep(ZOR_BODY(zorsCopy_32s));
 }
-
 
 // Exact: long double holds every float times any power of two used here.
 long convert_model(float x, int mode, int sf, long lo, long hi) {
@@ -154,7 +151,7 @@ void convert_all(ZorStatus (*fn)(const Zor32f*, D*, int32_t, int32_t, int32_t), 
             }
 }
 
-TEST_P(Convert, EveryModeAndScaleSaturated) {
+TEST_P(Elementwise, ConvertEveryModeAndScaleSaturated) {
     convert_all<Zor8u>(ZOR_BODY(zorsConvert_32f8u_Sfs), 0, 255);
     convert_all<Zor16u>(ZOR_BODY(zorsConvert_32f16u_Sfs), 0, 65535);
     convert_all<Zor16s>(ZOR_BODY(zorsConvert_32f16s_Sfs), -32768, 32767);
@@ -250,6 +247,5 @@ TEST_P(Elementwise, CacheTableAgreesWithTheRuntime) {
 }
 
 ZOR_INSTANTIATE_LEVELS(Elementwise);
-ZOR_INSTANTIATE_LEVELS(Convert);
 
 }  // namespace

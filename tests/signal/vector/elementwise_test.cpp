@@ -8,10 +8,7 @@
 namespace {
 
 using vt::sweep;
-using Arith = zortest::LevelTest;
-using MaxEvery = zortest::LevelTest;
-using Flip = zortest::LevelTest;
-using Checks = zortest::LevelTest;
+using VectorOps = zortest::LevelTest;
 
 template <typename T> std::vector<std::vector<T>> sources(int count) {
     std::vector<std::vector<T>> v;
@@ -36,7 +33,7 @@ template <typename T, typename E = T, typename Fn, typename Op> void binary(Fn f
 const auto add = [](auto x, auto y) { return x + y; };
 const auto mul = [](auto x, auto y) { return x * y; };
 
-TEST_P(Arith, SumsAndProducts) {
+TEST_P(VectorOps, SumsAndProducts) {
     binary<float>(zorsAdd_32f, add, false), binary<float>(zorsAdd_32f_I, add, true);
     binary<double>(zorsAdd_64f, add, false), binary<double>(zorsAdd_64f_I, add, true);
     binary<float>(zorsMul_32f, mul, false), binary<float>(zorsMul_32f_I, mul, true);
@@ -47,7 +44,7 @@ TEST_P(Arith, SumsAndProducts) {
 // Constant forms and the square. By 1 a copy and by +-0 a clear, bit for
 // bit whatever the elements hold (signalling NaNs too); subtracting +-0 a
 // copy. Complex products take no short cut, for 1 and 0 either.
-TEST_P(Arith, ConstantForms) {
+TEST_P(VectorOps, ConstantForms) {
     const auto f = sources<float>(1);
     const auto d = sources<double>(1);
     using F = const float* const*;
@@ -78,7 +75,6 @@ TEST_P(Arith, ConstantForms) {
                       model(d[0], (double)c[0], (double)c[1]));
     }
 }
-
 
 template <typename T> T larger(T a, T b) { return a > b ? a : b; }
 
@@ -112,10 +108,9 @@ template <typename T> void max_all(ZorStatus (*fn)(const T*, const T*, T*, uint3
             }
 }
 
-TEST_P(MaxEvery, EveryTypeEveryLengthAndOverlap) {
+TEST_P(VectorOps, MaximumEveryTypeLengthAndOverlap) {
     max_all(zorsMaxEvery_8u), max_all(zorsMaxEvery_16u), max_all(zorsMaxEvery_32f), max_all(zorsMaxEvery_64f);
 }
-
 
 // A range moved onto itself shifted by every byte count up to 70 either
 // way gives the source's former content; every move is the same byte
@@ -135,7 +130,7 @@ template <typename T> void overlap(ZorStatus (*fn)(const T*, T*, int32_t)) {
 
 // Reversals (equal pointers reverse in place), copies and moves without
 // overlap as byte patterns of every type; then overlapping moves.
-TEST_P(Flip, ReversalsCopiesAndMoves) {
+TEST_P(VectorOps, ReversalsCopiesAndMoves) {
     vt::copy_sweep(zorsFlip_32f, true), vt::copy_sweep(zorsCopy_32f), vt::copy_sweep(zorsMove_32f);
     vt::copy_sweep(zorsFlip_32fc, true), vt::copy_sweep(zorsCopy_32fc), vt::copy_sweep(zorsMove_32fc);
     vt::copy_sweep(zorsFlip_64f, true), vt::copy_sweep(zorsCopy_64f), vt::copy_sweep(zorsMove_64f);
@@ -143,8 +138,7 @@ TEST_P(Flip, ReversalsCopiesAndMoves) {
     overlap(zorsMove_32f), overlap(zorsMove_64fc);
 }
 
-
-TEST_P(Checks, PointersThenLength) {
+TEST_P(VectorOps, ChecksPointersThenLength) {
     float f[4] = {1, 2, 3, 4};
     double d[4] = {1, 2, 3, 4};
     Zor32fc c[2] = {{1, 2}, {3, 4}};
@@ -155,47 +149,38 @@ TEST_P(Checks, PointersThenLength) {
     const ZorStatus N = zorStsNullPtrErr, S = zorStsSizeErr;
     const struct {
         ZorStatus got, want;
-        int line;
     } cases[] = {
-        {zorsAdd_32f(nf, f, f, 0), N, __LINE__},         {zorsAdd_32f(f, f, nullptr, 4), N, __LINE__},
-        {zorsAdd_32f(f, f, f, 0), S, __LINE__},          {zorsAdd_32f(f, f, f, -3), S, __LINE__},
-        {zorsAdd_64f(d, nullptr, d, -1), N, __LINE__},   {zorsAdd_32f_I(nullptr, f, 0), N, __LINE__},
-        {zorsAdd_64f_I(d, d, 0), S, __LINE__},           {zorsMul_32f(f, nullptr, f, 0), N, __LINE__},
-        {zorsMul_32f_I(f, f, -1), S, __LINE__},          {zorsMulC_32f(nf, f, 0, 1.0f), N, __LINE__},
-        {zorsMulC_32f(f, f, 0, 1.0f), S, __LINE__},      {zorsMulC_32f(f, f, 0, 0.0f), S, __LINE__},
-        {zorsMulC_64f(d, nullptr, 1, 0.0), N, __LINE__}, {zorsMulC_32f_I(nullptr, 0, 1.0f), N, __LINE__},
-        {zorsMulC_32f_I(f, 0, 1.0f), S, __LINE__},       {zorsMulC_32fc(c, nullptr, 0, c[0]), N, __LINE__},
-        {zorsMulC_64fc(z, z, 0, z[0]), S, __LINE__},     {zorsSubC_32f(f, nullptr, 0, 0.0f), N, __LINE__},
-        {zorsSubC_32f(f, f, -2, 0.0f), S, __LINE__},     {zorsSqr_32f_I(nullptr, -1), N, __LINE__},
-        {zorsSqr_32f_I(f, 0), S, __LINE__},
+        {zorsAdd_32f(nf, f, f, 0), N}, {zorsAdd_32f(f, f, nullptr, 4), N}, {zorsAdd_32f(f, f, f, 0), S},
+        {zorsAdd_32f(f, f, f, -3), S}, {zorsAdd_64f(d, nullptr, d, -1), N}, {zorsAdd_32f_I(nullptr, f, 0), N},
+        {zorsAdd_64f_I(d, d, 0), S}, {zorsMul_32f(f, nullptr, f, 0), N}, {zorsMul_32f_I(f, f, -1), S},
+        {zorsMulC_32f(nf, f, 0, 1.0f), N}, {zorsMulC_32f(f, f, 0, 1.0f), S}, {zorsMulC_32f(f, f, 0, 0.0f), S},
+        {zorsMulC_64f(d, nullptr, 1, 0.0), N}, {zorsMulC_32f_I(nullptr, 0, 1.0f), N}, {zorsMulC_32f_I(f, 0, 1.0f), S},
+        {zorsMulC_32fc(c, nullptr, 0, c[0]), N}, {zorsMulC_64fc(z, z, 0, z[0]), S},
+        {zorsSubC_32f(f, nullptr, 0, 0.0f), N}, {zorsSubC_32f(f, f, -2, 0.0f), S}, {zorsSqr_32f_I(nullptr, -1), N},
+        {zorsSqr_32f_I(f, 0), S},
         // Complex sums: the length first, then the real form over 2 * len
         // (32 bits: from 0x40000000 on it wraps negative), pointers there.
-        {zorsAdd_32fc(nullptr, nullptr, nullptr, 0), S, __LINE__}, {zorsAdd_64fc(nullptr, z, z, -1), S, __LINE__},
-        {zorsAdd_32fc_I(nullptr, nullptr, 0), S, __LINE__},       {zorsAdd_32fc(c, nullptr, c, 1), N, __LINE__},
-        {zorsAdd_32fc(nullptr, c, c, 0x3fffffff), N, __LINE__},   {zorsAdd_32fc(c, c, c, 0x40000000), S, __LINE__},
-        {zorsAdd_64fc(nullptr, nullptr, nullptr, 0x40000000), N, __LINE__},
-        {zorsAdd_32fc_I(c, c, 0x7fffffff), S, __LINE__},          {zorsAdd_64fc_I(z, z, 0x60000000), S, __LINE__},
+        {zorsAdd_32fc(nullptr, nullptr, nullptr, 0), S}, {zorsAdd_64fc(nullptr, z, z, -1), S},
+        {zorsAdd_32fc_I(nullptr, nullptr, 0), S}, {zorsAdd_32fc(c, nullptr, c, 1), N},
+        {zorsAdd_32fc(nullptr, c, c, 0x3fffffff), N}, {zorsAdd_32fc(c, c, c, 0x40000000), S},
+        {zorsAdd_64fc(nullptr, nullptr, nullptr, 0x40000000), N}, {zorsAdd_32fc_I(c, c, 0x7fffffff), S},
+        {zorsAdd_64fc_I(z, z, 0x60000000), S},
         // Flip: equal pointers go to the in-place form and its checks.
-        {zorsFlip_32f(nullptr, nullptr, 0), N, __LINE__},  {zorsFlip_32f(f, f, 0), S, __LINE__},
-        {zorsFlip_64fc(nullptr, nullptr, 5), N, __LINE__}, {zorsFlip_32fc(c, nullptr, 0), N, __LINE__},
-        {zorsFlip_64f(d, d + 1, 0), S, __LINE__},
-        {zorsCopy_32f(nf, f, 0), N, __LINE__},           {zorsCopy_64fc(z, z, 0), S, __LINE__},
-        {zorsCopy_64f(d, nullptr, 3), N, __LINE__},      {zorsCopy_32fc(c, c + 1, -1), S, __LINE__},
-        {zorsMove_32f(f, nullptr, 0), N, __LINE__},      {zorsMove_64fc(z, z, 0), S, __LINE__},
-        {zorsMove_64f(nullptr, d, 2), N, __LINE__},      {zorsMove_32fc(c, c, -7), S, __LINE__},
+        {zorsFlip_32f(nullptr, nullptr, 0), N}, {zorsFlip_32f(f, f, 0), S}, {zorsFlip_64fc(nullptr, nullptr, 5), N},
+        {zorsFlip_32fc(c, nullptr, 0), N}, {zorsFlip_64f(d, d + 1, 0), S}, {zorsCopy_32f(nf, f, 0), N},
+        {zorsCopy_64fc(z, z, 0), S}, {zorsCopy_64f(d, nullptr, 3), N}, {zorsCopy_32fc(c, c + 1, -1), S},
+        {zorsMove_32f(f, nullptr, 0), N}, {zorsMove_64fc(z, z, 0), S}, {zorsMove_64f(nullptr, d, 2), N},
+        {zorsMove_32fc(c, c, -7), S},
         // Maximum: pointers first, then the unsigned length, only 0 refused.
-        {zorsMaxEvery_8u(b, b, nullptr, 0), N, __LINE__}, {zorsMaxEvery_8u(b, b, b, 0), S, __LINE__},
-        {zorsMaxEvery_16u(nullptr, h, h, 4), N, __LINE__}, {zorsMaxEvery_32f(f, f, f, 0), S, __LINE__},
-        {zorsMaxEvery_64f(d, nullptr, d, 0), N, __LINE__},
+        {zorsMaxEvery_8u(b, b, nullptr, 0), N}, {zorsMaxEvery_8u(b, b, b, 0), S},
+        {zorsMaxEvery_16u(nullptr, h, h, 4), N}, {zorsMaxEvery_32f(f, f, f, 0), S},
+        {zorsMaxEvery_64f(d, nullptr, d, 0), N},
     };
-    for (const auto& c : cases) EXPECT_EQ(c.got, c.want) << "case at line " << c.line;
+    for (const auto& c : cases) EXPECT_EQ(c.got, c.want) << "case " << &c - cases;
     // Nothing written by any refused call.
     EXPECT_TRUE(f[0] == 1 && f[3] == 4 && d[3] == 4 && c[1].im == 4 && z[1].im == 4 && b[3] == 4 && h[3] == 4);
 }
 
-ZOR_INSTANTIATE_LEVELS(Arith);
-ZOR_INSTANTIATE_LEVELS(MaxEvery);
-ZOR_INSTANTIATE_LEVELS(Flip);
-ZOR_INSTANTIATE_LEVELS(Checks);
+ZOR_INSTANTIATE_LEVELS(VectorOps);
 
 }  // namespace

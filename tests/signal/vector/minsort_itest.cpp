@@ -7,9 +7,7 @@
 
 namespace {
 
-using MinSearch = zortest::LevelTest;
-using QuickSort = zortest::LevelTest;
-using RadixSort = zortest::LevelTest;
+using SearchSort = zortest::LevelTest;
 
 const float kInf = std::numeric_limits<float>::infinity();
 const float kNaN = std::numeric_limits<float>::quiet_NaN();
@@ -24,7 +22,6 @@ std::vector<float> random_floats(size_t n, uint32_t seed, int range = 1000) {
     for (auto& x : v) x = d(gen) * 0.25f;
     return v;
 }
-
 
 // The model: a strict-below scan from the first element.
 void expect_like_model(const float* p, int len, const char* what, int level) {
@@ -43,7 +40,7 @@ void expect_like_model(const float* p, int len, const char* what, int level) {
 // NaNs sprinkled in (passed over); then a NaN first (it stands), the
 // minimum a zero of either sign, and -infinity last, at every length and
 // start alignment.
-TEST_P(MinSearch, AgreesWithTheStrictScanOnEveryPath) {
+TEST_P(SearchSort, MinimumAgreesWithTheStrictScanOnEveryPath) {
     const int level = GetParam().index;
     const auto data = random_floats(8192 + 8, 3, 6);
     for (int variant = 0; variant < 4; ++variant) {
@@ -64,7 +61,6 @@ TEST_P(MinSearch, AgreesWithTheStrictScanOnEveryPath) {
             }
     }
 }
-
 
 // Patterns that trouble quicksorts: presorted runs, many equal keys,
 // organ pipes, sawtooth, zeros of both signs, NaNs.
@@ -93,12 +89,11 @@ std::vector<uint32_t> sorted_bits(const std::vector<float>& v, bool sort = true)
     return b;
 }
 
-
 // Every pattern at every length to 40 and a few large ones: sorted, the
 // same elements, and the first level's order bit for bit (which signed
 // zeros make observable: the algorithm fixes it). NaNs (kind 8) neither
 // hang nor lose elements.
-TEST_P(QuickSort, SortsEveryPattern) {
+TEST_P(SearchSort, QuickSortsEveryPattern) {
     std::vector<int> sizes = vt::lengths(1);
     sizes.resize(40);
     sizes.insert(sizes.end(), {63, 64, 65, 100, 1000, 4096, 100000});
@@ -113,7 +108,6 @@ TEST_P(QuickSort, SortsEveryPattern) {
             ASSERT_EQ(sorted_bits(out, false), sorted_bits(first, false)) << "kind " << kind << " n " << n;
         }
 }
-
 
 // The order the radix sort promises: by key, the sign bit flipped for
 // positives and every bit for negatives; equal keys are equal bits.
@@ -146,7 +140,7 @@ void run_radix(int level, std::vector<float>& v, int misalign) {
     for (int k = 0; k < 64; ++k) ASSERT_EQ(buf[misalign + size + k], 0xA5) << "wrote past its buffer";
 }
 
-TEST_P(RadixSort, OrdersByBitPattern) {
+TEST_P(SearchSort, RadixOrdersByBitPattern) {
     const int level = GetParam().index;
     for (int n : vt::lengths(1)) {
         const auto in = random_patterns(n, 1000 + n);
@@ -159,7 +153,7 @@ TEST_P(RadixSort, OrdersByBitPattern) {
 
 // Pointers, then length, nothing written on refusal; a null index
 // pointer is no error: the search then acts as Min.
-TEST_P(MinSearch, ChecksOfTheSearchesAndSorts) {
+TEST_P(SearchSort, ChecksOfTheSearchesAndSorts) {
     float v[3] = {3, 1, 2}, m = 9;
     int i = 9;
     Zor8u buf[20480 + 8];
@@ -183,7 +177,7 @@ TEST_P(MinSearch, ChecksOfTheSearchesAndSorts) {
 
 // The length is checked before the type; a size error stores nothing, a
 // type error stores 0.
-TEST_P(RadixSort, BufferSizeByType) {
+TEST_P(SearchSort, RadixBufferSizeByType) {
     const ZorStatus OK = zorStsNoErr, T = zorStsDataTypeErr, S = zorStsSizeErr;
     const struct {
         int type;
@@ -204,8 +198,6 @@ TEST_P(RadixSort, BufferSizeByType) {
     EXPECT_EQ(ZOR_BODY(zorsSortRadixGetBufferSize)(-1, zor32f, nullptr), zorStsNullPtrErr);
 }
 
-ZOR_INSTANTIATE_LEVELS(MinSearch);
-ZOR_INSTANTIATE_LEVELS(QuickSort);
-ZOR_INSTANTIATE_LEVELS(RadixSort);
+ZOR_INSTANTIATE_LEVELS(SearchSort);
 
 }  // namespace

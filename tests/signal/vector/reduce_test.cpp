@@ -10,8 +10,7 @@
 
 namespace {
 
-using Sum = zortest::LevelTest;
-using DotProd = zortest::LevelTest;
+using Reduce = zortest::LevelTest;
 
 using vt::bits;
 
@@ -41,7 +40,7 @@ float accurate_model(const float* p, int len) {
 // the bound of single-precision addition. All -0 sums to -0 (the lanes
 // start there); beyond single precision the accurate form's double lanes
 // keep what float lanes would lose.
-TEST_P(Sum, AccurateOrderExactFastFormBounded) {
+TEST_P(Reduce, SumAccurateOrderExactFastFormBounded) {
     const auto data = random_values<float>(16384 + 8, 7);
     for (int offset = 0; offset < 4; ++offset)
         for (int len : vt::lengths(1)) {
@@ -70,7 +69,6 @@ TEST_P(Sum, AccurateOrderExactFastFormBounded) {
         }
 }
 
-
 template <typename T> struct Cx { T re, im; };
 
 // Element i of a real (w = 1) or complex (w = 2) vector, as complex.
@@ -94,8 +92,7 @@ void check_form(ZorStatus (*fn)(const A*, const B*, int32_t, R*), uint32_t seed)
         for (int len : vt::lengths(1)) {
             const T* pa = ra.data() + offA * aw;
             const T* pb = rb.data() + (offA * 5 + len) % 3 * bw;
-            R out;
-            std::memset(&out, 0, sizeof out);
+            R out{};
             ASSERT_EQ(fn(reinterpret_cast<const A*>(pa), reinterpret_cast<const B*>(pb), len, &out), zorStsNoErr);
             T got[2];
             std::memcpy(got, &out, sizeof out);
@@ -124,7 +121,7 @@ void check_form(ZorStatus (*fn)(const A*, const B*, int32_t, R*), uint32_t seed)
     }
 }
 
-TEST_P(DotProd, ShortOrderExactWideOrderBounded) {
+TEST_P(Reduce, DotProductShortOrderExactWideOrderBounded) {
     check_form<float, Zor32f, Zor32f, Zor32f, false>(zorsDotProd_32f, 1);
     check_form<double, Zor64f, Zor64f, Zor64f, false>(zorsDotProd_64f, 2);
     check_form<float, Zor32fc, Zor32fc, Zor32fc, true>(zorsDotProd_32fc, 3);
@@ -135,7 +132,7 @@ TEST_P(DotProd, ShortOrderExactWideOrderBounded) {
 
 // The sum's and the dot products' checks: pointers, then length; nothing
 // written on refusal.
-TEST_P(DotProd, ChecksPointersThenLength) {
+TEST_P(Reduce, ChecksPointersThenLength) {
     float f[2] = {1, 2}, rf = 7, s = 7;
     double d[2] = {1, 2}, rd = 7;
     Zor32fc c[2] = {}, rc = {7, 7};
@@ -143,23 +140,21 @@ TEST_P(DotProd, ChecksPointersThenLength) {
     const ZorStatus N = zorStsNullPtrErr, S = zorStsSizeErr;
     const struct {
         ZorStatus got, want;
-        int line;
     } cases[] = {
-        {zorsSum_32f(nullptr, 0, &s, 0), N, __LINE__},         {zorsSum_32f(f, -1, nullptr, 1), N, __LINE__},
-        {zorsSum_32f(f, 0, &s, 0), S, __LINE__},               {zorsSum_32f(f, -5, &s, 1), S, __LINE__},
-        {zorsDotProd_32f(nullptr, f, 0, &rf), N, __LINE__},    {zorsDotProd_32f(f, nullptr, 2, &rf), N, __LINE__},
-        {zorsDotProd_32f(f, f, -1, nullptr), N, __LINE__},     {zorsDotProd_32f(f, f, 0, &rf), S, __LINE__},
-        {zorsDotProd_64f(d, nullptr, 0, &rd), N, __LINE__},    {zorsDotProd_64f(d, d, -3, &rd), S, __LINE__},
-        {zorsDotProd_32fc(c, c, 0, nullptr), N, __LINE__},     {zorsDotProd_32fc(c, c, 0, &rc), S, __LINE__},
-        {zorsDotProd_64fc(nullptr, z, 1, &rz), N, __LINE__},   {zorsDotProd_64fc(z, z, 0, &rz), S, __LINE__},
-        {zorsDotProd_32f32fc(f, nullptr, -1, &rc), N, __LINE__}, {zorsDotProd_32f32fc(f, c, 0, &rc), S, __LINE__},
-        {zorsDotProd_64f64fc(nullptr, z, 0, &rz), N, __LINE__}, {zorsDotProd_64f64fc(d, z, INT32_MIN, &rz), S, __LINE__},
+        {zorsSum_32f(nullptr, 0, &s, 0), N}, {zorsSum_32f(f, -1, nullptr, 1), N}, {zorsSum_32f(f, 0, &s, 0), S},
+        {zorsSum_32f(f, -5, &s, 1), S}, {zorsDotProd_32f(nullptr, f, 0, &rf), N},
+        {zorsDotProd_32f(f, nullptr, 2, &rf), N}, {zorsDotProd_32f(f, f, -1, nullptr), N},
+        {zorsDotProd_32f(f, f, 0, &rf), S}, {zorsDotProd_64f(d, nullptr, 0, &rd), N},
+        {zorsDotProd_64f(d, d, -3, &rd), S}, {zorsDotProd_32fc(c, c, 0, nullptr), N},
+        {zorsDotProd_32fc(c, c, 0, &rc), S}, {zorsDotProd_64fc(nullptr, z, 1, &rz), N},
+        {zorsDotProd_64fc(z, z, 0, &rz), S}, {zorsDotProd_32f32fc(f, nullptr, -1, &rc), N},
+        {zorsDotProd_32f32fc(f, c, 0, &rc), S}, {zorsDotProd_64f64fc(nullptr, z, 0, &rz), N},
+        {zorsDotProd_64f64fc(d, z, INT32_MIN, &rz), S},
     };
-    for (const auto& k : cases) EXPECT_EQ(k.got, k.want) << "case at line " << k.line;
+    for (const auto& k : cases) EXPECT_EQ(k.got, k.want) << "case " << &k - cases;
     EXPECT_TRUE(s == 7 && rf == 7 && rd == 7 && rc.re == 7 && rz.im == 7);
 }
 
-ZOR_INSTANTIATE_LEVELS(Sum);
-ZOR_INSTANTIATE_LEVELS(DotProd);
+ZOR_INSTANTIATE_LEVELS(Reduce);
 
 }  // namespace

@@ -15,14 +15,12 @@
 namespace {
 
 using ScalarOne = zortest::LevelTest;
-using SinCosOne = zortest::LevelTest;
 
 const double kInf = std::numeric_limits<double>::infinity();
 const double kNaN = std::numeric_limits<double>::quiet_NaN();
 
 using vt::bits;
 const auto from_bits = vt::f64;
-
 
 std::vector<double> rounding_cases() {
     std::vector<double> v = {0.0, -0.0, 0.5, -0.5, 0.3, -0.3, 1.0, -1.0, 1.5, -1.5, 2.5, -2.5,
@@ -54,7 +52,6 @@ TEST_P(ScalarOne, FloorCeilSqrtMatchTheLibrary) {
     }
 }
 
-
 struct Hard {
     double x, sin, cos;  // correctly rounded results
 };
@@ -82,7 +79,7 @@ bool within_one_ulp(double y, double correct) {
     return y == correct || y == std::nextafter(correct, kInf) || y == std::nextafter(correct, -kInf);
 }
 
-TEST_P(SinCosOne, HardArgumentsWithinOneUlpAndSpecialOnes) {
+TEST_P(ScalarOne, SinCosHardArgumentsWithinOneUlpAndSpecialOnes) {
     const auto sinBody = ZOR_BODY(zorsSinOne);
     const auto cosBody = ZOR_BODY(zorsCosOne);
     int exact = 0;
@@ -132,7 +129,7 @@ std::vector<double> sweep_arguments() {
 
 // Within one ulp, about half an ulp plus a little at worst, and the first
 // level's bits.
-TEST_P(SinCosOne, SweepWithinOneUlpAndSameBitsOnEveryLevel) {
+TEST_P(ScalarOne, SinCosSweepWithinOneUlpAndSameBitsOnEveryLevel) {
     const auto sinBody = ZOR_BODY(zorsSinOne), cosBody = ZOR_BODY(zorsCosOne);
     const auto sinFirst = ZOR_BODIES(zorsSinOne)[0], cosFirst = ZOR_BODIES(zorsCosOne)[0];
     int failures = 0;
@@ -149,13 +146,12 @@ TEST_P(SinCosOne, SweepWithinOneUlpAndSameBitsOnEveryLevel) {
 
 #else
 
-TEST_P(SinCosOne, SweepWithinOneUlpAndSameBitsOnEveryLevel) {
+TEST_P(ScalarOne, SinCosSweepWithinOneUlpAndSameBitsOnEveryLevel) {
     GTEST_SKIP() << "no quad-precision library: only the table of hard arguments is checked";
 }
 
 #endif
 
 ZOR_INSTANTIATE_LEVELS(ScalarOne);
-ZOR_INSTANTIATE_LEVELS(SinCosOne);
 
 }  // namespace
