@@ -1,7 +1,5 @@
-// Level-private element-wise operations on every level that no public
-// sweep reaches: the square, the in-place constant forms, clears, integer
-// copies, the conversions to integers in every rounding mode, and the
-// memory kernels behind copies and clears.
+// Level-private element-wise operations that no public sweep reaches, on
+// every level, and the memory kernels behind copies and clears.
 
 #include <xmmintrin.h>
 
@@ -13,8 +11,6 @@
 extern "C" const int32_t ownCacheTable[];
 
 namespace {
-
-using vt::Region;
 
 using Elementwise = zortest::LevelTest;
 
@@ -42,28 +38,28 @@ TEST_P(Elementwise, Checks) {
     float f[2] = {1, 2};
     double d[2] = {3, 4};
     Zor64fc one[1] = {{1, 2}};
-    EXPECT_EQ(ZOR_BODY(zorsAddC_32f_I)(nullptr, 0, 1.0f), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsAddC_32f_I)(f, 0, 0.0f), zorStsSizeErr);
-    EXPECT_EQ(ZOR_BODY(zorsMulC_64f_I)(nullptr, -1, 1.0), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsMulC_64f_I)(d, 0, 0.0), zorStsSizeErr);
-    EXPECT_EQ(ZOR_BODY(zorsAbs_32f)(nullptr, f, 0), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsSqr_32f)(f, f, -4), zorStsSizeErr);
-    EXPECT_EQ(ZOR_BODY(zorsFlip_32f_I)(nullptr, 0), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsFlip_32fc_I)((Zor32fc*)one, 0), zorStsSizeErr);
-    EXPECT_EQ(ZOR_BODY(zorsFlip_64f_I)(nullptr, 5), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsFlip_64fc_I)(one, -1), zorStsSizeErr);
     Zor8u b = 7;
-    EXPECT_EQ(ZOR_BODY(zorsConvert_32f8u_Sfs)(nullptr, &b, 0, 1, 0), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsConvert_32f16u_Sfs)(f, nullptr, 1, 1, 0), zorStsNullPtrErr);
-    EXPECT_EQ(ZOR_BODY(zorsConvert_32f8u_Sfs)(f, &b, 0, 1, 0), zorStsSizeErr);
-    EXPECT_EQ(ZOR_BODY(zorsConvert_32f8u_Sfs)(f, &b, -1, 5, 0), zorStsSizeErr);
+    const ZorStatus N = zorStsNullPtrErr, S = zorStsSizeErr;
+    const struct {
+        ZorStatus got, want;
+    } cases[] = {
+        {ZOR_BODY(zorsAddC_32f_I)(nullptr, 0, 1.0f), N}, {ZOR_BODY(zorsAddC_32f_I)(f, 0, 0.0f), S},
+        {ZOR_BODY(zorsMulC_64f_I)(nullptr, -1, 1.0), N}, {ZOR_BODY(zorsMulC_64f_I)(d, 0, 0.0), S},
+        {ZOR_BODY(zorsAbs_32f)(nullptr, f, 0), N}, {ZOR_BODY(zorsSqr_32f)(f, f, -4), S},
+        {ZOR_BODY(zorsFlip_32f_I)(nullptr, 0), N}, {ZOR_BODY(zorsFlip_32fc_I)((Zor32fc*)one, 0), S},
+        {ZOR_BODY(zorsFlip_64f_I)(nullptr, 5), N}, {ZOR_BODY(zorsFlip_64fc_I)(one, -1), S},
+        {ZOR_BODY(zorsConvert_32f8u_Sfs)(nullptr, &b, 0, 1, 0), N},
+        {ZOR_BODY(zorsConvert_32f16u_Sfs)(f, nullptr, 1, 1, 0), N},
+        {ZOR_BODY(zorsConvert_32f8u_Sfs)(f, &b, 0, 1, 0), S}, {ZOR_BODY(zorsConvert_32f8u_Sfs)(f, &b, -1, 5, 0), S},
+    };
+    for (const auto& k : cases) EXPECT_EQ(k.got, k.want) << "case " << &k - cases;
     EXPECT_TRUE(f[0] == 1 && f[1] == 2 && d[0] == 3 && one[0].im == 2 && b == 7);
 }
 
 // Clears: small lengths at many placements; around the kernel's thresholds
 // once per type family.
 template <typename T> void clear_case(ZorStatus (*fn)(T*, int32_t), long elements, size_t off) {
-    Region r(elements * sizeof(T), off);
+    vt::Region r(elements * sizeof(T), off);
     auto want = r.raw;
     std::memset(r.in(want), 0, elements * sizeof(T));
     ASSERT_EQ(fn(r.as<T>(), (int32_t)elements), elements ? zorStsNoErr : zorStsSizeErr);
@@ -157,25 +153,22 @@ TEST_P(Elementwise, ConvertEveryModeAndScaleSaturated) {
     convert_all<Zor16s>(ZOR_BODY(zorsConvert_32f16s_Sfs), -32768, 32767);
 }
 
-// The memory kernels behind copies and clears, called one by one (the
-// machine's own cache answer may never lead the public calls to some of
-// them), the level's whole choice for given cache sizes, and the copy's
-// own cache table against the runtime's.
+// The memory kernels one by one: the machine's own cache answer may never
+// lead the public calls to some of them.
 typedef void (*CopyKernel)(const Zor8u*, Zor8u*, size_t);
 typedef void (*ZeroKernel)(Zor8u*, size_t);
 
-// Kernel k (a copy, or with a null source a clear) of n bytes from offset
-// os to offset od, against memcpy or memset over the whole guarded buffer.
+// A copy (or, with no copy kernel, a clear) of n bytes at offsets os, od.
 void kernel_case(CopyKernel copy, ZeroKernel zero, size_t n, size_t os, size_t od) {
-    Region rs(n, os, 1), rd(n, od, 2);
+    vt::Region rs(n, os, 1), rd(n, od, 2);
     auto want = rd.raw;
     copy ? (void)std::memcpy(rd.in(want), rs.data(), n) : (void)std::memset(rd.in(want), 0, n);
     copy ? copy(rs.data(), rd.data(), n) : zero(rd.data(), n);
     ASSERT_IMAGE(rd, want) << (copy ? "copy " : "clear ") << n << " bytes at " << os << ", " << od;
 }
 
-// Every small length at many relative alignments; lengths around multiples
-// of 64 and the 256 KiB chunk at a few.
+// Small lengths at many relative alignments; around 64-byte multiples and
+// the 256 KiB chunk at a few.
 TEST_P(Elementwise, EveryCopyAndClearKernel) {
     const CopyKernel copies[] = {ZOR_BODY(ownsCopy_8u_E9), ZOR_BODY(ownsCopy_8u_repE9), ZOR_BODY(ownsCopy_8u_nt),
                                  ZOR_BODY(ownsCopy_8u_inv), ZOR_BODY(ownsCopy_8u_ra), nullptr, nullptr, nullptr};
@@ -202,13 +195,12 @@ TEST_P(Elementwise, WholeChoiceForGivenCacheSizes) {
     const auto copy = ZOR_BODY(ownsCopy_8u_cache);
     const auto zero = ZOR_BODY(ownsZero_8u_cache);
     const size_t lengths[] = {63, 64, 0x7fff, 0x8000, 0x8001, 0x7ffff, 0x80000, 0x80001, 0x400000, 0x400001, 0x400041};
-    // Source and destination page offsets: level, a little ahead, at 0xa0,
-    // behind (a wrapping difference).
+    // Page offsets: level, a little ahead, at 0xa0, behind (wrapping).
     const size_t places[][2] = {{0, 0}, {0, 0x5f}, {8, 0xa8}, {0xa1, 1}};
     for (size_t n : lengths)
         for (int64_t cache : {(int64_t)-1, (int64_t)0, (int64_t)(2 * n), (int64_t)(2 * n + 2)})
             for (const auto& p : places) {
-                Region rs(n, p[0], 1, 4096), rd(n, p[1], 2, 4096);
+                vt::Region rs(n, p[0], 1, 4096), rd(n, p[1], 2, 4096);
                 auto want = rd.raw;
                 std::memcpy(rd.in(want), rs.data(), n);
                 copy(rs.data(), rd.data(), n, cache);

@@ -96,12 +96,11 @@ template <typename T>
     return ::testing::AssertionSuccess();
 }
 
-// Every length and every placement of source and destination: aligned,
-// one element off, 12 bytes off, one byte off. data holds one vector
-// per source; elements are `unit` values each (2 for complex). In place,
-// the destination starts as source 0 and stands for it. call(sources,
-// destination, len) returns the status; model(i) or model(i, len) is
-// value i of the result.
+// Every length and placement of sources and destination (aligned, one
+// element, 12 bytes, one byte off); elements of `unit` values (2 for
+// complex); in place the destination starts as source 0. call(sources,
+// destination, len) returns the status; model(i) or model(i, len) is value
+// i of the result.
 template <typename T, typename Call, typename Model>
 void sweep(const std::vector<std::vector<T>>& data, bool inplace, int unit, bool exact, Call call, Model model) {
     const size_t places[] = {0, unit * sizeof(T), 12, 1};
