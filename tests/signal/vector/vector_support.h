@@ -9,9 +9,9 @@
 #include <cmath>
 #include <cstdint>
 #include <cstring>
+#include <iterator>
 #include <limits>
 #include <random>
-#include <string>
 #include <type_traits>
 #include <vector>
 
@@ -21,8 +21,8 @@
 namespace vt {
 
 // A region of `bytes` at 64 + `misalign` bytes past an `align`-byte
-// boundary, inside random guard bytes. Copy raw to form the expected image of the whole
-// buffer, apply the model to the copy at the same offset, compare whole.
+// boundary, inside random guard bytes. Copy raw to form the expected image
+// of the whole buffer, apply the model to the copy, compare whole.
 struct Region {
     std::vector<uint8_t> raw;
     size_t offset;
@@ -30,12 +30,7 @@ struct Region {
 
     Region(size_t n, size_t misalign, uint32_t seed = 1, size_t align = 64)
         : raw(n + misalign + align + 192), bytes(n) {
-        uint64_t x = 0x9e3779b97f4a7c15ull * (seed + 1);
-        for (size_t i = 0; i < raw.size(); i += 8) {
-            x = x * 6364136223846793005ull + 1442695040888963407ull;
-            const uint64_t w = x ^ (x >> 29);
-            std::memcpy(raw.data() + i, &w, std::min<size_t>(8, raw.size() - i));
-        }
+        for (size_t i = 0; i < raw.size(); ++i) raw[i] = (uint8_t)(((i + 1) * 0x9e3779b97f4a7c15ull * (seed + 1)) >> 56);
         const size_t pad = (align - (uintptr_t)raw.data() % align) % align;
         offset = pad + 64 + misalign;
     }
@@ -44,37 +39,22 @@ struct Region {
     uint8_t* in(std::vector<uint8_t>& image) const { return image.data() + offset; }
 };
 
-// Element access at any byte address.
+// Element access at any byte address; the bits of a float or double, and back.
 template <typename T> inline T get(const void* p, size_t i) {
     T x;
     std::memcpy(&x, static_cast<const uint8_t*>(p) + i * sizeof(T), sizeof(T));
     return x;
 }
-template <typename T> inline void put(void* p, size_t i, T x) {
-    std::memcpy(static_cast<uint8_t*>(p) + i * sizeof(T), &x, sizeof(T));
-}
-
-// The bits of a float or double, and back.
-template <typename T> inline auto bits(T x) {
-    std::conditional_t<sizeof(T) == 4, uint32_t, uint64_t> u;
-    std::memcpy(&u, &x, sizeof u);
-    return u;
-}
+template <typename T> inline void put(void* p, size_t i, T x) { std::memcpy(static_cast<uint8_t*>(p) + i * sizeof(T), &x, sizeof(T)); }
+template <typename T> inline auto bits(T x) { return get<std::conditional_t<sizeof(T) == 4, uint32_t, uint64_t>>(&x, 0); }
 inline float f32(uint32_t u) { return get<float>(&u, 0); }
 inline double f64(uint64_t u) { return get<double>(&u, 0); }
-
-// Equal bits, or both NaN: where two NaNs meet, which payload survives is
-// the processor's choice of operand order, not ours.
-template <typename T> inline bool same(T a, T b) {
-    return bits(a) == bits(b) || (std::isnan(a) && std::isnan(b));
-}
 
 // first..70, and each power of two from 2^7 to 2^13 with its neighbours.
 inline std::vector<int> lengths(int first = 0) {
     std::vector<int> v;
     for (int n = first; n <= 70; ++n) v.push_back(n);
-    for (int k = 7; k <= 13; ++k)
-        for (int d = -1; d <= 1; ++d) v.push_back((1 << k) + d);
+    for (int k = 7; k <= 13; ++k) v.insert(v.end(), {(1 << k) - 1, 1 << k, (1 << k) + 1});
     return v;
 }
 
@@ -92,12 +72,7 @@ template <typename T> inline std::vector<T> values(size_t n, uint32_t seed) {
                     std::numeric_limits<T>::max(), -std::numeric_limits<T>::min(), T(1), T(-1)};
     if (sizeof(T) == 4) specials[4] = (T)f32(0x7fc12345u), specials[6] = (T)f32(0x7f812345u);
     std::vector<T> v(n);
-    for (size_t i = 0; i < n; ++i) {
-        if (gen() % 7 == 0)
-            v[i] = specials[gen() % (sizeof specials / sizeof specials[0])];
-        else
-            v[i] = std::ldexp(mant(gen), expo(gen));
-    }
+    for (T& x : v) x = gen() % 7 == 0 ? specials[gen() % std::size(specials)] : std::ldexp(mant(gen), expo(gen));
     return v;
 }
 
@@ -112,19 +87,20 @@ template <typename T>
     for (size_t i = 0; i < count; ++i) {
         const T g = get<T>(r.raw.data() + r.offset, i), w = get<T>(want.data() + r.offset, i);
         bool equal = std::memcmp(&g, &w, sizeof(T)) == 0;
-        if constexpr (std::is_floating_point_v<T>) equal = equal || (!exact && same(g, w));
+        // Where two NaNs meet, which payload survives is the processor's
+        // choice of operand order, not ours.
+        if constexpr (std::is_floating_point_v<T>) equal = equal || (!exact && std::isnan(g) && std::isnan(w));
         if (!equal)
             return ::testing::AssertionFailure() << "value " << i << ": got " << +g << ", want " << +w;
     }
     return ::testing::AssertionSuccess();
 }
 
-// Every length and every placement of source and destination: aligned,
-// one element off, 12 bytes off, one byte off. data holds one vector
-// per source; elements are `unit` values each (2 for complex). In place,
-// the destination starts as source 0 and stands for it. call(sources,
-// destination, len) returns the status; model(i) or model(i, len) is
-// value i of the result.
+// Every length and placement of sources and destination (aligned, one
+// element, 12 bytes, one byte off); elements of `unit` values (2 for
+// complex); in place the destination starts as source 0. call(sources,
+// destination, len) returns the status; model(i) or model(i, len) is value
+// i of the result.
 template <typename T, typename Call, typename Model>
 void sweep(const std::vector<std::vector<T>>& data, bool inplace, int unit, bool exact, Call call, Model model) {
     const size_t places[] = {0, unit * sizeof(T), 12, 1};
@@ -142,29 +118,29 @@ void sweep(const std::vector<std::vector<T>>& data, bool inplace, int unit, bool
                     src[k] = r.as<T>();
                 }
                 auto want = out.raw;
-                for (size_t i = 0; i < count; ++i) {
-                    if constexpr (std::is_invocable_v<Model, size_t, int>)
-                        put<T>(out.in(want), i, model(i, len));
-                    else
-                        put<T>(out.in(want), i, model(i));
-                }
+                for (size_t i = 0; i < count; ++i)
+                    if constexpr (std::is_invocable_v<Model, size_t, int>) put<T>(out.in(want), i, model(i, len));
+                    else put<T>(out.in(want), i, model(i));
                 ASSERT_EQ(call(src, out.as<T>(), len), len ? zorStsNoErr : zorStsSizeErr);
                 ASSERT_TRUE(matches<T>(out, want, count, exact)) << "len " << len << " at " << ps << ", " << pd;
             }
 }
 
 // The whole buffer of r against want, byte for byte.
-#define EXPECT_IMAGE(r, want) EXPECT_TRUE(vt::matches<uint8_t>((r), (want), (r).bytes, true))
 #define ASSERT_IMAGE(r, want) ASSERT_TRUE(vt::matches<uint8_t>((r), (want), (r).bytes, true))
 
-// A copy (or move without overlap) of elements of type T: every length and
-// placement, compared as bytes; then the null check.
-template <typename T> void copy_sweep(ZorStatus (*fn)(const T*, T*, int32_t)) {
+// A copy (or move without overlap), or with flip a reversal, out of place
+// and then in place, of elements of type T: every length and placement,
+// compared as bytes; then the null check.
+template <typename T> void copy_sweep(ZorStatus (*fn)(const T*, T*, int32_t), bool flip = false) {
     std::vector<std::vector<uint8_t>> d(1, std::vector<uint8_t>(8200 * sizeof(T)));
-    for (size_t i = 0; i < d[0].size(); ++i) d[0][i] = (uint8_t)(i * 13 + 5);
-    sweep<uint8_t>(d, false, sizeof(T), true,
-                   [&](const uint8_t* const* s, uint8_t* o, int32_t n) { return fn((const T*)s[0], (T*)o, n); },
-                   [&](size_t i) { return d[0][i]; });
+    for (size_t i = 0; i < d[0].size(); ++i) d[0][i] = (uint8_t)(i * 7 + i / 251);
+    for (int inplace = 0; inplace <= flip; ++inplace)
+        sweep<uint8_t>(d, inplace, sizeof(T), true,
+                       [&](const uint8_t* const* s, uint8_t* o, int32_t n) { return fn((const T*)s[0], (T*)o, n); },
+                       [&](size_t i, int len) {
+                           return d[0][flip ? (len - 1 - i / sizeof(T)) * sizeof(T) + i % sizeof(T) : i];
+                       });
     EXPECT_EQ(fn(nullptr, nullptr, 0), zorStsNullPtrErr);
 }
 
