@@ -92,6 +92,21 @@ template <typename F> void for_each_type(F f) {
     f(Zor32f());
 }
 
+// ---- records and work buffers behind guard bytes ---------------------------------
+
+constexpr uint8_t kGuardByte = 0xA5;
+
+// A block of `size` bytes followed by `guard` bytes, all holding the guard
+// byte; guard_intact tells whether every byte from `from` on still does.
+inline std::vector<uint8_t> guarded(size_t size, size_t guard = 64) {
+    return std::vector<uint8_t>(size + guard, kGuardByte);
+}
+inline bool guard_intact(const std::vector<uint8_t>& mem, size_t from) {
+    for (size_t i = from; i < mem.size(); ++i)
+        if (mem[i] != kGuardByte) return false;
+    return true;
+}
+
 // ---- images in guard bytes ------------------------------------------------------
 
 // w x h pixels of T, rows `step` bytes apart (any step, negative too: then
@@ -112,11 +127,11 @@ template <typename T> struct Image {
         const int64_t lo = last < 0 ? last : 0;
         const int64_t hi = (last > 0 ? last : 0) + (int64_t)w * (int64_t)sizeof(T);
         origin = guard + misalign - (size_t)lo;
-        mem.assign(origin + (size_t)hi + guard, 0xA5);
+        mem.assign(origin + (size_t)hi + guard, kGuardByte);
         // Keep the block's start 64-byte aligned so misalign means what it says.
         const size_t shift = (64 - ((uintptr_t)mem.data() & 63)) & 63;
         if (shift) {
-            mem.insert(mem.begin(), shift, 0xA5);
+            mem.insert(mem.begin(), shift, kGuardByte);
             origin += shift;
         }
     }

@@ -7,7 +7,7 @@
 
 #include <vector>
 
-#include "image_support.h"
+#include "image.h"
 #include "zortest.h"
 
 namespace {

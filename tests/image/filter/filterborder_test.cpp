@@ -17,7 +17,6 @@
 
 #include "border_model.h"
 #include "image.h"
-#include "image_support.h"
 #include "zortest.h"
 
 namespace {

@@ -9,7 +9,7 @@
 #include <vector>
 
 #include "border_model.h"
-#include "image_support.h"
+#include "image.h"
 #include "zortest.h"
 
 namespace {
