@@ -64,22 +64,24 @@ inline float window_sum(const T* src, int32_t srcStep, int32_t x, const Record& 
             float even = 0.0f, odd = 0.0f;
             int32_t i = 0;
             for (; i + 1 < kw; i += 2) {
-                even += t[-i] * (float)p[i];
-                odd += t[-i - 1] * (float)p[i + 1];
+                even += t[-i] * (float)simd::load<T>(p + i);
+                odd += t[-i - 1] * (float)simd::load<T>(p + i + 1);
             }
-            if (i < kw) even += t[-i] * (float)p[i];
+            if (i < kw) even += t[-i] * (float)simd::load<T>(p + i);
             sum += even + odd;
         } else {
-            for (int32_t i = 0; i < kw; ++i) sum += t[-i] * (float)p[i];
+            for (int32_t i = 0; i < kw; ++i) sum += t[-i] * (float)simd::load<T>(p + i);
         }
     }
     return sum;
 }
 
-inline void put(Zor8u* o, float v, int32_t mode) { *o = convert<Zor8u>(v, mode); }
-inline void put(Zor16u* o, float v, int32_t mode) { *o = convert<Zor16u>(v, mode); }
-inline void put(Zor16s* o, float v, int32_t mode) { *o = convert<Zor16s>(v, mode); }
-inline void put(Zor32f* o, float v, int32_t) { *o = v; }  // stored as summed
+// Rows may start off their element boundary (any step): stores go through
+// the vector layer.
+template <typename T> inline void put(T* o, float v, int32_t mode) {
+    simd::store(o, convert<T>(v, mode));
+}
+inline void put(Zor32f* o, float v, int32_t) { simd::store(o, v); }  // stored as summed
 
 template <typename T, bool kSplit = false>
 void scalar(const T* src, int32_t srcStep, T* dst, int32_t dstStep, int32_t w, int32_t h,

@@ -214,7 +214,7 @@ constexpr int NB = 8;  // vectors summed side by side in the wide loops
 template <typename T> void to_float(const T* p, float* out, int32_t n, int32_t len) {
     int32_t i = 0;
     for (; i + VL <= n; i += VL) simd::store(out + i, vpix(p + i));
-    for (; i < n; ++i) out[i] = pix1(p[i]);
+    for (; i < n; ++i) out[i] = pix1(simd::load<T>(p + i));
     for (; i < len; ++i) out[i] = 0.0f;
 }
 

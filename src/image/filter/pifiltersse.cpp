@@ -48,7 +48,7 @@ inline void to_float(const Zor16u* p, float* out, int32_t n) {
         _mm_storeu_ps(out + i, _mm_cvtepi32_ps(_mm_unpacklo_epi16(v, z)));
         _mm_storeu_ps(out + i + 4, _mm_cvtepi32_ps(_mm_unpackhi_epi16(v, z)));
     }
-    for (; i < n; ++i) out[i] = (float)p[i];
+    for (; i < n; ++i) out[i] = (float)simd::load<Zor16u>(p + i);
 }
 
 inline void to_float(const Zor16s* p, float* out, int32_t n) {
@@ -60,7 +60,7 @@ inline void to_float(const Zor16s* p, float* out, int32_t n) {
         _mm_storeu_ps(out + i, _mm_cvtepi32_ps(lo));
         _mm_storeu_ps(out + i + 4, _mm_cvtepi32_ps(hi));
     }
-    for (; i < n; ++i) out[i] = (float)p[i];
+    for (; i < n; ++i) out[i] = (float)simd::load<Zor16s>(p + i);
 }
 
 // ---- line to pixels ------------------------------------------------------------
