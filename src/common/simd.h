@@ -112,7 +112,6 @@ template <typename T> inline T* row_at(T* p, ptrdiff_t step, ptrdiff_t y) {
 template <typename T> inline T* align_up(T* p, uintptr_t a) {
     return (T*)(((uintptr_t)p + a - 1) & ~(a - 1));
 }
-inline bool is_aligned(const void* p, uintptr_t a) { return ((uintptr_t)p & (a - 1)) == 0; }
 
 namespace simd {
 
