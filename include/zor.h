@@ -11,5 +11,6 @@
 #include "zorifilter64f.h"
 #include "zorifilter.h"
 #include "zorimorph.h"
+#include "zoriresize.h"
 
 #endif

@@ -20,6 +20,14 @@
 #include "jmp_names.def"
 #undef ZOR_API
 
+/* A public name that is another one's body under a second name: it keeps
+ * its own stub and table, and this level's slot holds the first name's
+ * code. The two prototypes must agree. */
+#define ZOR_STR_(x) #x
+#define ZOR_STR(x) ZOR_STR_(x)
+#define ZOR_SECOND_NAME(name, first) \
+    ZOR_ENTRY decltype(::name) ZOR_NAME(name) __attribute__((alias(ZOR_STR(ZOR_NAME(first))), nothrow));
+
 /* Level-private operations: global inside the level's partial link, never
  * exported from the library. */
 #define ZOR_INTERNAL extern "C" __attribute__((visibility("hidden")))

@@ -1,0 +1,148 @@
+/* zor: whole-image resize (nearest, linear, cubic), called per tile.
+ *
+ * Calling order:
+ *   1. zoriResizeGetSize_8u (or _32f): sizes of the record and of an init
+ *      buffer. Allocate both; any alignment will do (the record starts at
+ *      the first 64-byte boundary inside the block, which is why the size
+ *      includes 64 spare bytes; every call finds it the same way).
+ *   2. One Init fills the record for a source and destination size. The
+ *      record holds pointers into itself: never move or copy it byte by
+ *      byte. It is read-only from then on.
+ *   3. zoriResizeGetBufferSize_8u (or _32f): the work buffer of one call,
+ *      for the largest tile and the channel count.
+ *   4. Per destination tile (dstOffset, dstSize): zoriResizeGetSrcOffset_8u
+ *      gives the source pixel the tile starts from; pass pSrc advanced to
+ *      that pixel and pDst at the tile's first pixel. Any partition of the
+ *      destination into tiles gives exactly the one-call result, so tiles
+ *      may run at once on different threads, each with its own buffer.
+ *
+ * The tile rule. With ratio = srcLen / dstLen per axis (double):
+ * shift = floor(dstOffset * ratio) is the source offset of a tile; a tile
+ * that runs past the destination is clipped, written all the same, and
+ * the call returns zorStsSizeWrn (48).
+ *
+ * Nearest: source index = trunc((i + 0.5) * ratio - 1e-10) in double, so
+ * a destination centre on a source pixel boundary takes the lower pixel
+ * (halving picks 0, 2, 4, ...). Pixels are copied bit for bit.
+ *
+ * Linear: pos = (i + 0.5) * ratio - 0.5, index = floor(pos), fraction
+ * f = pos - index, per axis at Init. Horizontal pass into float rows
+ * r = a + (b - a) * f, vertical pass v = r0 + (r1 - r0) * f.
+ *   - zoriResizeLinearInit_8u makes a 14-bit fixed-point record for the
+ *     8u operation: weight w = trunc(f * 16384 + 1e-7), horizontal
+ *     r = (a * (16384 - w) + b * w + 128) >> 8 (6 fraction bits), vertical
+ *     v = (r0 * (16384 - w) + r1 * w + 0x80000) >> 20, saturated to 0..255.
+ *     Identical on every level.
+ *   - zoriResizeLinearInit_32f makes a float record. Given to the 8u
+ *     operation it runs the accurate path: float rows, results rounded to
+ *     nearest even and saturated. The 32f operation needs a float record.
+ *   - On AVX2 and AVX-512 levels the float passes use fused multiply-add:
+ *     the last bit of a float result may differ from the other levels.
+ *
+ * Cubic: four taps per axis with the two-parameter cubic family (B, C),
+ * weights in double from the float distances, stored as float and used
+ * without normalising. Rows are float for 8u too; a pixel is
+ * (r0*c0 + r1*c1) + (r2*c2 + r3*c3) per pass, 8u rounded to nearest even
+ * and saturated. (0, 0.5) is Catmull-Rom, (1, 0) the B-spline, which
+ * smooths even at equal sizes. Any float B and C are accepted. AVX2 and
+ * AVX-512 levels fuse the multiply-adds.
+ *
+ * Border (linear and cubic): pixels whose filter reaches outside the
+ * source image are computed by replicating the edge pixels, one at a time;
+ * the others by the row passes above. border is zorBorderRepl (1) with
+ * any of the flags zorBorderInMemTop/Bottom/Left/Right (16/32/64/128): a
+ * flagged side is read from memory beyond the image instead (one row or
+ * column for linear, one before and two after for cubic). zorBorderInMem
+ * (240) alone reads memory on all sides. Other values: zorStsBorderErr.
+ * The border value pointer is never read. The edge pixels of the 8u
+ * fixed-point path round as ((v + ((v >> 14) & 1) + 8192) >> 14) of their
+ * 14-bit sum, which may differ from the interior's rounding by one.
+ *
+ * Checks of every resize operation, in order: border value (-225), null
+ * pointers (-8; pBorderValue not checked), zero dstSize (1, before the
+ * record is looked at), record id (-13), negative dstSize (-6), 32f steps
+ * not multiples of 4 (-16), dstOffset outside the destination (-11),
+ * antialiasing record (-14), record of another method (-13). Steps are in
+ * bytes; the 8u operation runs a float linear record. Images are
+ * single-channel. */
+#ifndef ZORIRESIZE_H
+#define ZORIRESIZE_H
+
+#include "zortypes.h"
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+typedef struct ZoriResizeSpec ZoriResizeSpec;
+
+/* Sizes in bytes of the record and the init buffer. Zero lengths give 1
+ * (nothing written); linear needs a source of at least 2x2, cubic 4x4
+ * (-6); zoriInterSuper gives a size although no Init takes it;
+ * antialiasing with nearest or super gives the plain sizes and 46. */
+ZorStatus zoriResizeGetSize_8u(ZoriSize srcSize, ZoriSize dstSize,
+                               ZoriInterpolationType interpolation, int32_t antialiasing,
+                               int32_t* pSpecSize, int32_t* pInitBufSize);
+ZorStatus zoriResizeGetSize_32f(ZoriSize srcSize, ZoriSize dstSize,
+                                ZoriInterpolationType interpolation, int32_t antialiasing,
+                                int32_t* pSpecSize, int32_t* pInitBufSize);
+/* Work buffer for tiles up to dstSize with numChannels (1, 3 or 4); 48
+ * with the size written when dstSize exceeds the record's destination. */
+ZorStatus zoriResizeGetBufferSize_8u(const ZoriResizeSpec* pSpec, ZoriSize dstSize,
+                                     Zor32u numChannels, int32_t* pBufSize);
+ZorStatus zoriResizeGetBufferSize_32f(const ZoriResizeSpec* pSpec, ZoriSize dstSize,
+                                      Zor32u numChannels, int32_t* pBufSize);
+/* The source pixel a tile at dstOffset starts from (-11 outside the
+ * destination). */
+ZorStatus zoriResizeGetSrcOffset_8u(const ZoriResizeSpec* pSpec, ZoriPoint dstOffset,
+                                    ZoriPoint* pSrcOffset);
+ZorStatus zoriResizeGetSrcOffset_32f(const ZoriResizeSpec* pSpec, ZoriPoint dstOffset,
+                                     ZoriPoint* pSrcOffset);
+/* The source rectangle whose pixels the tile's centres fall on, with no
+ * margin for filter taps; a tile reaching the last destination column or
+ * row reaches the source's last one too. 48 when the tile was clipped. */
+ZorStatus zoriResizeGetSrcRoi_8u(const ZoriResizeSpec* pSpec, ZoriPoint dstRoiOffset,
+                                 ZoriSize dstRoiSize, ZoriPoint* pSrcRoiOffset,
+                                 ZoriSize* pSrcRoiSize);
+
+ZorStatus zoriResizeNearestInit_8u(ZoriSize srcSize, ZoriSize dstSize, ZoriResizeSpec* pSpec);
+ZorStatus zoriResizeNearestInit_32f(ZoriSize srcSize, ZoriSize dstSize, ZoriResizeSpec* pSpec);
+ZorStatus zoriResizeNearest_8u_C1R(const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst,
+                                   int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                   const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+ZorStatus zoriResizeNearest_32f_C1R(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst,
+                                    int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                    const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+
+/* Sources of at least 2x2. _8u: fixed-point record; _32f: float record. */
+ZorStatus zoriResizeLinearInit_8u(ZoriSize srcSize, ZoriSize dstSize, ZoriResizeSpec* pSpec);
+ZorStatus zoriResizeLinearInit_32f(ZoriSize srcSize, ZoriSize dstSize, ZoriResizeSpec* pSpec);
+ZorStatus zoriResizeLinear_8u_C1R(const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst,
+                                  int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                  ZoriBorderType border, const Zor8u* pBorderValue,
+                                  const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+ZorStatus zoriResizeLinear_32f_C1R(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst,
+                                   int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                   ZoriBorderType border, const Zor32f* pBorderValue,
+                                   const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+
+/* Sources of at least 4x4. The floating-point control word is saved, set
+ * to flush denormals while the weights are made, and restored. */
+ZorStatus zoriResizeCubicInit_8u(ZoriSize srcSize, ZoriSize dstSize, Zor32f cubicB,
+                                 Zor32f cubicC, ZoriResizeSpec* pSpec, Zor8u* pInitBuf);
+ZorStatus zoriResizeCubicInit_32f(ZoriSize srcSize, ZoriSize dstSize, Zor32f cubicB,
+                                  Zor32f cubicC, ZoriResizeSpec* pSpec, Zor8u* pInitBuf);
+ZorStatus zoriResizeCubic_8u_C1R(const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst,
+                                 int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                 ZoriBorderType border, const Zor8u* pBorderValue,
+                                 const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+ZorStatus zoriResizeCubic_32f_C1R(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst,
+                                  int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                  ZoriBorderType border, const Zor32f* pBorderValue,
+                                  const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif

@@ -1,0 +1,22 @@
+// Cubic resize: placeholder until the method lands.
+#include "resize_spec.h"
+
+using namespace ZOR_NS;
+
+ZOR_ENTRY ZorStatus ZOR_NAME(zoriResizeCubicInit_8u)(ZoriSize, ZoriSize, Zor32f, Zor32f,
+                                                     ZoriResizeSpec*, Zor8u*) {
+    return zorStsNotSupportedModeErr;
+}
+ZOR_SECOND_NAME(zoriResizeCubicInit_32f, zoriResizeCubicInit_8u)
+ZOR_ENTRY ZorStatus ZOR_NAME(zoriResizeCubic_8u_C1R)(const Zor8u*, int32_t, Zor8u*, int32_t,
+                                                     ZoriPoint, ZoriSize, ZoriBorderType,
+                                                     const Zor8u*, const ZoriResizeSpec*,
+                                                     Zor8u*) {
+    return zorStsNotSupportedModeErr;
+}
+ZOR_ENTRY ZorStatus ZOR_NAME(zoriResizeCubic_32f_C1R)(const Zor32f*, int32_t, Zor32f*, int32_t,
+                                                      ZoriPoint, ZoriSize, ZoriBorderType,
+                                                      const Zor32f*, const ZoriResizeSpec*,
+                                                      Zor8u*) {
+    return zorStsNotSupportedModeErr;
+}

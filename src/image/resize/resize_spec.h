@@ -1,0 +1,137 @@
+// The resize record and what every resize method shares: where the record
+// and its tables lie in the caller's block, the argument checks of the
+// operations, the tile rule and the border strips.
+#ifndef ZOR_RESIZE_SPEC_H
+#define ZOR_RESIZE_SPEC_H
+
+#include <math.h>
+#include <stddef.h>
+#include <stdint.h>
+
+#include "variant.h"
+#include "simd.h"
+
+ZOR_BEGIN
+
+constexpr uint32_t kResizeId = 0x4B617389u;
+constexpr int32_t kInterNearest = 1, kInterLinear = 2, kInterCubic = 6, kInterLanczos = 16,
+                  kInterSuper = 8;
+constexpr int32_t kHintQ14 = 1, kHintFloat = 2;
+
+struct ResizeAxis {
+    int32_t srcLen, dstLen, srcRed, dstRed;
+    int32_t* indexTable;  // one source index per destination position
+    float* coef32f;
+    double* coef64f;
+    uint16_t* coefQ14;
+    int32_t lowCount;   // positions whose window reaches below source 0
+    int32_t highCount;  // positions whose window reaches past the last source
+};
+
+struct ResizeSpec {
+    uint32_t id;
+    int32_t workType;  // ZorDataType of the tables: 13 float, 7 Q14, 19 double
+    int32_t interpolation;
+    int32_t tapsX, tapsY;
+    int32_t antialiasing;
+    int32_t reach[4];
+    ResizeAxis axisY, axisX;
+    int32_t hint;  // 1 Q14 tables, 2 float tables
+    int64_t srcWidth, srcHeight, dstWidth, dstHeight;
+    int32_t dataType;
+    float cubicB, cubicC;
+    void* initBuffer;
+    int32_t lobes;
+};
+
+// Tables start this far into the aligned record; the size formulas keep
+// 368 - 64 bytes for the record itself.
+constexpr size_t kResizeTablesAt = 256;
+static_assert(sizeof(ResizeSpec) <= kResizeTablesAt, "record fits before its tables");
+
+inline int64_t a32(int64_t n) { return (n + 31) & ~(int64_t)31; }
+
+inline ResizeSpec* resize_spec(const ZoriResizeSpec* p) {
+    return (ResizeSpec*)align_up((uint8_t*)p, 64);
+}
+
+// Bump allocation of tables behind the record: each 32-byte aligned.
+template <typename T> inline T* take(uint8_t*& at, int64_t count) {
+    T* p = (T*)at;
+    at += a32(count * (int64_t)sizeof(T));
+    return p;
+}
+
+inline int64_t gcd64(int64_t a, int64_t b) {
+    while (b) {
+        const int64_t t = a % b;
+        a = b;
+        b = t;
+    }
+    return a;
+}
+
+// Zeroes the record and fills the common fields and both axes' lengths;
+// returns where the tables may start (index tables first, vertical then
+// horizontal, already placed).
+uint8_t* resize_spec_begin(ResizeSpec* s, ZoriSize src, ZoriSize dst, int32_t interpolation,
+                           int32_t taps, int32_t hint, int32_t workType);
+
+inline double axis_ratio(const ResizeAxis& a) { return (double)a.srcRed / (double)a.dstRed; }
+
+// ---- operations -------------------------------------------------------------------
+
+// Border values the filtering methods accept: 240, or replicate (low four
+// bits 1) with any of the four in-memory flags, at most 255.
+inline bool resize_border_ok(int32_t border) {
+    return (uint32_t)border <= 255u && (border == 240 || (border & 15) == 1);
+}
+
+// Checks 2 to 9 of an operation, in their order (the border, where there is
+// one, is checked before). On success *spec is the record.
+ZorStatus resize_check(const void* pSrc, int32_t srcStep, const void* pDst, int32_t dstStep,
+                       ZoriPoint dstOffset, ZoriSize dstSize, const ZoriResizeSpec* pSpec,
+                       const void* pBuffer, bool stepsInFloats, int32_t interpolation,
+                       const ResizeSpec** spec);
+
+// A tile after clipping, with its local index tables (relative to the
+// tile's source pointer) at the start of the work buffer.
+struct ResizeTile {
+    int32_t x0, y0;  // dstOffset
+    int32_t w, h;    // clipped size
+    int32_t shiftX, shiftY;
+    bool clipped;    // dstSize ran past the destination: the call says 48
+    int32_t* localX;
+    int32_t* localY;
+    uint8_t* rows;  // first row buffer, 32-byte aligned behind the tables
+};
+
+// Tile origin in the source for a destination offset (both axes).
+inline int32_t tile_shift(const ResizeAxis& a, int32_t offset) {
+    return (int32_t)floor((double)offset * axis_ratio(a));
+}
+
+void resize_tile(const ResizeSpec* s, ZoriPoint dstOffset, ZoriSize dstSize, uint8_t* pBuffer,
+                 ResizeTile* t);
+
+// Bytes of one row buffer of the tile (A32 of four bytes per element and
+// channel).
+inline int64_t tile_row_bytes(const ResizeTile& t, int32_t channels = 1) {
+    return a32(4 * (int64_t)channels * t.w);
+}
+
+// The strips of a tile computed by the border pass of a filtering method;
+// all zero for border 240. Each is limited to the tile.
+struct ResizeStrips {
+    int32_t top, bottom, left, right;
+};
+ResizeStrips resize_strips(const ResizeSpec* s, const ResizeTile& t, int32_t border);
+
+// The operation's final status: 48 when the tile was clipped.
+inline ZorStatus tile_status(const ResizeTile& t, ZorStatus worker) {
+    return t.clipped ? zorStsSizeWrn : worker;
+}
+
+ZOR_END
+
+#endif
