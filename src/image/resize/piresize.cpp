@@ -57,7 +57,7 @@ ZorStatus get_size(ZoriSize src, ZoriSize dst, int32_t interpolation, int32_t an
     if (interpolation == 0) return zorStsNotSupportedModeErr;
 
     const int64_t aw = a32(dst.width), ah = a32(dst.height);
-    int64_t spec = 0, init = 64;
+    int64_t record = 0, init = 64;
     ZorStatus status = zorStsNoErr;
     const bool filtered = interpolation == kInterLinear || interpolation == kInterCubic ||
                           interpolation == kInterLanczos;
@@ -67,20 +67,20 @@ ZorStatus get_size(ZoriSize src, ZoriSize dst, int32_t interpolation, int32_t an
     if (antialiasing && filtered) {
         const double sx = (double)src.width / dst.width, sy = (double)src.height / dst.height;
         const int64_t tx = antialias_taps(interpolation, sx), ty = antialias_taps(interpolation, sy);
-        spec = 368 + 4 * (aw + ah) + a32(4 * (int64_t)dst.width * tx) +
+        record = 368 + 4 * (aw + ah) + a32(4 * (int64_t)dst.width * tx) +
                a32(4 * (int64_t)dst.height * ty);
-        if (sx <= 1 && interpolation == kInterLinear) spec += a32(4 * (int64_t)dst.width);
+        if (sx <= 1 && interpolation == kInterLinear) record += a32(4 * (int64_t)dst.width);
         init = 64 + 8 * (aw + ah);
     } else if (interpolation == kInterNearest) {
-        spec = 368 + 4 * (aw + ah);
+        record = 368 + 4 * (aw + ah);
     } else if (interpolation == kInterLinear) {
-        spec = 368 + 8 * (aw + ah);
+        record = 368 + 8 * (aw + ah);
     } else if (interpolation == kInterCubic) {
-        spec = 368 + 4 * (aw + ah) + 4 * (a32(4 * (int64_t)dst.width + 96) +
+        record = 368 + 4 * (aw + ah) + 4 * (a32(4 * (int64_t)dst.width + 96) +
                                           a32(4 * (int64_t)dst.height + 96));
         init = 64 + 4 * (aw + ah);
     } else if (interpolation == kInterLanczos) {
-        spec = 368 + 4 * (aw + ah) + 4 * (a32(6 * (int64_t)dst.width + 160) +
+        record = 368 + 4 * (aw + ah) + 4 * (a32(6 * (int64_t)dst.width + 160) +
                                           a32(6 * (int64_t)dst.height + 160));
         init = 64 + 4 * (aw + ah);
     } else {  // super-sampling: sizes only
@@ -88,11 +88,11 @@ ZorStatus get_size(ZoriSize src, ZoriSize dst, int32_t interpolation, int32_t an
         const int64_t gw = gcd64(src.width, dst.width), gh = gcd64(src.height, dst.height);
         const int64_t nx = next_multiple_term(src.width / gw, dst.width / gw);
         const int64_t ny = next_multiple_term(src.height / gh, dst.height / gh);
-        spec = 368 + 4 * (a32(nx) + nx + ny + a32(ny));
+        record = 368 + 4 * (a32(nx) + nx + ny + a32(ny));
     }
     if (antialiasing && !filtered) status = zorStsNoAntialiasing;
-    if (spec >= 0x7FFFFFFF || init >= 0x7FFFFFFF) return zorStsExceededSizeErr;
-    *pSpecSize = (int32_t)spec;
+    if (record >= 0x7FFFFFFF || init >= 0x7FFFFFFF) return zorStsExceededSizeErr;
+    *pSpecSize = (int32_t)record;
     *pInitBufSize = (int32_t)init;
     return status;
 }
@@ -177,7 +177,7 @@ ZorStatus nearest(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, Zori
 ZorStatus resize_check(const void* pSrc, int32_t srcStep, const void* pDst, int32_t dstStep,
                        ZoriPoint dstOffset, ZoriSize dstSize, const ZoriResizeSpec* pSpec,
                        const void* pBuffer, bool stepsInFloats, int32_t interpolation,
-                       const ResizeSpec** spec) {
+                       const ResizeSpec** record) {
     if (!pSrc || !pDst || !pSpec || !pBuffer) return zorStsNullPtrErr;
     if (!dstSize.width || !dstSize.height) return zorStsNoOperation;
     const ResizeSpec* s = resize_spec(pSpec);
@@ -187,7 +187,7 @@ ZorStatus resize_check(const void* pSrc, int32_t srcStep, const void* pDst, int3
     if (!offset_in_range(s, dstOffset)) return zorStsOutOfRangeErr;
     if (s->antialiasing) return zorStsNotSupportedModeErr;
     if (s->interpolation != interpolation) return zorStsContextMatchErr;
-    *spec = s;
+    *record = s;
     return zorStsNoErr;
 }
 

@@ -88,11 +88,11 @@ inline bool resize_border_ok(int32_t border) {
 }
 
 // Checks 2 to 9 of an operation, in their order (the border, where there is
-// one, is checked before). On success *spec is the record.
+// one, is checked before). On success *record is the record.
 ZorStatus resize_check(const void* pSrc, int32_t srcStep, const void* pDst, int32_t dstStep,
                        ZoriPoint dstOffset, ZoriSize dstSize, const ZoriResizeSpec* pSpec,
                        const void* pBuffer, bool stepsInFloats, int32_t interpolation,
-                       const ResizeSpec** spec);
+                       const ResizeSpec** record);
 
 // A tile after clipping, with its local index tables (relative to the
 // tile's source pointer) at the start of the work buffer.
