@@ -14,7 +14,7 @@ build: $(BUILD)/CMakeCache.txt
 	cmake --build $(BUILD) -j $(JOBS)
 
 demo: build
-	cd $(BUILD) && examples/zor_demo
+	cd $(BUILD) && examples/zor_demo && examples/resize_tiles
 
 test: build
 	cd $(BUILD) && ctest --output-on-failure -j $(JOBS)

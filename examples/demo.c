@@ -144,5 +144,6 @@ int main(void) {
     demo_point();
     demo_filter();
     demo_rank();
+    demo_resize();
     return 0;
 }

@@ -1,4 +1,4 @@
-/* What the demo's parts share. Each part (vector, point, filter, rank)
+/* What the demo's parts share. Each part (vector, point, filter, rank, resize)
  * lives in its own file and is called from main in demo.c. */
 #ifndef ZOR_DEMO_H
 #define ZOR_DEMO_H
@@ -24,5 +24,6 @@ void demo_elementwise(void);
 void demo_point(void);
 void demo_filter(void);
 void demo_rank(void);
+void demo_resize(void);
 
 #endif

@@ -18,8 +18,9 @@
  *
  * The tile rule. With ratio = srcLen / dstLen per axis (double):
  * shift = floor(dstOffset * ratio) is the source offset of a tile; a tile
- * that runs past the destination is clipped, written all the same, and
- * the call returns zorStsSizeWrn (48).
+ * that runs past the destination is clipped to it and written. The call
+ * returns zorStsSizeWrn (48) when the requested width or height itself
+ * exceeds the destination's (a tile merely overrunning the edge gives 0).
  *
  * Nearest: source index = trunc((i + 0.5) * ratio - 1e-10) in double, so
  * a destination centre on a source pixel boundary takes the lower pixel

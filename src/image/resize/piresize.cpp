@@ -34,9 +34,11 @@ namespace {
 
 bool record_ok(const ResizeSpec* s) { return s->id == kResizeId; }
 
-int32_t next_multiple_term(int64_t s, int64_t d) {
+// 64-bit: for long sources the count passes 2^31, and the size check
+// below must see it.
+int64_t next_multiple_term(int64_t s, int64_t d) {
     const int64_t r = s % d;
-    return (int32_t)(d * (s / d + (r == 0 ? 0 : r == 1 ? 1 : 2)));
+    return d * (s / d + (r == 0 ? 0 : r == 1 ? 1 : 2));
 }
 
 // Window entries per axis of an antialiasing record (upper bounds).
@@ -148,6 +150,131 @@ ZorStatus nearest_init(ZoriSize src, ZoriSize dst, ZoriResizeSpec* pSpec) {
     return zorStsNoErr;
 }
 
+// ---- nearest rows ---------------------------------------------------------------
+// A row is dst[i] = row[localX[i]]: element copies, never arithmetic, so bit
+// patterns (NaN payloads) survive every path. Vector paths read only source
+// elements from localX[0] to the tile's last index, like the plain loop.
+
+template <typename T>
+void nearest_row_plain(const T* row, T* d, const int32_t* localX, int32_t from, int32_t w) {
+    for (int32_t i = from; i < w; ++i) memcpy(d + i, row + localX[i], sizeof(T));
+}
+
+#if ZOR_HAS_SSSE3
+// Bytes: per 16 destination bytes, the first source index and two shuffles
+// picking them out of the 32 source bytes from there (the second shuffle
+// for the upper 16). The blocks are written over the local index table of
+// the tile, each inside the 64 bytes its own 16 indices held, so the work
+// buffer needs no more room than the plain copy's.
+struct ByteBlock {
+    int32_t base;
+    uint8_t low[16], high[16];
+};
+static_assert(sizeof(ByteBlock) <= 16 * sizeof(int32_t), "a block fits over its indices");
+constexpr int32_t kByteBlock = 16;
+
+typedef simd::vec<16, uint8_t> v16u8;
+
+inline v16u8 shuffle_bytes(v16u8 v, v16u8 m) {
+    return (v16u8)_mm_shuffle_epi8((__m128i)v, (__m128i)m);
+}
+
+// Turns the leading blocks whose 32-byte window stays within the tile's
+// indices into ByteBlocks; returns how many (the rest keep their indices).
+int32_t byte_blocks(int32_t* localX, int32_t w) {
+    const int32_t last = localX[w - 1];
+    int32_t n = 0;
+    for (; (n + 1) * kByteBlock <= w; ++n) {
+        int32_t* x = localX + n * kByteBlock;
+        const int32_t base = x[0];
+        if (x[kByteBlock - 1] - base > 31 || base + 31 > last) break;
+        ByteBlock b;
+        b.base = base;
+        for (int32_t k = 0; k < kByteBlock; ++k) {
+            const int32_t o = x[k] - base;
+            b.low[k] = o < 16 ? (uint8_t)o : 0x80;  // the top bit makes the lane zero
+            b.high[k] = o >= 16 ? (uint8_t)(o - 16) : 0x80;
+        }
+        memcpy(x, &b, sizeof b);
+    }
+    return n;
+}
+
+void byte_row(const uint8_t* row, uint8_t* d, const int32_t* blocks, int32_t nblocks) {
+    for (int32_t n = 0; n < nblocks; ++n) {
+        const uint8_t* b = (const uint8_t*)(blocks + n * kByteBlock);
+        int32_t base;
+        memcpy(&base, b, 4);
+        const v16u8 lo = simd::load<v16u8>(row + base), hi = simd::load<v16u8>(row + base + 16);
+        const v16u8 r = shuffle_bytes(lo, simd::load<v16u8>(b + offsetof(ByteBlock, low))) |
+                        shuffle_bytes(hi, simd::load<v16u8>(b + offsetof(ByteBlock, high)));
+        simd::store(d + n * kByteBlock, r);
+    }
+}
+#endif
+
+#if ZOR_HAS_AVX2
+// Floats, eight at a time: when the eight lie within 16 source elements of
+// the first, two loads and two lane permutes (bit 3 of the offset, moved to
+// the sign, picks the load); otherwise, and near the end of the tile's
+// source, a gather of exactly the eight.
+void float_row(const float* row, float* d, const int32_t* localX, int32_t w, int32_t* done) {
+    const int32_t last = localX[w - 1];
+    int32_t i = 0;
+    for (; i + 8 <= w; i += 8) {
+        const __m256i x = (__m256i)simd::load<simd::vec<32, int32_t>>(localX + i);
+        const int32_t base = localX[i];
+        __m256 r;
+        if (localX[i + 7] - base <= 15 && base + 15 <= last) {
+            const __m256i o = _mm256_sub_epi32(x, _mm256_set1_epi32(base));
+            const __m256i m = _mm256_or_si256(o, _mm256_slli_epi32(o, 28));
+            const __m256 lo = _mm256_permutevar8x32_ps(_mm256_loadu_ps(row + base), m);
+            const __m256 hi = _mm256_permutevar8x32_ps(_mm256_loadu_ps(row + base + 8), m);
+            r = _mm256_blendv_ps(lo, hi, _mm256_castsi256_ps(m));
+        } else {
+            r = _mm256_i32gather_ps(row, x, 4);
+        }
+        _mm256_storeu_ps(d + i, r);
+    }
+    *done = i;
+}
+#endif
+
+// One tile's rows. Prepares the local X table once (identity, byte blocks)
+// and copies the previous destination row when a row repeats its source.
+template <typename T>
+void nearest_tile(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ResizeTile& t) {
+    bool identity = true;
+    for (int32_t i = 0; i < t.w && identity; ++i) identity = t.localX[i] == i;
+#if ZOR_HAS_SSSE3
+    const int32_t nblocks = sizeof(T) == 1 && !identity ? byte_blocks(t.localX, t.w) : 0;
+#endif
+    const T* row = pSrc;
+    for (int32_t j = 0; j < t.h; ++j) {
+        row = row_at(row, srcStep, t.localY[j] - (j ? t.localY[j - 1] : 0));
+        T* d = row_at(pDst, dstStep, j);
+        if (j && t.localY[j] == t.localY[j - 1]) {
+            memmove(d, row_at(pDst, dstStep, j - 1), (size_t)t.w * sizeof(T));
+            continue;
+        }
+        if (identity) {
+            memcpy(d, row, (size_t)t.w * sizeof(T));
+            continue;
+        }
+        int32_t from = 0;
+#if ZOR_HAS_SSSE3
+        if constexpr (sizeof(T) == 1) {
+            byte_row(row, d, t.localX, nblocks);
+            from = nblocks * kByteBlock;
+        }
+#endif
+#if ZOR_HAS_AVX2
+        if constexpr (sizeof(T) == 4) float_row(row, d, t.localX, t.w, &from);
+#endif
+        nearest_row_plain(row, d, t.localX, from, t.w);
+    }
+}
+
 template <typename T>
 ZorStatus nearest(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriPoint dstOffset,
                   ZoriSize dstSize, const ZoriResizeSpec* pSpec, Zor8u* pBuffer) {
@@ -157,16 +284,7 @@ ZorStatus nearest(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, Zori
     if (st != zorStsNoErr) return st;
     ResizeTile t;
     resize_tile(s, dstOffset, dstSize, pBuffer, &t);
-    const T* row = pSrc;
-    int32_t prev = 0;
-    for (int32_t j = 0; j < t.h; ++j) {
-        row = row_at(row, srcStep, t.localY[j] - prev);
-        prev = t.localY[j];
-        T* d = row_at(pDst, dstStep, j);
-        // Whole elements through memcpy: bit patterns (NaN payloads) kept,
-        // rows off their element boundary allowed.
-        for (int32_t i = 0; i < t.w; ++i) memcpy(d + i, row + t.localX[i], sizeof(T));
-    }
+    nearest_tile(pSrc, srcStep, pDst, dstStep, t);
     return tile_status(t, zorStsNoErr);
 }
 
