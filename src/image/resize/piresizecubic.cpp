@@ -154,27 +154,31 @@ using simd::vf32;
 constexpr int L = simd::Lanes<vf32>::count;
 constexpr int Q = L / 4;  // positions per vector of four taps
 
-// The four taps of Q positions as floats, one position per 16 bytes;
-// p[q] addresses the first tap.
-inline vf32 taps(const Zor32f* const* p) {
+// The four taps of the Q positions x[0 .. Q) of a row as floats, one
+// position per 16 bytes.
+inline vf32 taps(const Zor32f* row, const int32_t* x) {
 #if ZOR_VECTOR_BYTES == 16
-    return simd::load<vf32>(p[0]);
+    return simd::load<vf32>(row + x[0] - 1);
 #elif ZOR_VECTOR_BYTES == 32
-    return (vf32)_mm256_insertf128_ps(_mm256_castps128_ps256(_mm_loadu_ps(p[0])),
-                                      _mm_loadu_ps(p[1]), 1);
+    return (vf32)_mm256_insertf128_ps(_mm256_castps128_ps256(_mm_loadu_ps(row + x[0] - 1)),
+                                      _mm_loadu_ps(row + x[1] - 1), 1);
 #else
-    __m512 v = _mm512_castps128_ps512(_mm_loadu_ps(p[0]));
-    v = _mm512_insertf32x4(v, _mm_loadu_ps(p[1]), 1);
-    v = _mm512_insertf32x4(v, _mm_loadu_ps(p[2]), 2);
-    return (vf32)_mm512_insertf32x4(v, _mm_loadu_ps(p[3]), 3);
+    __m512 v = _mm512_castps128_ps512(_mm_loadu_ps(row + x[0] - 1));
+    v = _mm512_insertf32x4(v, _mm_loadu_ps(row + x[1] - 1), 1);
+    v = _mm512_insertf32x4(v, _mm_loadu_ps(row + x[2] - 1), 2);
+    return (vf32)_mm512_insertf32x4(v, _mm_loadu_ps(row + x[3] - 1), 3);
 #endif
+}
+
+inline int32_t bytes4(const Zor8u* p) {
+    int32_t b;
+    memcpy(&b, p, 4);
+    return b;
 }
 
 // Four bytes as four 32-bit lanes of a 128-bit vector.
 inline __m128i widen4(const Zor8u* p) {
-    int32_t b;
-    memcpy(&b, p, 4);
-    const __m128i v = _mm_cvtsi32_si128(b);
+    const __m128i v = _mm_cvtsi32_si128(bytes4(p));
 #if ZOR_HAS_SSE41
     return _mm_cvtepu8_epi32(v);
 #else
@@ -183,24 +187,21 @@ inline __m128i widen4(const Zor8u* p) {
 #endif
 }
 
-inline vf32 taps(const Zor8u* const* p) {
+inline vf32 taps(const Zor8u* row, const int32_t* x) {
 #if ZOR_VECTOR_BYTES == 16
-    return (vf32)_mm_cvtepi32_ps(widen4(p[0]));
+    return (vf32)_mm_cvtepi32_ps(widen4(row + x[0] - 1));
 #elif ZOR_VECTOR_BYTES == 32 && !ZOR_HAS_AVX2
-    const __m256i v = _mm256_insertf128_si256(_mm256_castsi128_si256(widen4(p[0])), widen4(p[1]), 1);
-    return (vf32)_mm256_cvtepi32_ps(v);
+    return (vf32)_mm256_cvtepi32_ps(_mm256_insertf128_si256(
+        _mm256_castsi128_si256(widen4(row + x[0] - 1)), widen4(row + x[1] - 1), 1));
 #elif ZOR_VECTOR_BYTES == 32
-    int32_t a, b;
-    memcpy(&a, p[0], 4);
-    memcpy(&b, p[1], 4);
-    return (vf32)_mm256_cvtepi32_ps(_mm256_cvtepu8_epi32(_mm_insert_epi32(_mm_cvtsi32_si128(a), b, 1)));
+    const __m128i v = _mm_insert_epi32(_mm_cvtsi32_si128(bytes4(row + x[0] - 1)),
+                                       bytes4(row + x[1] - 1), 1);
+    return (vf32)_mm256_cvtepi32_ps(_mm256_cvtepu8_epi32(v));
 #else
-    int32_t a[4];
-    for (int q = 0; q < 4; ++q) memcpy(&a[q], p[q], 4);
-    __m128i v = _mm_cvtsi32_si128(a[0]);
-    v = _mm_insert_epi32(v, a[1], 1);
-    v = _mm_insert_epi32(v, a[2], 2);
-    v = _mm_insert_epi32(v, a[3], 3);
+    __m128i v = _mm_cvtsi32_si128(bytes4(row + x[0] - 1));
+    v = _mm_insert_epi32(v, bytes4(row + x[1] - 1), 1);
+    v = _mm_insert_epi32(v, bytes4(row + x[2] - 1), 2);
+    v = _mm_insert_epi32(v, bytes4(row + x[3] - 1), 3);
     return (vf32)_mm512_cvtepi32_ps(_mm512_cvtepu8_epi32(v));
 #endif
 }
@@ -271,7 +272,10 @@ inline void store_u8(Zor8u* p, vf32 v, int n) {
                                        _mm512_set1_epi32(255));
     const __m128i b = _mm512_cvtepi32_epi8(c);
 #endif
-    memcpy(p, &b, (size_t)n);
+    if (n == L)
+        memcpy(p, &b, L);
+    else
+        memcpy(p, &b, (size_t)n);
 }
 
 inline void store_row(Zor8u* p, vf32 v, int n) { store_u8(p, v, n); }
@@ -290,19 +294,14 @@ template <typename T>
 void horizontal(const T* src, const int32_t* x, const float* c, float* out, int32_t n) {
     int32_t i = 0;
     for (; i + L <= n; i += L) {
-        vf32 s[2];
-        for (int h = 0; h < 2; ++h) {
-            vf32 m[2], w[2];
-            for (int g = 0; g < 2; ++g) {
-                const int32_t first = i + (2 * h + g) * Q;
-                const T* p[Q];
-                for (int q = 0; q < Q; ++q) p[q] = src + x[first + q] - 1;
-                m[g] = taps(p);
-                w[g] = simd::load<vf32>(c + 4 * first);
-            }
-            s[h] = pair_products(m[0], w[0], m[1], w[1]);
-        }
-        simd::store(out + i, position_order(pair_sums(s[0], s[1])));
+        // Four vectors of Q positions each: their weights lie L apart.
+        const int32_t* xi = x + i;
+        const float* ci = c + 4 * i;
+        const vf32 s0 = pair_products(taps(src, xi), simd::load<vf32>(ci), taps(src, xi + Q),
+                                      simd::load<vf32>(ci + L));
+        const vf32 s1 = pair_products(taps(src, xi + 2 * Q), simd::load<vf32>(ci + 2 * L),
+                                      taps(src, xi + 3 * Q), simd::load<vf32>(ci + 3 * L));
+        simd::store(out + i, position_order(pair_sums(s0, s1)));
     }
     for (; i < n; ++i) {
         const T* p = src + x[i] - 1;
@@ -323,12 +322,17 @@ inline vf32 vpair(vf32 x0, vf32 c0, vf32 x1, vf32 c1) {
 template <typename T> void vertical(const float* const* r, const float* c, T* dst, int32_t n) {
     const vf32 c0 = simd::broadcast<vf32>(c[0]), c1 = simd::broadcast<vf32>(c[1]);
     const vf32 c2 = simd::broadcast<vf32>(c[2]), c3 = simd::broadcast<vf32>(c[3]);
-    for (int32_t i = 0; i < n; i += L) {
-        const int k = n - i < L ? n - i : L;
-        vf32 x[4];
-        for (int t = 0; t < 4; ++t)
-            x[t] = k == L ? simd::load<vf32>(r[t] + i) : simd::load_n<vf32>(r[t] + i, k);
-        store_row(dst + i, vpair(x[0], c0, x[1], c1) + vpair(x[2], c2, x[3], c3), k);
+    int32_t i = 0;
+    for (; i + L <= n; i += L) {
+        const vf32 x0 = simd::load<vf32>(r[0] + i), x1 = simd::load<vf32>(r[1] + i);
+        const vf32 x2 = simd::load<vf32>(r[2] + i), x3 = simd::load<vf32>(r[3] + i);
+        store_row(dst + i, vpair(x0, c0, x1, c1) + vpair(x2, c2, x3, c3), L);
+    }
+    if (i < n) {
+        const int k = n - i;
+        const vf32 x0 = simd::load_n<vf32>(r[0] + i, k), x1 = simd::load_n<vf32>(r[1] + i, k);
+        const vf32 x2 = simd::load_n<vf32>(r[2] + i, k), x3 = simd::load_n<vf32>(r[3] + i, k);
+        store_row(dst + i, vpair(x0, c0, x1, c1) + vpair(x2, c2, x3, c3), k);
     }
 }
 
