@@ -366,44 +366,64 @@ struct Tile {
     ResizeStrips st;
 };
 
-// One pixel alone from its 4x4 window, rows clamped when `clampRows`.
-template <typename T>
-void border_pixel(const Tile& k, const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep,
-                  int32_t i, int32_t j, bool clampRows) {
-    const ResizeSpec* s = k.s;
+// Column i of a source row (relative to the tile) through the horizontal
+// pass, columns clamped on the sides whose strips are not empty.
+template <typename T> float clamped_h(const Tile& k, const T* row, int32_t i) {
     const ResizeTile& t = k.t;
-    int32_t rows[4], cols[4];
-    const int32_t iy = t.localY[j] + t.shiftY, ix = t.localX[i] + t.shiftX;
-    clamp_taps(iy, s->axisY.srcLen, clampRows, clampRows, rows);
-    clamp_taps(ix, s->axisX.srcLen, k.st.left != 0, k.st.right != 0, cols);
-    const float* cx = s->axisX.coef32f + 4 * (int64_t)(t.x0 + i);
-    const float* cy = s->axisY.coef32f + 4 * (int64_t)(t.y0 + j);
+    int32_t cols[4];
+    clamp_taps(t.localX[i] + t.shiftX, k.s->axisX.srcLen, k.st.left != 0, k.st.right != 0, cols);
+    float v[4];
+    for (int b = 0; b < 4; ++b) v[b] = pixel(row + (cols[b] - t.shiftX));
+    return quad(v, k.s->axisX.coef32f + 4 * (int64_t)(t.x0 + i));
+}
+
+// A pixel of a side strip between the top and bottom strips, alone from
+// its 4x4 window: rows unclamped.
+template <typename T>
+void side_pixel(const Tile& k, const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep,
+                int32_t i, int32_t j) {
+    const ResizeTile& t = k.t;
     float r[4];
+    for (int a = 0; a < 4; ++a) r[a] = clamped_h(k, row_at(pSrc, srcStep, t.localY[j] - 1 + a), i);
+    put(row_at(pDst, dstStep, j) + i, quad(r, k.s->axisY.coef32f + 4 * (int64_t)(t.y0 + j)));
+}
+
+// A row of the top or bottom strip: its four clamped source rows through
+// the horizontal pass into the row buffers (the core's kernel between the
+// side strips, which reads no clamped column), then the vertical pass. The
+// arithmetic is that of a pixel computed alone.
+template <typename T>
+void strip_row(const Tile& k, const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep,
+               int32_t j) {
+    const ResizeTile& t = k.t;
+    const ResizeStrips& st = k.st;
+    int32_t rows[4];
+    clamp_taps(t.localY[j] + t.shiftY, k.s->axisY.srcLen, true, true, rows);
+    const int32_t mid = t.w - st.left - st.right;
+    float* ring[4];
     for (int a = 0; a < 4; ++a) {
+        float* out = ring[a] = (float*)(t.rows + a * tile_row_bytes(t));
         const T* row = row_at(pSrc, srcStep, rows[a] - t.shiftY);
-        float v[4];
-        for (int b = 0; b < 4; ++b) v[b] = pixel(row + (cols[b] - t.shiftX));
-        r[a] = quad(v, cx);
+        if (mid > 0)
+            horizontal(row, t.localX + st.left, k.s->axisX.coef32f + 4 * (int64_t)(t.x0 + st.left),
+                       out + st.left, mid);
+        for (int32_t i = 0; i < st.left; ++i) out[i] = clamped_h(k, row, i);
+        for (int32_t i = t.w - st.right; i < t.w; ++i) out[i] = clamped_h(k, row, i);
     }
-    put(row_at(pDst, dstStep, j) + i, quad(r, cy));
+    vertical(ring, k.s->axisY.coef32f + 4 * (int64_t)(t.y0 + j), row_at(pDst, dstStep, j), t.w);
 }
 
 template <typename T>
 void border_pass(const Tile& k, const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep) {
     const ResizeTile& t = k.t;
     const ResizeStrips& st = k.st;
-    for (int32_t j = 0; j < st.top; ++j)
-        for (int32_t i = 0; i < t.w; ++i)
-            border_pixel(k, pSrc, srcStep, pDst, dstStep, i, j, true);
+    for (int32_t j = 0; j < st.top; ++j) strip_row(k, pSrc, srcStep, pDst, dstStep, j);
     for (int32_t j = st.top; j < t.h - st.bottom; ++j) {
-        for (int32_t i = 0; i < st.left; ++i)
-            border_pixel(k, pSrc, srcStep, pDst, dstStep, i, j, false);
+        for (int32_t i = 0; i < st.left; ++i) side_pixel(k, pSrc, srcStep, pDst, dstStep, i, j);
         for (int32_t i = t.w - st.right; i < t.w; ++i)
-            border_pixel(k, pSrc, srcStep, pDst, dstStep, i, j, false);
+            side_pixel(k, pSrc, srcStep, pDst, dstStep, i, j);
     }
-    for (int32_t j = t.h - st.bottom; j < t.h; ++j)
-        for (int32_t i = 0; i < t.w; ++i)
-            border_pixel(k, pSrc, srcStep, pDst, dstStep, i, j, true);
+    for (int32_t j = t.h - st.bottom; j < t.h; ++j) strip_row(k, pSrc, srcStep, pDst, dstStep, j);
 }
 
 // The four-row ring over the core: ring[a] holds source row prev - 1 + a.
