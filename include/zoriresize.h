@@ -53,7 +53,7 @@
  * the others by the row passes above. border is zorBorderRepl (1) with
  * any of the flags zorBorderInMemTop/Bottom/Left/Right (16/32/64/128): a
  * flagged side is read from memory beyond the image instead (one row or
- * column for linear, one before and two after for cubic). zorBorderInMem
+ * column for linear, up to two for cubic). zorBorderInMem
  * (240) alone reads memory on all sides. Other values: zorStsBorderErr.
  * The border value pointer is never read. The edge pixels of the 8u
  * fixed-point path round as ((v + ((v >> 14) & 1) + 8192) >> 14) of their

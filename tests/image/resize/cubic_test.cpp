@@ -1,0 +1,270 @@
+// Cubic resize through the public stubs on every level against a model made
+// from the formulas: positions, fractions and (B, C) weights in double from
+// the general formula, two passes of (x0*c0 + x1*c1) + (x2*c2 + x3*c3)
+// (fused levels round x1*c1 onto the rounded x0*c0), taps replicated on the
+// sides without an in-memory flag. Sources sit against unreadable pages
+// with exactly the margins the flags promise.
+#include <float.h>
+#include <math.h>
+#include <xmmintrin.h>
+
+#include <map>
+#include <vector>
+
+#include "resize_support.h"
+#include "zortest.h"
+
+namespace {
+
+using zortest::Image;
+using zortest::Rng;
+
+struct Pair {
+    float B, C;
+    bool folded;  // the library folds the constants: weights may differ by an ulp
+};
+const Pair kPairs[] = {{0, 0.5f, false}, {1, 0, true}, {0.5f, 0.3f, true},
+                       {1 / 3.0f, 1 / 3.0f, false}, {-1, 2.5f, false}, {NAN, 0, false}};
+const int32_t kBorders[] = {1, 240, 1 | 16, 1 | 32, 1 | 64, 1 | 128, 1 | 16 | 64, 1 | 32 | 128, 241};
+
+double weight(double x, double B, double C) {
+    if (x >= 2) return 0;
+    if (x < 1) return ((2 - 1.5 * B - C) * x + (-3 + 2 * B + C)) * (x * x) + (1 - B / 3);
+    if (x < 2)
+        return (((-B / 6 - C) * x + (B + 5 * C)) * x - (2 * B + 8 * C)) * x + (4 * B / 3 + 4 * C);
+    return 1;
+}
+
+// Per destination position: source index and four weights (Init flushes
+// denormal weights to zero).
+struct Axis {
+    std::vector<int32_t> index;
+    std::vector<float> w;
+};
+Axis axis(int32_t src, int32_t dst, const Pair& p) {
+    Axis a;
+    for (int32_t i = 0; i < dst; ++i) {
+        const double pos = (i + 0.5) * ((double)src / dst) - 0.5, index = floor(pos);
+        const float f = (float)(pos - index), d0 = -1.0f - f;
+        a.index.push_back((int32_t)index);
+        for (int t = 0; t < 4; ++t) {
+            float w = (float)weight(fabsf(d0 + (float)t), p.B, p.C);
+            if (fabsf(w) < FLT_MIN) w = copysignf(0, w);
+            a.w.push_back(w);
+        }
+    }
+    return a;
+}
+
+// Tap t of a window at `index` on an axis of length n; a side clamps
+// unless its in-memory flag is set.
+int32_t tap(int32_t index, int t, int32_t n, bool lowInMem, bool highInMem) {
+    if (!lowInMem && index < 0) return t < 3 ? 0 : 1;
+    if (!lowInMem && index == 0) return t < 2 ? 0 : t - 1;
+    if (!highInMem && index == n - 2) return t < 3 ? n - 3 + t : n - 1;
+    if (!highInMem && index > n - 2) return n - 1;
+    return index - 1 + t;
+}
+
+float quad(const float* x, const float* c, bool fused) {
+    if (fused) return fmaf(x[1], c[1], x[0] * c[0]) + fmaf(x[3], c[3], x[2] * c[2]);
+    return (x[0] * c[0] + x[1] * c[1]) + (x[2] * c[2] + x[3] * c[3]);
+}
+
+uint8_t to_u8(float v) {
+    const int32_t i = _mm_cvtss_si32(_mm_set_ss(v));  // NaN, overflow: INT32_MIN
+    return (uint8_t)(i < 0 ? 0 : i > 255 ? 255 : i);
+}
+
+// The source with the margins a border form lets the library read: two
+// on each in-memory side (an enlargement's first window starts at -2).
+// Against an unreadable page.
+template <typename T> struct Source {
+    int32_t l, u;
+    zortest::Fenced<T> f;
+    Source(int32_t W, int32_t H, int32_t border, bool atEnd)
+        : l(border & 64 ? 2 : 0), u(border & 16 ? 2 : 0),
+          f(W + l + (border & 128 ? 2 : 0), H + u + (border & 32 ? 2 : 0), atEnd,
+            (W + l + (border & 128 ? 2 : 0) + 1) * (int32_t)sizeof(T)) {}
+    T* ptr(int32_t x, int32_t y) { return f.ptr(x + l, y + u); }
+    float get(int32_t x, int32_t y) {
+        T v;
+        memcpy(&v, ptr(x, y), sizeof v);
+        return (float)v;
+    }
+};
+
+bool near(Zor8u got, float v, float tol) { return to_u8(v - tol) <= got && got <= to_u8(v + tol); }
+bool near(float got, float v, float tol) { return isnan(v) ? isnan(got) : fabsf(got - v) <= tol; }
+
+// One call over the destination against the model, then random tiles
+// against that call. A folded kernel's weights lie within 2^-22 of the
+// general formula's: with M the largest tap and S, T the two axes' absolute
+// weight sums, four taps per pass and the passes' roundings move a result
+// by less than 2^-19 (1 + S T) M; the check allows twice that. Results of
+// levels with the same arithmetic must agree bit for bit.
+template <typename T>
+void run_case(int32_t W, int32_t H, ZoriSize dst, const Pair& p, int32_t border, bool fused,
+              uint32_t seed) {
+    SCOPED_TRACE(::testing::Message() << zortest::Type<T>::name << " " << W << "x" << H << " to "
+                 << dst.width << "x" << dst.height << " (" << p.B << ", " << p.C << ") " << border);
+    Rng rng(seed);
+    Source<T> s(W, H, border, seed & 1);
+    s.f.fill([&](int32_t, int32_t) {
+        return sizeof(T) == 1 ? (T)rng.next() : (T)(((int32_t)rng.below(2001) - 1000) * 0.37f);
+    });
+    zortest::ResizeRecord rec = zortest::resize_record({W, H}, dst, zoriInterCubic, seed % 64);
+    ASSERT_EQ(zoriResizeCubicInit_8u({W, H}, dst, p.B, p.C, rec.spec(), rec.initBuf()),
+              zorStsNoErr);
+    ASSERT_TRUE(record_guards_intact(rec));
+    std::vector<uint8_t> buf = zortest::resize_buffer(rec.spec(), dst);
+    Image<T> out(dst.width, dst.height, (dst.width + 3) * (int32_t)sizeof(T), seed % 4 * sizeof(T));
+    auto run = [&](ZoriPoint o, Image<T>& d, ZoriRect r, std::vector<uint8_t>& b) {
+        const auto f = [] {
+            if constexpr (sizeof(T) == 1) return zoriResizeCubic_8u_C1R;
+            else return zoriResizeCubic_32f_C1R;
+        }();
+        return f(s.ptr(o.x, o.y), s.f.step, d.ptr(r.x, r.y), d.step, {r.x, r.y},
+                 {r.width, r.height}, (ZoriBorderType)border, nullptr, rec.spec(), b.data());
+    };
+    ASSERT_EQ(run({0, 0}, out, {0, 0, dst.width, dst.height}, buf), zorStsNoErr);
+    ASSERT_TRUE(zortest::guard_intact(buf, buf.size() - 64));
+
+    const Axis ax = axis(W, dst.width, p), ay = axis(H, dst.height, p);
+    const bool mem = border == 240;
+    std::vector<uint8_t> pixels;
+    for (int32_t y = 0; y < dst.height; ++y)
+        for (int32_t x = 0; x < dst.width; ++x) {
+            float r[4], m = 0, S = 0, Tw = 0;
+            for (int a = 0; a < 4; ++a) {
+                float px[4];
+                const int32_t sy = tap(ay.index[y], a, H, mem || (border & 16), mem || (border & 32));
+                for (int b = 0; b < 4; ++b) {
+                    px[b] = s.get(tap(ax.index[x], b, W, mem || (border & 64), mem || (border & 128)), sy);
+                    m = fmaxf(m, fabsf(px[b]));
+                }
+                r[a] = quad(px, &ax.w[4 * x], fused);
+                S += fabsf(ax.w[4 * x + a]);
+                Tw += fabsf(ay.w[4 * y + a]);
+            }
+            const float v = quad(r, &ay.w[4 * y], fused);
+            const T got = out.get(x, y);
+            if (p.folded)
+                ASSERT_TRUE(near(got, v, ldexpf(1 + S * Tw, -18) * m)) << x << "," << y;
+            else if (sizeof(T) == 1)
+                ASSERT_EQ(got, to_u8(v)) << x << "," << y;
+            else
+                ASSERT_TRUE(near(got, v, 0)) << x << "," << y << ": " << got << " vs " << v;
+            // (0, 0.5) at equal sizes weighs 0, 1, 0, 0: an 8u copy.
+            if (sizeof(T) == 1 && p.B == 0 && p.C == 0.5f && W == dst.width && H == dst.height)
+                ASSERT_EQ(got, s.get(x, y));
+            const T same = got != got ? (T)NAN : got;  // a NaN's sign and payload are free
+            pixels.insert(pixels.end(), (const uint8_t*)&same, (const uint8_t*)&same + sizeof(T));
+        }
+    static std::map<uint32_t, std::vector<uint8_t>> seen[2];
+    std::vector<uint8_t>& first = seen[fused][seed];
+    if (first.empty()) first = pixels;
+    ASSERT_TRUE(first == pixels) << "levels of one arithmetic differ";
+
+    Image<T> tiled = out;
+    tiled.fill([](int32_t, int32_t) { return 0; });
+    for (const ZoriRect& r : zortest::random_tiles(dst, rng)) {
+        ZoriPoint off;
+        ASSERT_EQ(zoriResizeGetSrcOffset_8u(rec.spec(), {r.x, r.y}, &off), zorStsNoErr);
+        std::vector<uint8_t> tb = zortest::resize_buffer(rec.spec(), {r.width, r.height});
+        ASSERT_EQ(run(off, tiled, r, tb), zorStsNoErr);
+    }
+    ASSERT_TRUE(same_bytes(tiled, out));
+}
+
+using Cubic = zortest::LevelTest;
+
+// The smallest source, equal sizes, integer and non-integer ratios both
+// ways, destination widths around every vector width; every pair, and the
+// border forms in turn.
+TEST_P(Cubic, SweepMatchesModel) {
+    const int32_t sizes[][4] = {{4, 4, 4, 4},   {4, 4, 9, 7},    {4, 5, 1, 2},   {9, 4, 4, 9},
+                                {16, 12, 8, 6}, {30, 9, 10, 3},  {17, 13, 11, 8}, {11, 8, 17, 13},
+                                {8, 6, 16, 12}, {20, 21, 20, 21}, {37, 7, 3, 5},  {37, 7, 15, 5},
+                                {37, 7, 16, 5}, {37, 7, 17, 5},  {37, 7, 31, 5}, {37, 7, 33, 5},
+                                {64, 7, 47, 5}};
+    uint32_t seed = 1;
+    for (const auto& z : sizes)
+        for (const Pair& p : kPairs)
+            for (int32_t border : {kBorders[seed % 9], kBorders[(seed + 4) % 9]}) {
+                run_case<Zor8u>(z[0], z[1], {z[2], z[3]}, p, border, GetParam().index >= 4, seed++);
+                run_case<Zor32f>(z[0], z[1], {z[2], z[3]}, p, border, GetParam().index >= 4, seed++);
+                if (HasFatalFailure()) return;
+            }
+}
+
+// Each row breaks one argument of a good call and passes every earlier
+// check; nothing is written before the last row, which succeeds.
+TEST_P(Cubic, ChecksInOrder) {
+    const ZoriSize src{6, 5}, dst{4, 7};
+    zortest::ResizeRecord rec = zortest::resize_record(src, dst, zoriInterCubic);
+    zortest::ResizeRecord nn = zortest::resize_record(src, dst, zoriInterNN);
+    const std::vector<uint8_t> blank = rec.mem;
+    auto init = [&](ZoriSize s, ZoriSize d, ZoriResizeSpec* sp, Zor8u* ib) {
+        return [=] { return zoriResizeCubicInit_32f(s, d, 0, 0.5f, sp, ib); };
+    };
+    ZoriResizeSpec* ok = rec.spec();
+    Zor8u* ib = rec.initBuf();
+    zortest::run_checks({{zorStsNullPtrErr, "null record", init(src, dst, nullptr, ib)},
+                         {zorStsNullPtrErr, "null init buffer", init(src, dst, ok, nullptr)},
+                         {zorStsNoOperation, "zero length", init({-1, 5}, {0, 7}, ok, ib)},
+                         {zorStsSizeErr, "negative length", init(src, {4, -7}, ok, ib)},
+                         {zorStsSizeErr, "source below 4", init({6, 3}, dst, ok, ib)}},
+                        [&] { return rec.mem == blank; });
+    // Init hands back the caller's rounding, flush and underflow settings
+    // (round toward zero, denormal inputs as zero, underflow unmasked).
+    const unsigned int saved = _mm_getcsr(), csr = 0x7780u | 0x40u;
+    _mm_setcsr(csr);
+    const ZorStatus st = zoriResizeCubicInit_8u(src, dst, 1, 0, ok, ib);
+    const unsigned int after = _mm_getcsr();
+    _mm_setcsr(saved);
+    ASSERT_EQ(st, zorStsNoErr);
+    EXPECT_EQ(after & ~0x2fu, csr) << std::hex << after;  // other exception flags may rise
+    ASSERT_EQ(zoriResizeNearestInit_8u(src, dst, nn.spec()), zorStsNoErr);
+    Image<Zor32f> s(6, 5), d(4, 7);
+    const Image<Zor32f> before = d;
+    std::vector<uint8_t> buf = zortest::resize_buffer(ok, dst), zero(512, 0);
+    const ZoriResizeSpec *bad = (const ZoriResizeSpec*)zero.data(), *n = nn.spec();
+    struct Row {
+        ZorStatus want;
+        int32_t border, srcStep;
+        ZoriPoint at;
+        ZoriSize size;
+        const ZoriResizeSpec* spec;
+        int nulls;  // 1 source, 2 destination, 4 buffer
+    };
+    const Row rows[] = {{zorStsBorderErr, 0, 24, {0, 0}, dst, bad, 1},
+                        {zorStsBorderErr, 3, 24, {0, 0}, dst, ok, 0},
+                        {zorStsBorderErr, 257, 24, {0, 0}, dst, ok, 0},
+                        {zorStsNullPtrErr, 1, 24, {0, 0}, dst, ok, 1},
+                        {zorStsNullPtrErr, 1, 24, {0, 0}, dst, ok, 2},
+                        {zorStsNullPtrErr, 1, 24, {0, 0}, dst, nullptr, 0},
+                        {zorStsNullPtrErr, 1, 24, {0, 0}, dst, ok, 4},
+                        {zorStsNoOperation, 1, 26, {9, 0}, {0, 1}, bad, 0},
+                        {zorStsContextMatchErr, 1, 26, {9, 0}, {-1, 1}, bad, 0},
+                        {zorStsSizeErr, 1, 26, {9, 0}, {-1, 1}, ok, 0},
+                        {zorStsStepErr, 1, 26, {9, 0}, dst, ok, 0},
+                        {zorStsOutOfRangeErr, 1, 24, {0, 7}, dst, ok, 0},
+                        {zorStsContextMatchErr, 1, 24, {0, 0}, dst, n, 0},
+                        {zorStsSizeWrn, 240, 24, {0, 0}, {5, 8}, ok, 0}};
+    for (const Row& r : rows) {
+        EXPECT_TRUE(same_bytes(d, before)) << "a failing call wrote";
+        EXPECT_EQ(zoriResizeCubic_32f_C1R(r.nulls & 1 ? nullptr : s.ptr(), r.srcStep,
+                                          r.nulls & 2 ? nullptr : d.ptr(), 16, r.at, r.size,
+                                          (ZoriBorderType)r.border, nullptr, r.spec,
+                                          r.nulls & 4 ? nullptr : buf.data()),
+                  r.want)
+            << &r - rows;
+    }
+    // The last, a tile running past the destination, is clipped and written.
+    EXPECT_FALSE(same_bytes(d, before));
+}
+
+ZOR_INSTANTIATE_LEVELS(Cubic);
+
+}  // namespace
