@@ -47,14 +47,14 @@ template <typename T> void zor_cubic(benchmark::State& state, uint64_t select, i
     int32_t specSize = 0, initSize = 0, bufSize = 0;
     zoriResizeGetSize_8u({kW, kH}, dst, zoriInterCubic, 0, &specSize, &initSize);
     std::vector<Zor8u> rec((size_t)specSize), init((size_t)initSize);
-    const ZoriResizeSpec* spec = (const ZoriResizeSpec*)rec.data();
+    const ZoriResizeSpec* record = (const ZoriResizeSpec*)rec.data();
     zoriResizeCubicInit_8u({kW, kH}, dst, 0, 0.5f, (ZoriResizeSpec*)rec.data(), init.data());
-    zoriResizeGetBufferSize_8u(spec, dst, 1, &bufSize);
+    zoriResizeGetBufferSize_8u(record, dst, 1, &bufSize);
     std::vector<Zor8u> buf((size_t)bufSize);
     T* src = picture<T>((size_t)kW * kH);
     T* out = picture<T>((size_t)dst.width * dst.height);
     for (auto _ : state) {
-        ZorStatus s = run(src, out, dst, spec, buf.data());
+        ZorStatus s = run(src, out, dst, record, buf.data());
         benchmark::DoNotOptimize(s);
         benchmark::ClobberMemory();
     }

@@ -31,11 +31,11 @@ T* picture(int w, int h) {
     return p;
 }
 
-ZorStatus run(const Zor8u* s, Zor8u* d, ZoriSize dst, const ZoriResizeSpec* spec, Zor8u* b) {
-    return zoriResizeNearest_8u_C1R(s, kW, d, dst.width, {0, 0}, dst, spec, b);
+ZorStatus run(const Zor8u* s, Zor8u* d, ZoriSize dst, const ZoriResizeSpec* record, Zor8u* b) {
+    return zoriResizeNearest_8u_C1R(s, kW, d, dst.width, {0, 0}, dst, record, b);
 }
-ZorStatus run(const Zor32f* s, Zor32f* d, ZoriSize dst, const ZoriResizeSpec* spec, Zor8u* b) {
-    return zoriResizeNearest_32f_C1R(s, kW * 4, d, dst.width * 4, {0, 0}, dst, spec, b);
+ZorStatus run(const Zor32f* s, Zor32f* d, ZoriSize dst, const ZoriResizeSpec* record, Zor8u* b) {
+    return zoriResizeNearest_32f_C1R(s, kW * 4, d, dst.width * 4, {0, 0}, dst, record, b);
 }
 
 template <typename T>
@@ -45,14 +45,14 @@ void zor_nearest(benchmark::State& state, uint64_t select, int size) {
     int32_t specSize = 0, initSize = 0, bufSize = 0;
     zoriResizeGetSize_8u({kW, kH}, dst, zoriInterNN, 0, &specSize, &initSize);
     std::vector<Zor8u> rec(specSize);
-    ZoriResizeSpec* spec = (ZoriResizeSpec*)rec.data();
-    zoriResizeNearestInit_8u({kW, kH}, dst, spec);
-    zoriResizeGetBufferSize_8u(spec, dst, 1, &bufSize);
+    ZoriResizeSpec* record = (ZoriResizeSpec*)rec.data();
+    zoriResizeNearestInit_8u({kW, kH}, dst, record);
+    zoriResizeGetBufferSize_8u(record, dst, 1, &bufSize);
     std::vector<Zor8u> buf(bufSize);
     T* src = picture<T>(kW, kH);
     T* out = picture<T>(dst.width, dst.height);
     for (auto _ : state) {
-        ZorStatus s = run(src, out, dst, spec, buf.data());
+        ZorStatus s = run(src, out, dst, record, buf.data());
         benchmark::DoNotOptimize(s);
         benchmark::ClobberMemory();
     }

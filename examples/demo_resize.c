@@ -20,7 +20,7 @@ typedef struct {
     int isFloat;
     const void* src;
     void* dst;
-    const ZoriResizeSpec* spec;
+    const ZoriResizeSpec* record;
     Zor8u* buffer;
     ZorStatus status;
     uint32_t first[2]; /* first checksum of the levels without and with FMA */
@@ -48,22 +48,22 @@ static void run_resize(void* ctx) {
         const Zor32f* s = (const Zor32f*)d->src;
         Zor32f* o = (Zor32f*)d->dst;
         d->status = d->method == kNearest
-                        ? zoriResizeNearest_32f_C1R(s, ss, o, ds, at, size, d->spec, d->buffer)
+                        ? zoriResizeNearest_32f_C1R(s, ss, o, ds, at, size, d->record, d->buffer)
                     : d->method == kLinear
                         ? zoriResizeLinear_32f_C1R(s, ss, o, ds, at, size, zorBorderRepl, NULL,
-                                                   d->spec, d->buffer)
+                                                   d->record, d->buffer)
                         : zoriResizeCubic_32f_C1R(s, ss, o, ds, at, size, zorBorderRepl, NULL,
-                                                  d->spec, d->buffer);
+                                                  d->record, d->buffer);
     } else {
         const Zor8u* s = (const Zor8u*)d->src;
         Zor8u* o = (Zor8u*)d->dst;
         d->status = d->method == kNearest
-                        ? zoriResizeNearest_8u_C1R(s, ss, o, ds, at, size, d->spec, d->buffer)
+                        ? zoriResizeNearest_8u_C1R(s, ss, o, ds, at, size, d->record, d->buffer)
                     : d->method == kLinear
                         ? zoriResizeLinear_8u_C1R(s, ss, o, ds, at, size, zorBorderRepl, NULL,
-                                                  d->spec, d->buffer)
+                                                  d->record, d->buffer)
                         : zoriResizeCubic_8u_C1R(s, ss, o, ds, at, size, zorBorderRepl, NULL,
-                                                 d->spec, d->buffer);
+                                                 d->record, d->buffer);
     }
 }
 
@@ -96,14 +96,14 @@ static void to_8u(const Zor32f* f, Zor8u* out, size_t n) {
 }
 
 /* Fills the record for one method and type; returns the Init status. */
-static ZorStatus make_record(Method m, int isFloat, ZoriResizeSpec* spec, Zor8u* init) {
+static ZorStatus make_record(Method m, int isFloat, ZoriResizeSpec* record, Zor8u* init) {
     const ZoriSize s = {kSW, kSH}, d = {kDW, kDH};
-    if (m == kNearest) return zoriResizeNearestInit_8u(s, d, spec);
+    if (m == kNearest) return zoriResizeNearestInit_8u(s, d, record);
     if (m == kLinear)
-        return isFloat ? zoriResizeLinearInit_32f(s, d, spec) : zoriResizeLinearInit_8u(s, d, spec);
+        return isFloat ? zoriResizeLinearInit_32f(s, d, record) : zoriResizeLinearInit_8u(s, d, record);
     /* Catmull-Rom. */
-    return isFloat ? zoriResizeCubicInit_32f(s, d, 0.0f, 0.5f, spec, init)
-                   : zoriResizeCubicInit_8u(s, d, 0.0f, 0.5f, spec, init);
+    return isFloat ? zoriResizeCubicInit_32f(s, d, 0.0f, 0.5f, record, init)
+                   : zoriResizeCubicInit_8u(s, d, 0.0f, 0.5f, record, init);
 }
 
 static void resize_method(Method m, int isFloat, const void* src, void* dst, Zor8u* view) {

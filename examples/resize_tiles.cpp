@@ -29,28 +29,28 @@ const char* name(Method m) {
 // One tile through the operation of the method; p points at the tile's
 // first source pixel.
 ZorStatus run(Method m, const Zor8u* p, Zor8u* d, ZoriPoint o, ZoriSize z,
-              const ZoriResizeSpec* spec, Zor8u* buf) {
-    if (m == Method::nearest) return zoriResizeNearest_8u_C1R(p, kSW, d, kDW, o, z, spec, buf);
+              const ZoriResizeSpec* record, Zor8u* buf) {
+    if (m == Method::nearest) return zoriResizeNearest_8u_C1R(p, kSW, d, kDW, o, z, record, buf);
     if (m == Method::linear)
-        return zoriResizeLinear_8u_C1R(p, kSW, d, kDW, o, z, zorBorderRepl, nullptr, spec, buf);
-    return zoriResizeCubic_8u_C1R(p, kSW, d, kDW, o, z, zorBorderRepl, nullptr, spec, buf);
+        return zoriResizeLinear_8u_C1R(p, kSW, d, kDW, o, z, zorBorderRepl, nullptr, record, buf);
+    return zoriResizeCubic_8u_C1R(p, kSW, d, kDW, o, z, zorBorderRepl, nullptr, record, buf);
 }
 ZorStatus run(Method m, const Zor32f* p, Zor32f* d, ZoriPoint o, ZoriSize z,
-              const ZoriResizeSpec* spec, Zor8u* buf) {
+              const ZoriResizeSpec* record, Zor8u* buf) {
     const int32_t ss = kSW * 4, ds = kDW * 4;
-    if (m == Method::nearest) return zoriResizeNearest_32f_C1R(p, ss, d, ds, o, z, spec, buf);
+    if (m == Method::nearest) return zoriResizeNearest_32f_C1R(p, ss, d, ds, o, z, record, buf);
     if (m == Method::linear)
-        return zoriResizeLinear_32f_C1R(p, ss, d, ds, o, z, zorBorderRepl, nullptr, spec, buf);
-    return zoriResizeCubic_32f_C1R(p, ss, d, ds, o, z, zorBorderRepl, nullptr, spec, buf);
+        return zoriResizeLinear_32f_C1R(p, ss, d, ds, o, z, zorBorderRepl, nullptr, record, buf);
+    return zoriResizeCubic_32f_C1R(p, ss, d, ds, o, z, zorBorderRepl, nullptr, record, buf);
 }
 
-ZorStatus init(Method m, bool isFloat, ZoriResizeSpec* spec, Zor8u* initBuf) {
+ZorStatus init(Method m, bool isFloat, ZoriResizeSpec* record, Zor8u* initBuf) {
     const ZoriSize s{kSW, kSH}, d{kDW, kDH};
-    if (m == Method::nearest) return zoriResizeNearestInit_8u(s, d, spec);
+    if (m == Method::nearest) return zoriResizeNearestInit_8u(s, d, record);
     if (m == Method::linear)
-        return isFloat ? zoriResizeLinearInit_32f(s, d, spec) : zoriResizeLinearInit_8u(s, d, spec);
-    return isFloat ? zoriResizeCubicInit_32f(s, d, 0.0f, 0.5f, spec, initBuf)
-                   : zoriResizeCubicInit_8u(s, d, 0.0f, 0.5f, spec, initBuf);
+        return isFloat ? zoriResizeLinearInit_32f(s, d, record) : zoriResizeLinearInit_8u(s, d, record);
+    return isFloat ? zoriResizeCubicInit_32f(s, d, 0.0f, 0.5f, record, initBuf)
+                   : zoriResizeCubicInit_8u(s, d, 0.0f, 0.5f, record, initBuf);
 }
 
 // 0 when the tiles equal the single call, 1 on a difference or an error,
@@ -66,8 +66,8 @@ int check(Method m, unsigned threads) {
     int32_t specSize = 0, initSize = 0;
     ZorStatus st = zoriResizeGetSize_8u({kSW, kSH}, {kDW, kDH}, kind, 0, &specSize, &initSize);
     std::vector<Zor8u> rec(specSize > 0 ? specSize : 1), initBuf(initSize > 0 ? initSize : 1);
-    ZoriResizeSpec* spec = (ZoriResizeSpec*)rec.data();
-    if (st == zorStsNoErr) st = init(m, isFloat, spec, initBuf.data());
+    ZoriResizeSpec* record = (ZoriResizeSpec*)rec.data();
+    if (st == zorStsNoErr) st = init(m, isFloat, record, initBuf.data());
     if (st != zorStsNoErr) {
         printf("not available (%d: %s)\n", (int)st, zorGetStatusString(st));
         return -1;
@@ -81,10 +81,10 @@ int check(Method m, unsigned threads) {
 
     // The reference: the whole destination in one call.
     int32_t bufSize = 0;
-    zoriResizeGetBufferSize_8u(spec, {kDW, kDH}, 1, &bufSize);
+    zoriResizeGetBufferSize_8u(record, {kDW, kDH}, 1, &bufSize);
     std::vector<Zor8u> whole(bufSize);
     std::vector<T> once((size_t)kDW * kDH), tiled((size_t)kDW * kDH);
-    st = run(m, src.data(), once.data(), {0, 0}, {kDW, kDH}, spec, whole.data());
+    st = run(m, src.data(), once.data(), {0, 0}, {kDW, kDH}, record, whole.data());
     if (st != zorStsNoErr) {
         printf("single call failed (%d: %s)\n", (int)st, zorGetStatusString(st));
         return 1;
@@ -93,7 +93,7 @@ int check(Method m, unsigned threads) {
     // The tiles: a shared counter hands them out; each thread keeps its
     // own buffer, sized once for the largest tile.
     const int32_t across = (kDW + kTileW - 1) / kTileW, down = (kDH + kTileH - 1) / kTileH;
-    zoriResizeGetBufferSize_8u(spec, {kTileW, kTileH}, 1, &bufSize);
+    zoriResizeGetBufferSize_8u(record, {kTileW, kTileH}, 1, &bufSize);
     std::atomic<int32_t> next{0};
     std::atomic<int32_t> failed{zorStsNoErr};
     auto worker = [&] {
@@ -102,10 +102,10 @@ int check(Method m, unsigned threads) {
             const ZoriPoint o{k % across * kTileW, k / across * kTileH};
             const ZoriSize z{std::min(kTileW, kDW - o.x), std::min(kTileH, kDH - o.y)};
             ZoriPoint at{0, 0};
-            ZorStatus s = zoriResizeGetSrcOffset_8u(spec, o, &at);
+            ZorStatus s = zoriResizeGetSrcOffset_8u(record, o, &at);
             if (s == zorStsNoErr)
                 s = run(m, src.data() + (size_t)at.y * kSW + at.x,
-                        tiled.data() + (size_t)o.y * kDW + o.x, o, z, spec, buf.data());
+                        tiled.data() + (size_t)o.y * kDW + o.x, o, z, record, buf.data());
             if (s != zorStsNoErr) failed = s;
         }
     };

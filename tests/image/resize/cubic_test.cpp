@@ -114,10 +114,10 @@ void run_case(int32_t W, int32_t H, ZoriSize dst, const Pair& p, int32_t border,
         return sizeof(T) == 1 ? (T)rng.next() : (T)(((int32_t)rng.below(2001) - 1000) * 0.37f);
     });
     zortest::ResizeRecord rec = zortest::resize_record({W, H}, dst, zoriInterCubic, seed % 64);
-    ASSERT_EQ(zoriResizeCubicInit_8u({W, H}, dst, p.B, p.C, rec.spec(), rec.initBuf()),
+    ASSERT_EQ(zoriResizeCubicInit_8u({W, H}, dst, p.B, p.C, rec.record(), rec.initBuf()),
               zorStsNoErr);
     ASSERT_TRUE(record_guards_intact(rec));
-    std::vector<uint8_t> buf = zortest::resize_buffer(rec.spec(), dst);
+    std::vector<uint8_t> buf = zortest::resize_buffer(rec.record(), dst);
     Image<T> out(dst.width, dst.height, (dst.width + 3) * (int32_t)sizeof(T), seed % 4 * sizeof(T));
     auto run = [&](ZoriPoint o, Image<T>& d, ZoriRect r, std::vector<uint8_t>& b) {
         const auto f = [] {
@@ -125,7 +125,7 @@ void run_case(int32_t W, int32_t H, ZoriSize dst, const Pair& p, int32_t border,
             else return zoriResizeCubic_32f_C1R;
         }();
         return f(s.ptr(o.x, o.y), s.f.step, d.ptr(r.x, r.y), d.step, {r.x, r.y},
-                 {r.width, r.height}, (ZoriBorderType)border, nullptr, rec.spec(), b.data());
+                 {r.width, r.height}, (ZoriBorderType)border, nullptr, rec.record(), b.data());
     };
     ASSERT_EQ(run({0, 0}, out, {0, 0, dst.width, dst.height}, buf), zorStsNoErr);
     ASSERT_TRUE(zortest::guard_intact(buf, buf.size() - 64));
@@ -170,8 +170,8 @@ void run_case(int32_t W, int32_t H, ZoriSize dst, const Pair& p, int32_t border,
     tiled.fill([](int32_t, int32_t) { return 0; });
     for (const ZoriRect& r : zortest::random_tiles(dst, rng)) {
         ZoriPoint off;
-        ASSERT_EQ(zoriResizeGetSrcOffset_8u(rec.spec(), {r.x, r.y}, &off), zorStsNoErr);
-        std::vector<uint8_t> tb = zortest::resize_buffer(rec.spec(), {r.width, r.height});
+        ASSERT_EQ(zoriResizeGetSrcOffset_8u(rec.record(), {r.x, r.y}, &off), zorStsNoErr);
+        std::vector<uint8_t> tb = zortest::resize_buffer(rec.record(), {r.width, r.height});
         ASSERT_EQ(run(off, tiled, r, tb), zorStsNoErr);
     }
     ASSERT_TRUE(same_bytes(tiled, out));
@@ -208,7 +208,7 @@ TEST_P(Cubic, ChecksInOrder) {
     auto init = [&](ZoriSize s, ZoriSize d, ZoriResizeSpec* sp, Zor8u* ib) {
         return [=] { return zoriResizeCubicInit_32f(s, d, 0, 0.5f, sp, ib); };
     };
-    ZoriResizeSpec* ok = rec.spec();
+    ZoriResizeSpec* ok = rec.record();
     Zor8u* ib = rec.initBuf();
     zortest::run_checks({{zorStsNullPtrErr, "null record", init(src, dst, nullptr, ib)},
                          {zorStsNullPtrErr, "null init buffer", init(src, dst, ok, nullptr)},
@@ -225,17 +225,17 @@ TEST_P(Cubic, ChecksInOrder) {
     _mm_setcsr(saved);
     ASSERT_EQ(st, zorStsNoErr);
     EXPECT_EQ(after & ~0x2fu, csr) << std::hex << after;  // other exception flags may rise
-    ASSERT_EQ(zoriResizeNearestInit_8u(src, dst, nn.spec()), zorStsNoErr);
+    ASSERT_EQ(zoriResizeNearestInit_8u(src, dst, nn.record()), zorStsNoErr);
     Image<Zor32f> s(6, 5), d(4, 7);
     const Image<Zor32f> before = d;
     std::vector<uint8_t> buf = zortest::resize_buffer(ok, dst), zero(512, 0);
-    const ZoriResizeSpec *bad = (const ZoriResizeSpec*)zero.data(), *n = nn.spec();
+    const ZoriResizeSpec *bad = (const ZoriResizeSpec*)zero.data(), *n = nn.record();
     struct Row {
         ZorStatus want;
         int32_t border, srcStep;
         ZoriPoint at;
         ZoriSize size;
-        const ZoriResizeSpec* spec;
+        const ZoriResizeSpec* record;
         int nulls;  // 1 source, 2 destination, 4 buffer
     };
     const Row rows[] = {{zorStsBorderErr, 0, 24, {0, 0}, dst, bad, 1},
@@ -256,7 +256,7 @@ TEST_P(Cubic, ChecksInOrder) {
         EXPECT_TRUE(same_bytes(d, before)) << "a failing call wrote";
         EXPECT_EQ(zoriResizeCubic_32f_C1R(r.nulls & 1 ? nullptr : s.ptr(), r.srcStep,
                                           r.nulls & 2 ? nullptr : d.ptr(), 16, r.at, r.size,
-                                          (ZoriBorderType)r.border, nullptr, r.spec,
+                                          (ZoriBorderType)r.border, nullptr, r.record,
                                           r.nulls & 4 ? nullptr : buf.data()),
                   r.want)
             << &r - rows;

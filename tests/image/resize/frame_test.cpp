@@ -23,7 +23,7 @@ int64_t gcd(int64_t a, int64_t b) { return b ? gcd(b, a % b) : a; }
 
 struct Sizes {
     ZorStatus st;
-    int64_t spec, init;
+    int64_t record, init;
 };
 
 Sizes model_sizes(ZoriSize s, ZoriSize d, int interp, int aa) {
@@ -41,14 +41,14 @@ Sizes model_sizes(ZoriSize s, ZoriSize d, int interp, int aa) {
         const int t0 = interp == 2 ? 2 : interp == 6 ? 4 : 6;
         const int64_t tx = sx <= 1 ? t0 : 2 * (int64_t)ceil(t0 * sx);
         const int64_t ty = sy <= 1 ? t0 : 2 * (int64_t)ceil(t0 * sy);
-        r.spec = 368 + 4 * (aw + ah) + a32(4 * dw * tx) + a32(4 * dh * ty) +
+        r.record = 368 + 4 * (aw + ah) + a32(4 * dw * tx) + a32(4 * dh * ty) +
                  (sx <= 1 && interp == 2 ? a32(4 * dw) : 0);
         r.init = 64 + 8 * (aw + ah);
     } else if (interp == 1 || interp == 2) {
-        r.spec = 368 + 4 * interp * (aw + ah);
+        r.record = 368 + 4 * interp * (aw + ah);
     } else if (filter) {
         const int64_t k = interp == 6 ? 4 : 6, pad = interp == 6 ? 96 : 160;
-        r.spec = 368 + 4 * (aw + ah) + 4 * (a32(k * dw + pad) + a32(k * dh + pad));
+        r.record = 368 + 4 * (aw + ah) + 4 * (a32(k * dw + pad) + a32(k * dh + pad));
         r.init = 64 + 4 * (aw + ah);
     } else {
         if (s.width < d.width || s.height < d.height) return {zorStsSizeErr, 0, 0};
@@ -57,9 +57,9 @@ Sizes model_sizes(ZoriSize s, ZoriSize d, int interp, int aa) {
             return dr * (sr / dr + (m == 0 ? 0 : m == 1 ? 1 : 2));
         };
         const int64_t nx = n(s.width, d.width), ny = n(s.height, d.height);
-        r.spec = 368 + 4 * (a32(nx) + nx + ny + a32(ny));
+        r.record = 368 + 4 * (a32(nx) + nx + ny + a32(ny));
     }
-    if (r.spec >= 0x7FFFFFFF || r.init >= 0x7FFFFFFF) return {zorStsExceededSizeErr, 0, 0};
+    if (r.record >= 0x7FFFFFFF || r.init >= 0x7FFFFFFF) return {zorStsExceededSizeErr, 0, 0};
     return r;
 }
 
@@ -77,11 +77,11 @@ TEST(ResizeFrame, GetSizeFollowsTheFormulas) {
         const Sizes want = model_sizes(s, d, interp, aa);
         const bool written = want.st == zorStsNoErr || want.st == zorStsNoAntialiasing;
         for (auto query : {zoriResizeGetSize_8u, zoriResizeGetSize_32f}) {
-            int32_t spec = -7, init = -7;
-            ASSERT_EQ(query(s, d, (ZoriInterpolationType)interp, aa, &spec, &init), want.st)
+            int32_t record = -7, init = -7;
+            ASSERT_EQ(query(s, d, (ZoriInterpolationType)interp, aa, &record, &init), want.st)
                 << s.width << "x" << s.height << " -> " << d.width << "x" << d.height << " method "
                 << interp << " aa " << aa;
-            ASSERT_TRUE(spec == (written ? want.spec : -7) && init == (written ? want.init : -7));
+            ASSERT_TRUE(record == (written ? want.record : -7) && init == (written ? want.init : -7));
         }
     }
 }
@@ -127,7 +127,7 @@ void nearest_case(ZoriSize src, ZoriSize dst, uint32_t seed, const zortest::Leve
     const bool alt = seed & 1;
     zortest::ResizeRecord rec = zortest::resize_record(src, dst, zoriInterNN, seed % 64);
     zorSetCpuFeatures(initLevel.select);
-    ASSERT_EQ((alt ? zoriResizeNearestInit_32f : zoriResizeNearestInit_8u)(src, dst, rec.spec()),
+    ASSERT_EQ((alt ? zoriResizeNearestInit_32f : zoriResizeNearestInit_8u)(src, dst, rec.record()),
               zorStsNoErr);
     zorSetCpuFeatures(runLevel.select);
     // Steps with slack (odd for 8u), the destination off its element
@@ -153,15 +153,15 @@ void nearest_case(ZoriSize src, ZoriSize dst, uint32_t seed, const zortest::Leve
     for (const ZoriRect& t : tiles)
         most = {std::max(most.width, t.width), std::max(most.height, t.height)};
     int32_t bufSize = 0;
-    std::vector<uint8_t> buf = zortest::resize_buffer(rec.spec(), most, &bufSize);
+    std::vector<uint8_t> buf = zortest::resize_buffer(rec.record(), most, &bufSize);
     for (const ZoriRect& t : tiles) {
         const int32_t lx = t.x + t.width, ly = t.y + t.height;
         ZoriPoint o{-1, -1}, ro{-1, -1};
         ZoriSize rs{-1, -1};
-        ASSERT_EQ((alt ? zoriResizeGetSrcOffset_32f : zoriResizeGetSrcOffset_8u)(rec.spec(),
+        ASSERT_EQ((alt ? zoriResizeGetSrcOffset_32f : zoriResizeGetSrcOffset_8u)(rec.record(),
                                                                                  {t.x, t.y}, &o),
                   zorStsNoErr);
-        ASSERT_EQ(zoriResizeGetSrcRoi_8u(rec.spec(), {t.x, t.y}, {t.width, t.height}, &ro, &rs),
+        ASSERT_EQ(zoriResizeGetSrcRoi_8u(rec.record(), {t.x, t.y}, {t.width, t.height}, &ro, &rs),
                   zorStsNoErr);
         // The source rectangle runs to the last centre's pixel, or to the
         // source's end for a tile at the destination's last column or row.
@@ -177,7 +177,7 @@ void nearest_case(ZoriSize src, ZoriSize dst, uint32_t seed, const zortest::Leve
         // clipped, and 48.
         const bool over = (seed & 4) && lx == dst.width;
         ASSERT_EQ(run(s.ptr(o.x, o.y), s.step, out.ptr(t.x, t.y), out.step, {t.x, t.y},
-                      {over ? dst.width + 1 : t.width, t.height}, rec.spec(), buf.data()),
+                      {over ? dst.width + 1 : t.width, t.height}, rec.record(), buf.data()),
                   over ? zorStsSizeWrn : zorStsNoErr);
     }
     ASSERT_TRUE(same_bytes(out, want));
@@ -223,8 +223,8 @@ TEST_P(ResizeNearest, TilesMatchTheModel) {
 // A nearest record 8x6 -> 5x4, its id (the first word) then set.
 zortest::ResizeRecord nearest_record(uint32_t id = 0x4B617389u) {
     zortest::ResizeRecord r = zortest::resize_record({8, 6}, {5, 4}, zoriInterNN);
-    EXPECT_EQ(zoriResizeNearestInit_8u({8, 6}, {5, 4}, r.spec()), zorStsNoErr);
-    memcpy((void*)(((uintptr_t)r.spec() + 63) & ~(uintptr_t)63), &id, 4);
+    EXPECT_EQ(zoriResizeNearestInit_8u({8, 6}, {5, 4}, r.record()), zorStsNoErr);
+    memcpy((void*)(((uintptr_t)r.record() + 63) & ~(uintptr_t)63), &id, 4);
     return r;
 }
 
@@ -236,7 +236,7 @@ TEST(ResizeFrame, QueriesCheckInOrder) {
     int32_t a = -7, b = -7;
     ZoriPoint p{-7, -7};
     ZoriSize z{-7, -7};
-    ZoriResizeSpec *sp = rec.spec(), *bp = bad.spec();
+    ZoriResizeSpec *sp = rec.record(), *bp = bad.record();
     const ZoriInterpolationType nn = zoriInterNN, no = (ZoriInterpolationType)3;
     zortest::run_checks(
         {{zorStsNullPtrErr, "size", CALL(zoriResizeGetSize_8u({0, 1}, {1, 1}, no, 0, nullptr, &b))},
@@ -292,11 +292,11 @@ TEST_P(ResizeNearest, OperationsCheckInOrderWriteNothing) {
         zortest::ResizeRecord rec = nearest_record(), bad = nearest_record(0);
         // A record of another method, once linear exists.
         zortest::ResizeRecord other = zortest::resize_record({8, 6}, {5, 4}, zoriInterLinear);
-        const bool linear = zoriResizeLinearInit_8u({8, 6}, {5, 4}, other.spec()) == zorStsNoErr;
+        const bool linear = zoriResizeLinearInit_8u({8, 6}, {5, 4}, other.record()) == zorStsNoErr;
         Image<T> src(8, 6), dst(5, 4);
         const Image<T> before = dst;
-        std::vector<uint8_t> buf = zortest::resize_buffer(rec.spec(), {5, 4});
-        const ZoriResizeSpec *sp = rec.spec(), *bp = bad.spec(), *op = other.spec();
+        std::vector<uint8_t> buf = zortest::resize_buffer(rec.record(), {5, 4});
+        const ZoriResizeSpec *sp = rec.record(), *bp = bad.record(), *op = other.record();
         const T* s = src.ptr();
         T* d = dst.ptr();
         Zor8u* b = buf.data();
@@ -304,7 +304,7 @@ TEST_P(ResizeNearest, OperationsCheckInOrderWriteNothing) {
         std::vector<zortest::CheckRow> rows = {
             {zorStsNullPtrErr, "src", CALL(run(nullptr, 1, d, ds, {0, 0}, {0, 4}, bp, b))},
             {zorStsNullPtrErr, "dst", CALL(run(s, 1, nullptr, ds, {0, 0}, {0, 4}, bp, b))},
-            {zorStsNullPtrErr, "spec", CALL(run(s, 1, d, ds, {0, 0}, {0, 4}, nullptr, b))},
+            {zorStsNullPtrErr, "record", CALL(run(s, 1, d, ds, {0, 0}, {0, 4}, nullptr, b))},
             {zorStsNullPtrErr, "buffer", CALL(run(s, 1, d, ds, {0, 0}, {0, 4}, bp, nullptr))},
             {zorStsNoOperation, "zero, id", CALL(run(s, 1, d, ds, {-1, 0}, {5, 0}, bp, b))},
             {zorStsContextMatchErr, "id", CALL(run(s, 1, d, ds, {-1, 0}, {-5, 4}, bp, b))},

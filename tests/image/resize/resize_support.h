@@ -17,7 +17,7 @@ struct ResizeRecord {
     std::vector<uint8_t> mem, init;
     size_t offset = 0;  // of the record in mem
     int32_t specSize = 0, initSize = 0;
-    ZoriResizeSpec* spec() { return (ZoriResizeSpec*)(mem.data() + offset); }
+    ZoriResizeSpec* record() { return (ZoriResizeSpec*)(mem.data() + offset); }
     Zor8u* initBuf() { return init.data(); }
 };
 
@@ -40,10 +40,10 @@ inline bool record_guards_intact(const ResizeRecord& r) {
 }
 
 // A work buffer of the queried size for tiles up to `tile`, guard behind.
-inline std::vector<uint8_t> resize_buffer(const ZoriResizeSpec* spec, ZoriSize tile,
+inline std::vector<uint8_t> resize_buffer(const ZoriResizeSpec* record, ZoriSize tile,
                                           int32_t* size = nullptr) {
     int32_t n = 0;
-    const ZorStatus st = zoriResizeGetBufferSize_8u(spec, tile, 1, &n);
+    const ZorStatus st = zoriResizeGetBufferSize_8u(record, tile, 1, &n);
     EXPECT_TRUE(st == zorStsNoErr || st == zorStsSizeWrn) << st;
     if (size) *size = n;
     return guarded((size_t)n);
