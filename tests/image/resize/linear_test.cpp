@@ -86,12 +86,13 @@ template <typename T> bool same(T a, T b) {
 // differs by at most 2 ulp of its inputs' magnitude, the vertical one
 // carries the horizontal one's difference.
 template <typename T>
-void run_case(Path path, ZoriSize S, ZoriSize D, int32_t border, bool fused, Rng& rng, int round = FE_TONEAREST) {
+void run_case(Path path, ZoriSize S, ZoriSize D, int32_t border, bool fused, Rng& rng, int round = FE_TONEAREST, bool stripes = false) {
     zortest::ResizeRecord rec = zortest::resize_record(S, D, zoriInterLinear, rng.below(64));
     ASSERT_EQ((path == kQ14 ? zoriResizeLinearInit_8u : zoriResizeLinearInit_32f)(S, D, rec.spec()), zorStsNoErr);
     ASSERT_TRUE(zortest::record_guards_intact(rec));
     Image<T> src(S.width + 2, S.height + 2, 0, rng.below(8) * sizeof(T));
     src.randomize(rng);
+    if (stripes) src.fill([](int x, int y) { return 5 + ((x + y) & 1); });
     Image<T> got(D.width, D.height, (D.width + (int32_t)rng.below(5)) * sizeof(T), rng.below(4) * sizeof(T));
     Image<T> want = got, loose = got;
     Model<T> m{src, S.width, S.height, border, path, fused, taps(S.width, D.width), taps(S.height, D.height)};
@@ -171,6 +172,9 @@ TEST_P(Linear, SizesBordersAndTilesMatchTheModel) {
                 else
                     ASSERT_NO_FATAL_FAILURE(run_case<Zor8u>(path, S, D, kBorders[++k % 9], fused, rng));
             }
+    // An edge weight of 8191 between 5 and 6: the odd integer part makes
+    // 5 + 8191/16384 round up.
+    ASSERT_NO_FATAL_FAILURE(run_case<Zor8u>(kQ14, {2, 2}, {16384, 4}, 1, fused, rng, FE_TONEAREST, true));
 }
 
 // Sources against unreadable pages, rows back to back: the replicated
