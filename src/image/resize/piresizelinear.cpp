@@ -91,8 +91,9 @@ struct Q14 {
     uint8_t along_y(uint8_t a, uint8_t b, int32_t y) const {
         return round14((a << 14) + (b - a) * cy[y]);
     }
-    void hpass(const uint8_t* s, const int32_t* lx, int32_t x, Row* out, int32_t n) const {
-        hpass_q14(s, lx, cx + 2 * x, out, n);
+    void hpass(const uint8_t* s, const int32_t* lx, int32_t x, Row* out, int32_t n,
+               bool contiguous) const {
+        hpass_q14(s, lx, cx + 2 * x, out, n, contiguous);
     }
     void vpass(const Row* r0, const Row* r1, int32_t y, uint8_t* d, int32_t n) const {
         vpass_q14(r0, r1, cy[y], d, n);
@@ -112,7 +113,7 @@ template <typename T> struct Float {
     }
     T along_x(T a, T b, int32_t x) const { return out(lerp((float)a, (float)b, cx[x])); }
     T along_y(T a, T b, int32_t y) const { return out(lerp((float)a, (float)b, cy[y])); }
-    void hpass(const T* s, const int32_t* lx, int32_t x, Row* out, int32_t n) const {
+    void hpass(const T* s, const int32_t* lx, int32_t x, Row* out, int32_t n, bool) const {
         hpass_float(s, lx, cx + x, out, n);
     }
     void vpass(const Row* r0, const Row* r1, int32_t y, T* d, int32_t n) const {
@@ -163,16 +164,19 @@ template <typename A>
 void core(const A& ar, const typename A::Pixel* pSrc, int32_t srcStep, typename A::Pixel* pDst,
           int32_t dstStep, const int32_t* lx, const int32_t* ly, int32_t x, int32_t y0,
           int32_t w, int32_t h, typename A::Row* cur, typename A::Row* next) {
+    // Whether the pairs leave no column between them unread (ratios up to 2).
+    bool contiguous = true;
+    for (int32_t i = 1; i < w; ++i) contiguous &= lx[i] - lx[i - 1] <= 2;
     int32_t prev = ly[0] - 1;
-    ar.hpass(row_at(pSrc, srcStep, prev + 1), lx, x, next, w);
+    ar.hpass(row_at(pSrc, srcStep, prev + 1), lx, x, next, w, contiguous);
     for (int32_t j = 0; j < h; ++j) {
         const int32_t y = ly[j];
         if (y > prev) {
             typename A::Row* const t = cur;
             cur = next;
             next = t;
-            ar.hpass(row_at(pSrc, srcStep, y + 1), lx, x, next, w);
-            if (y > prev + 1) ar.hpass(row_at(pSrc, srcStep, y), lx, x, cur, w);
+            ar.hpass(row_at(pSrc, srcStep, y + 1), lx, x, next, w, contiguous);
+            if (y > prev + 1) ar.hpass(row_at(pSrc, srcStep, y), lx, x, cur, w, contiguous);
             prev = y;
         }
         ar.vpass(cur, next, y0 + j, row_at(pDst, dstStep, j), w);

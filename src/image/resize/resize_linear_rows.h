@@ -17,21 +17,73 @@ namespace linear {
 
 // ---- level helpers (candidates for the vector layer) --------------------------------
 
-// Adjacent 16-bit products summed into 32-bit lanes (pmaddwd), at the
-// width of the level's integer vectors.
-inline simd::ivec<int32_t> madd16(simd::ivec<int16_t> a, simd::ivec<int16_t> b) {
+typedef simd::ivec<int16_t> VW;
+typedef simd::ivec<int32_t> VI;
+typedef simd::ivec<uint8_t> VB;
+constexpr int kIntLanes = simd::Lanes<VI>::count;  // 32-bit lanes of an integer vector
+
 #if ZOR_INT_VECTOR_BYTES == 64
-    return (simd::ivec<int32_t>)_mm512_madd_epi16((__m512i)a, (__m512i)b);
+typedef __m512i IV;
+#define ZOR_LIN_I(op) _mm512_##op
 #elif ZOR_INT_VECTOR_BYTES == 32
-    return (simd::ivec<int32_t>)_mm256_madd_epi16((__m256i)a, (__m256i)b);
+typedef __m256i IV;
+#define ZOR_LIN_I(op) _mm256_##op
 #else
-    return (simd::ivec<int32_t>)_mm_madd_epi16((__m128i)a, (__m128i)b);
+typedef __m128i IV;
+#define ZOR_LIN_I(op) _mm_##op
+#endif
+
+// Adjacent 16-bit products summed into 32-bit lanes (pmaddwd).
+inline VI madd16(VW a, VW b) { return (VI)ZOR_LIN_I(madd_epi16)((IV)a, (IV)b); }
+// Interleaved 16-bit lanes of the low or high half of each 128-bit lane.
+inline VW unpack_lo16(VW a, VW b) { return (VW)ZOR_LIN_I(unpacklo_epi16)((IV)a, (IV)b); }
+inline VW unpack_hi16(VW a, VW b) { return (VW)ZOR_LIN_I(unpackhi_epi16)((IV)a, (IV)b); }
+// Saturating narrowing, per 128-bit lane: lane c of the result is lane c
+// of a, then lane c of b.
+inline VW pack32(VI a, VI b) { return (VW)ZOR_LIN_I(packs_epi32)((IV)a, (IV)b); }
+inline VB packu16(VW a, VW b) { return (VB)ZOR_LIN_I(packus_epi16)((IV)a, (IV)b); }
+// After pack32 or packu16 of two consecutive vectors: their 64-bit halves
+// back in row order.
+template <typename V> inline V row_order(V v) {
+#if ZOR_INT_VECTOR_BYTES == 64
+    return (V)_mm512_permutexvar_epi64(_mm512_setr_epi64(0, 2, 4, 6, 1, 3, 5, 7), (IV)v);
+#elif ZOR_INT_VECTOR_BYTES == 32
+    return (V)_mm256_permute4x64_epi64((IV)v, 0xD8);
+#else
+    return v;
 #endif
 }
 
+#if ZOR_HAS_SSSE3
+// Byte shuffle within each 128-bit lane (pshufb); a control byte with the
+// top bit set gives 0.
+inline VB shuffle8(VB v, VB control) { return (VB)ZOR_LIN_I(shuffle_epi8)((IV)v, (IV)control); }
+// Lane 0 of each 128-bit lane, repeated over it.
+inline VI lane_first(VI v) {
+#if ZOR_INT_VECTOR_BYTES == 64
+    return (VI)_mm512_shuffle_epi32((IV)v, _MM_PERM_AAAA);
+#else
+    return (VI)ZOR_LIN_I(shuffle_epi32)((IV)v, 0);
+#endif
+}
+// 16 bytes at each of at[0], at[4], ... into the 128-bit lanes in turn.
+inline VB windows16(const uint8_t* s, const int32_t* at) {
+#if ZOR_INT_VECTOR_BYTES == 64
+    __m512i v = _mm512_castsi128_si512(_mm_loadu_si128((const __m128i*)(s + at[0])));
+    v = _mm512_inserti32x4(v, _mm_loadu_si128((const __m128i*)(s + at[4])), 1);
+    v = _mm512_inserti32x4(v, _mm_loadu_si128((const __m128i*)(s + at[8])), 2);
+    return (VB)_mm512_inserti32x4(v, _mm_loadu_si128((const __m128i*)(s + at[12])), 3);
+#elif ZOR_INT_VECTOR_BYTES == 32
+    return (VB)_mm256_loadu2_m128i((const __m128i*)(s + at[4]), (const __m128i*)(s + at[0]));
+#else
+    return (VB)_mm_loadu_si128((const __m128i*)(s + at[0]));
+#endif
+}
+#endif
+#undef ZOR_LIN_I
+
 typedef simd::vec<ZOR_VECTOR_BYTES, float> VF;
 typedef simd::vec<ZOR_VECTOR_BYTES, int32_t> VFI;  // int32 lanes beside VF's
-typedef simd::vec<ZOR_VECTOR_BYTES, double> VD;
 constexpr int kLanes = simd::Lanes<VF>::count;
 
 // Float lanes to int32 in the current rounding mode (cvtps2dq).
@@ -79,74 +131,107 @@ inline uint16_t pair_8u(const uint8_t* p) {
 
 // ---- 8u, 14-bit fixed point ------------------------------------------------------------
 
-// out[i] = (a * w0 + b * w1 + 128) >> 8 for the pair (a, b) at lx[i] and the
-// weight pair i. The pairs are gathered into the row first (2 bytes each,
-// as wide as the result), then blended in place by pmaddwd.
-inline void hpass_q14(const uint8_t* s, const int32_t* lx, const uint16_t* wpairs, uint16_t* out,
-                      int32_t n) {
-    for (int32_t i = 0; i < n; ++i) out[i] = pair_8u(s + lx[i]);
-    typedef simd::ivec<int16_t> VW;
-    typedef simd::ivec<int32_t> VI;
-    constexpr int L = simd::Lanes<VI>::count;
-    typedef simd::vec<2 * L, uint8_t> VB;
-    typedef simd::vec<2 * L, uint16_t> VR;
-    int32_t i = 0;
-    for (; i + L <= n; i += L) {
-        const VW p = __builtin_convertvector(simd::load<VB>(out + i), VW);
-        const VI m = madd16(p, simd::load<VW>(wpairs + 2 * i));
-        simd::store(out + i, __builtin_convertvector((m + 128) >> 8, VR));
-    }
-    for (; i < n; ++i) {
-        const int32_t a = out[i] & 255, b = out[i] >> 8;
-        out[i] = (uint16_t)((a * wpairs[2 * i] + b * wpairs[2 * i + 1] + 128) >> 8);
-    }
+inline uint16_t blend_q14(int32_t a, int32_t b, const uint16_t* w) {
+    return (uint16_t)((a * w[0] + b * w[1] + 128) >> 8);
 }
 
-// d[i] = (r0 * (16384 - w) + r1 * w + 0x80000) >> 20; the rows hold at most
-// 16320, so the result is already within 0..255.
+// out[i] = (a * w0 + b * w1 + 128) >> 8 for the pair (a, b) at lx[i] and
+// weight pair i, two integer vectors of results a step. Where every step
+// of lx is at most 2 (no column between two pairs goes unread), each
+// 128-bit lane takes 16 bytes from its first pair on and picks its four
+// pairs with pshufb, as long as those bytes stay within the row's pairs.
+// Elsewhere the pairs are gathered into the row first (2 bytes each, as
+// wide as the result) and blended in place.
+inline void hpass_q14(const uint8_t* s, const int32_t* lx, const uint16_t* wpairs, uint16_t* out,
+                      int32_t n, bool contiguous) {
+    constexpr int L = kIntLanes;
+    int32_t i = 0;
+#if ZOR_HAS_SSSE3
+    if (contiguous) {
+        const int32_t last = lx[n - 1] + 1;
+        const VI spread = simd::broadcast<VI>((int32_t)0x80018000);
+        for (; i + 2 * L <= n && lx[i + 2 * L - 4] + 15 <= last; i += 2 * L) {
+            VI r[2];
+            for (int h = 0; h < 2; ++h) {
+                const VI at = simd::load<VI>(lx + i + h * L), d = at - lane_first(at);
+                // Bytes (d, zero, d + 1, zero): the pair as two 16-bit lanes.
+                const VB pairs = shuffle8(windows16(s, lx + i + h * L), (VB)(d + (d << 16) + spread));
+                r[h] = (madd16((VW)pairs, simd::load<VW>(wpairs + 2 * (i + h * L))) + 128) >> 8;
+            }
+            simd::store(out + i, row_order(pack32(r[0], r[1])));
+        }
+    }
+#endif
+    (void)contiguous;
+    for (int32_t k = i; k < n; ++k) out[k] = pair_8u(s + lx[k]);
+    typedef simd::vec<2 * L, uint8_t> VH;  // L pairs
+    for (; i + 2 * L <= n; i += 2 * L) {
+        VI r[2];
+        for (int h = 0; h < 2; ++h) {
+            const VW p = __builtin_convertvector(simd::load<VH>(out + i + h * L), VW);
+            r[h] = (madd16(p, simd::load<VW>(wpairs + 2 * (i + h * L))) + 128) >> 8;
+        }
+        simd::store(out + i, row_order(pack32(r[0], r[1])));
+    }
+    for (; i < n; ++i) out[i] = blend_q14(out[i] & 255, out[i] >> 8, wpairs + 2 * i);
+}
+
+// d[i] = (r0 * (16384 - w) + r1 * w + 0x80000) >> 20 with the rows
+// interleaved for pmaddwd; the rows hold at most 16320, so the result is
+// already within 0..255.
 inline void vpass_q14(const uint16_t* r0, const uint16_t* r1, int32_t w, uint8_t* d, int32_t n) {
-    typedef simd::ivec<int16_t> VW;
-    typedef simd::ivec<int32_t> VI;
-    typedef simd::ivec<uint32_t> VU;
-    constexpr int L = simd::Lanes<VI>::count;
-    typedef simd::vec<2 * L, uint16_t> VR;
-    typedef simd::vec<L, uint8_t> VO;
-    const VI wv = simd::broadcast<VI>((int32_t)(((uint32_t)w << 16) | (uint32_t)(16384 - w)));
+    constexpr int L = 2 * kIntLanes;  // 16-bit lanes
+    const VW wv = (VW)simd::broadcast<VI>((int32_t)(((uint32_t)w << 16) | (uint32_t)(16384 - w)));
+    const VI half = simd::broadcast<VI>(0x80000);
     int32_t i = 0;
     for (; i + 2 * L <= n; i += 2 * L) {
-        const VU a0 = __builtin_convertvector(simd::load<VR>(r0 + i), VU);
-        const VU b0 = __builtin_convertvector(simd::load<VR>(r1 + i), VU);
-        const VU a1 = __builtin_convertvector(simd::load<VR>(r0 + i + L), VU);
-        const VU b1 = __builtin_convertvector(simd::load<VR>(r1 + i + L), VU);
-        const VI m0 = madd16((VW)(a0 | (b0 << 16)), (VW)wv);
-        const VI m1 = madd16((VW)(a1 | (b1 << 16)), (VW)wv);
-        simd::store(d + i, __builtin_convertvector((m0 + 0x80000) >> 20, VO));
-        simd::store(d + i + L, __builtin_convertvector((m1 + 0x80000) >> 20, VO));
+        VW v[2];
+        for (int h = 0; h < 2; ++h) {
+            const VW a = simd::load<VW>(r0 + i + h * L), b = simd::load<VW>(r1 + i + h * L);
+            v[h] = pack32((madd16(unpack_lo16(a, b), wv) + half) >> 20,
+                          (madd16(unpack_hi16(a, b), wv) + half) >> 20);
+        }
+        simd::store(d + i, row_order(packu16(v[0], v[1])));
     }
     for (; i < n; ++i) d[i] = (uint8_t)((r0[i] * (16384 - w) + r1[i] * w + 0x80000) >> 20);
 }
 
 // ---- float rows -------------------------------------------------------------------------
 
-// kLanes pixel pairs of a float row as the a and b vectors: two 8-byte
-// loads per pair into double lanes, ordered so that an in-lane even/odd
-// split (shufps per 128 bits) gives the lanes in row order.
+// Two pixel pairs of a float row (at s + i0 and s + i1) as one vector
+// [a0 b0 a1 b1].
+inline __m128 two_pairs(const float* s, int32_t i0, int32_t i1) {
+    double p0, p1;
+    memcpy(&p0, s + i0, 8);
+    memcpy(&p1, s + i1, 8);
+    return _mm_castpd_ps(_mm_set_pd(p1, p0));
+}
+
+// kLanes pixel pairs of a float row as the a and b vectors: the pairs
+// placed so that an even/odd split within each 128-bit lane gives the
+// lanes in row order.
 inline void gather_pairs(const float* s, const int32_t* lx, VF* a, VF* b) {
-    constexpr int H = kLanes / 2;  // pairs per double vector
-    VD q0, q1;
-    for (int k = 0; k < H; ++k) {
-        const int at = 4 * (k / 2) + (k % 2);
-        q0[k] = pixel((const double*)(s + lx[at]));
-        q1[k] = pixel((const double*)(s + lx[at + 2]));
-    }
-    simd::vec<ZOR_VECTOR_BYTES, int32_t> even, odd;
-    for (int m = 0; m < kLanes; ++m) {
-        const int c = 4 * (m / 4), t = m % 4;
-        even[m] = t < 2 ? c + 2 * t : kLanes + c + 2 * (t - 2);
-        odd[m] = even[m] + 1;
-    }
-    *a = __builtin_shuffle((VF)q0, (VF)q1, even);
-    *b = __builtin_shuffle((VF)q0, (VF)q1, odd);
+#if ZOR_VECTOR_BYTES == 64
+    __m512 x0 = _mm512_castps128_ps512(two_pairs(s, lx[0], lx[1]));
+    __m512 x1 = _mm512_castps128_ps512(two_pairs(s, lx[2], lx[3]));
+    x0 = _mm512_insertf32x4(x0, two_pairs(s, lx[4], lx[5]), 1);
+    x1 = _mm512_insertf32x4(x1, two_pairs(s, lx[6], lx[7]), 1);
+    x0 = _mm512_insertf32x4(x0, two_pairs(s, lx[8], lx[9]), 2);
+    x1 = _mm512_insertf32x4(x1, two_pairs(s, lx[10], lx[11]), 2);
+    x0 = _mm512_insertf32x4(x0, two_pairs(s, lx[12], lx[13]), 3);
+    x1 = _mm512_insertf32x4(x1, two_pairs(s, lx[14], lx[15]), 3);
+    *a = (VF)_mm512_shuffle_ps(x0, x1, 0x88);
+    *b = (VF)_mm512_shuffle_ps(x0, x1, 0xDD);
+#elif ZOR_VECTOR_BYTES == 32
+    const __m256 x0 = _mm256_set_m128(two_pairs(s, lx[4], lx[5]), two_pairs(s, lx[0], lx[1]));
+    const __m256 x1 = _mm256_set_m128(two_pairs(s, lx[6], lx[7]), two_pairs(s, lx[2], lx[3]));
+    *a = (VF)_mm256_shuffle_ps(x0, x1, 0x88);
+    *b = (VF)_mm256_shuffle_ps(x0, x1, 0xDD);
+#else
+    const __m128 x0 = two_pairs(s, lx[0], lx[1]), x1 = two_pairs(s, lx[2], lx[3]);
+    *a = (VF)_mm_shuffle_ps(x0, x1, 0x88);
+    *b = (VF)_mm_shuffle_ps(x0, x1, 0xDD);
+#endif
 }
 
 inline void gather_pairs(const uint8_t* s, const int32_t* lx, VF* a, VF* b) {
