@@ -150,28 +150,28 @@ inline void hpass_q14(const uint8_t* s, const int32_t* lx, const uint16_t* wpair
     if (contiguous) {
         const int32_t last = lx[n - 1] + 1;
         const VI spread = simd::broadcast<VI>((int32_t)0x80018000);
+        // Bytes (d, zero, d + 1, zero): each pair as two 16-bit lanes.
+        auto blend = [&](int32_t at) {
+            const VI x = simd::load<VI>(lx + at), d = x - lane_first(x);
+            const VB pairs = shuffle8(windows16(s, lx + at), (VB)(d + (d << 16) + spread));
+            return (madd16((VW)pairs, simd::load<VW>(wpairs + 2 * at)) + 128) >> 8;
+        };
         for (; i + 2 * L <= n && lx[i + 2 * L - 4] + 15 <= last; i += 2 * L) {
-            VI r[2];
-            for (int h = 0; h < 2; ++h) {
-                const VI at = simd::load<VI>(lx + i + h * L), d = at - lane_first(at);
-                // Bytes (d, zero, d + 1, zero): the pair as two 16-bit lanes.
-                const VB pairs = shuffle8(windows16(s, lx + i + h * L), (VB)(d + (d << 16) + spread));
-                r[h] = (madd16((VW)pairs, simd::load<VW>(wpairs + 2 * (i + h * L))) + 128) >> 8;
-            }
-            simd::store(out + i, row_order(pack32(r[0], r[1])));
+            const VI r0 = blend(i), r1 = blend(i + L);
+            simd::store(out + i, row_order(pack32(r0, r1)));
         }
     }
 #endif
     (void)contiguous;
     for (int32_t k = i; k < n; ++k) out[k] = pair_8u(s + lx[k]);
     typedef simd::vec<2 * L, uint8_t> VH;  // L pairs
+    auto blend = [&](int32_t at) {
+        const VW p = __builtin_convertvector(simd::load<VH>(out + at), VW);
+        return (madd16(p, simd::load<VW>(wpairs + 2 * at)) + 128) >> 8;
+    };
     for (; i + 2 * L <= n; i += 2 * L) {
-        VI r[2];
-        for (int h = 0; h < 2; ++h) {
-            const VW p = __builtin_convertvector(simd::load<VH>(out + i + h * L), VW);
-            r[h] = (madd16(p, simd::load<VW>(wpairs + 2 * (i + h * L))) + 128) >> 8;
-        }
-        simd::store(out + i, row_order(pack32(r[0], r[1])));
+        const VI r0 = blend(i), r1 = blend(i + L);
+        simd::store(out + i, row_order(pack32(r0, r1)));
     }
     for (; i < n; ++i) out[i] = blend_q14(out[i] & 255, out[i] >> 8, wpairs + 2 * i);
 }
@@ -184,14 +184,14 @@ inline void vpass_q14(const uint16_t* r0, const uint16_t* r1, int32_t w, uint8_t
     const VW wv = (VW)simd::broadcast<VI>((int32_t)(((uint32_t)w << 16) | (uint32_t)(16384 - w)));
     const VI half = simd::broadcast<VI>(0x80000);
     int32_t i = 0;
+    auto blend = [&](int32_t at) {
+        const VW a = simd::load<VW>(r0 + at), b = simd::load<VW>(r1 + at);
+        return pack32((madd16(unpack_lo16(a, b), wv) + half) >> 20,
+                      (madd16(unpack_hi16(a, b), wv) + half) >> 20);
+    };
     for (; i + 2 * L <= n; i += 2 * L) {
-        VW v[2];
-        for (int h = 0; h < 2; ++h) {
-            const VW a = simd::load<VW>(r0 + i + h * L), b = simd::load<VW>(r1 + i + h * L);
-            v[h] = pack32((madd16(unpack_lo16(a, b), wv) + half) >> 20,
-                          (madd16(unpack_hi16(a, b), wv) + half) >> 20);
-        }
-        simd::store(d + i, row_order(packu16(v[0], v[1])));
+        const VW v0 = blend(i), v1 = blend(i + L);
+        simd::store(d + i, row_order(packu16(v0, v1)));
     }
     for (; i < n; ++i) d[i] = (uint8_t)((r0[i] * (16384 - w) + r1[i] * w + 0x80000) >> 20);
 }
