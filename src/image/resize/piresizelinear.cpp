@@ -92,10 +92,10 @@ struct Q14 {
         return round14((a << 14) + (b - a) * cy[y]);
     }
     void hpass(const uint8_t* s, const int32_t* lx, int32_t x, Row* out, int32_t n,
-               bool contiguous) const {
-        hpass_q14(s, lx, cx + 2 * x, out, n, contiguous);
+               Columns columns) const {
+        hpass_q14(s, lx, cx + 2 * x, out, n, columns);
     }
-    void vpass(const Row* r0, const Row* r1, int32_t y, uint8_t* d, int32_t n) const {
+    void vpass(const Row* r0, const Row* r1, int32_t y, uint8_t* d, int32_t n, bool) const {
         vpass_q14(r0, r1, cy[y], d, n);
     }
 };
@@ -113,11 +113,12 @@ template <typename T> struct Float {
     }
     T along_x(T a, T b, int32_t x) const { return out(lerp((float)a, (float)b, cx[x])); }
     T along_y(T a, T b, int32_t y) const { return out(lerp((float)a, (float)b, cy[y])); }
-    void hpass(const T* s, const int32_t* lx, int32_t x, Row* out, int32_t n, bool) const {
-        hpass_float(s, lx, cx + x, out, n);
+    void hpass(const T* s, const int32_t* lx, int32_t x, Row* out, int32_t n,
+               Columns columns) const {
+        hpass_float(s, lx, cx + x, out, n, columns);
     }
-    void vpass(const Row* r0, const Row* r1, int32_t y, T* d, int32_t n) const {
-        vpass_float(r0, r1, cy[y], d, n);
+    void vpass(const Row* r0, const Row* r1, int32_t y, T* d, int32_t n, bool stream) const {
+        vpass_float(r0, r1, cy[y], d, n, stream);
     }
 };
 
@@ -164,23 +165,27 @@ template <typename A>
 void core(const A& ar, const typename A::Pixel* pSrc, int32_t srcStep, typename A::Pixel* pDst,
           int32_t dstStep, const int32_t* lx, const int32_t* ly, int32_t x, int32_t y0,
           int32_t w, int32_t h, typename A::Row* cur, typename A::Row* next) {
-    // Whether the pairs leave no column between them unread (ratios up to 2).
-    bool contiguous = true;
-    for (int32_t i = 1; i < w; ++i) contiguous &= lx[i] - lx[i - 1] <= 2;
+    const Columns columns = columns_of(lx, w);
+    // A destination larger than the caches is stored past them: it would
+    // only push out the source rows still to come.
+    int32_t cache = 0;
+    zorGetMaxCacheSizeB(&cache);
+    const bool stream = (int64_t)w * h * (int64_t)sizeof(typename A::Pixel) > cache;
     int32_t prev = ly[0] - 1;
-    ar.hpass(row_at(pSrc, srcStep, prev + 1), lx, x, next, w, contiguous);
+    ar.hpass(row_at(pSrc, srcStep, prev + 1), lx, x, next, w, columns);
     for (int32_t j = 0; j < h; ++j) {
         const int32_t y = ly[j];
         if (y > prev) {
             typename A::Row* const t = cur;
             cur = next;
             next = t;
-            ar.hpass(row_at(pSrc, srcStep, y + 1), lx, x, next, w, contiguous);
-            if (y > prev + 1) ar.hpass(row_at(pSrc, srcStep, y), lx, x, cur, w, contiguous);
+            ar.hpass(row_at(pSrc, srcStep, y + 1), lx, x, next, w, columns);
+            if (y > prev + 1) ar.hpass(row_at(pSrc, srcStep, y), lx, x, cur, w, columns);
             prev = y;
         }
-        ar.vpass(cur, next, y0 + j, row_at(pDst, dstStep, j), w);
+        ar.vpass(cur, next, y0 + j, row_at(pDst, dstStep, j), w, stream);
     }
+    if (stream) simd::store_fence();
 }
 
 template <typename A>

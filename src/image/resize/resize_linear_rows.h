@@ -129,6 +129,18 @@ inline uint16_t pair_8u(const uint8_t* p) {
     return v;
 }
 
+// How a block's column indices lie: steps of at most 2 leave no column
+// between pairs unread (ratios up to 2); steps of exactly 2 make the pairs
+// one run of consecutive pixels (halving).
+enum Columns { kScattered, kContiguous, kStride2 };
+
+inline Columns columns_of(const int32_t* lx, int32_t n) {
+    bool contiguous = true;
+    for (int32_t i = 1; i < n; ++i) contiguous &= lx[i] - lx[i - 1] <= 2;
+    if (!contiguous) return kScattered;
+    return lx[n - 1] - lx[0] == 2 * (n - 1) ? kStride2 : kContiguous;
+}
+
 // ---- 8u, 14-bit fixed point ------------------------------------------------------------
 
 inline uint16_t blend_q14(int32_t a, int32_t b, const uint16_t* w) {
@@ -136,18 +148,29 @@ inline uint16_t blend_q14(int32_t a, int32_t b, const uint16_t* w) {
 }
 
 // out[i] = (a * w0 + b * w1 + 128) >> 8 for the pair (a, b) at lx[i] and
-// weight pair i, two integer vectors of results a step. Where every step
-// of lx is at most 2 (no column between two pairs goes unread), each
-// 128-bit lane takes 16 bytes from its first pair on and picks its four
-// pairs with pshufb, as long as those bytes stay within the row's pairs.
-// Elsewhere the pairs are gathered into the row first (2 bytes each, as
-// wide as the result) and blended in place.
+// weight pair i, two integer vectors of results a step. Halving reads the
+// pairs straight from the row. Other contiguous columns: each 128-bit lane
+// takes 16 bytes from its first pair on and picks its four pairs with
+// pshufb, as long as those bytes stay within the row's pairs. Elsewhere
+// the pairs are gathered into the row first (2 bytes each, as wide as the
+// result) and blended in place.
 inline void hpass_q14(const uint8_t* s, const int32_t* lx, const uint16_t* wpairs, uint16_t* out,
-                      int32_t n, bool contiguous) {
+                      int32_t n, Columns columns) {
     constexpr int L = kIntLanes;
+    typedef simd::vec<2 * L, uint8_t> VH;  // L pairs
+    auto blend_run = [&](const uint8_t* pairs, int32_t at) {
+        const VW p = __builtin_convertvector(simd::load<VH>(pairs), VW);
+        return (madd16(p, simd::load<VW>(wpairs + 2 * at)) + 128) >> 8;
+    };
     int32_t i = 0;
+    if (columns == kStride2) {
+        for (; i + 2 * L <= n; i += 2 * L) {
+            const VI r0 = blend_run(s + lx[i], i), r1 = blend_run(s + lx[i + L], i + L);
+            simd::store(out + i, row_order(pack32(r0, r1)));
+        }
+    }
 #if ZOR_HAS_SSSE3
-    if (contiguous) {
+    if (columns == kContiguous) {
         const int32_t last = lx[n - 1] + 1;
         const VI spread = simd::broadcast<VI>((int32_t)0x80018000);
         // Bytes (d, zero, d + 1, zero): each pair as two 16-bit lanes.
@@ -162,15 +185,10 @@ inline void hpass_q14(const uint8_t* s, const int32_t* lx, const uint16_t* wpair
         }
     }
 #endif
-    (void)contiguous;
     for (int32_t k = i; k < n; ++k) out[k] = pair_8u(s + lx[k]);
-    typedef simd::vec<2 * L, uint8_t> VH;  // L pairs
-    auto blend = [&](int32_t at) {
-        const VW p = __builtin_convertvector(simd::load<VH>(out + at), VW);
-        return (madd16(p, simd::load<VW>(wpairs + 2 * at)) + 128) >> 8;
-    };
     for (; i + 2 * L <= n; i += 2 * L) {
-        const VI r0 = blend(i), r1 = blend(i + L);
+        const VI r0 = blend_run((const uint8_t*)(out + i), i);
+        const VI r1 = blend_run((const uint8_t*)(out + i + L), i + L);
         simd::store(out + i, row_order(pack32(r0, r1)));
     }
     for (; i < n; ++i) out[i] = blend_q14(out[i] & 255, out[i] >> 8, wpairs + 2 * i);
@@ -234,6 +252,25 @@ inline void gather_pairs(const float* s, const int32_t* lx, VF* a, VF* b) {
 #endif
 }
 
+// kLanes consecutive pairs (2 * kLanes floats from s) as a and b.
+inline void split_pairs(const float* s, VF* a, VF* b) {
+#if ZOR_VECTOR_BYTES == 64
+    const __m512i order = _mm512_setr_epi64(0, 2, 4, 6, 1, 3, 5, 7);
+    const __m512 x0 = _mm512_loadu_ps(s), x1 = _mm512_loadu_ps(s + 16);
+    *a = (VF)_mm512_permutexvar_pd(order, _mm512_castps_pd(_mm512_shuffle_ps(x0, x1, 0x88)));
+    *b = (VF)_mm512_permutexvar_pd(order, _mm512_castps_pd(_mm512_shuffle_ps(x0, x1, 0xDD)));
+#elif ZOR_VECTOR_BYTES == 32
+    const __m256 y0 = _mm256_loadu_ps(s), y1 = _mm256_loadu_ps(s + 8);
+    const __m256 x0 = _mm256_permute2f128_ps(y0, y1, 0x20), x1 = _mm256_permute2f128_ps(y0, y1, 0x31);
+    *a = (VF)_mm256_shuffle_ps(x0, x1, 0x88);
+    *b = (VF)_mm256_shuffle_ps(x0, x1, 0xDD);
+#else
+    const __m128 x0 = _mm_loadu_ps(s), x1 = _mm_loadu_ps(s + 4);
+    *a = (VF)_mm_shuffle_ps(x0, x1, 0x88);
+    *b = (VF)_mm_shuffle_ps(x0, x1, 0xDD);
+#endif
+}
+
 inline void gather_pairs(const uint8_t* s, const int32_t* lx, VF* a, VF* b) {
     VFI g;
     for (int k = 0; k < kLanes; ++k) g[k] = pair_8u(s + lx[k]);
@@ -242,8 +279,16 @@ inline void gather_pairs(const uint8_t* s, const int32_t* lx, VF* a, VF* b) {
 }
 
 template <typename T>
-inline void hpass_float(const T* s, const int32_t* lx, const float* f, float* out, int32_t n) {
+inline void hpass_float(const T* s, const int32_t* lx, const float* f, float* out, int32_t n,
+                        Columns columns) {
     int32_t i = 0;
+    if constexpr (sizeof(T) == 4)
+        if (columns == kStride2)
+            for (; i + kLanes <= n; i += kLanes) {
+                VF a, b;
+                split_pairs(s + lx[i], &a, &b);
+                simd::store(out + i, lerp(a, b, simd::load<VF>(f + i)));
+            }
     for (; i + kLanes <= n; i += kLanes) {
         VF a, b;
         gather_pairs(s, lx + i, &a, &b);
@@ -252,9 +297,21 @@ inline void hpass_float(const T* s, const int32_t* lx, const float* f, float* ou
     for (; i < n; ++i) out[i] = lerp((float)pixel(s + lx[i]), (float)pixel(s + lx[i] + 1), f[i]);
 }
 
-inline void vpass_float(const float* r0, const float* r1, float f, float* d, int32_t n) {
+// stream: store past the caches where the row allows aligned vectors (the
+// caller fences).
+inline void vpass_float(const float* r0, const float* r1, float f, float* d, int32_t n,
+                        bool stream) {
     const VF fv = simd::broadcast<VF>(f);
     int32_t i = 0;
+    if (stream && ((uintptr_t)d & 3) == 0) {
+        const int32_t head = (int32_t)((align_up(d, ZOR_VECTOR_BYTES) - d));
+        for (; i < head && i < n; ++i) {
+            const float v = lerp(r0[i], r1[i], f);
+            memcpy(d + i, &v, 4);
+        }
+        for (; i + kLanes <= n; i += kLanes)
+            simd::stream(d + i, lerp(simd::load<VF>(r0 + i), simd::load<VF>(r1 + i), fv));
+    }
     for (; i + kLanes <= n; i += kLanes)
         simd::store(d + i, lerp(simd::load<VF>(r0 + i), simd::load<VF>(r1 + i), fv));
     for (; i < n; ++i) {
@@ -264,7 +321,7 @@ inline void vpass_float(const float* r0, const float* r1, float f, float* d, int
 }
 
 // 8u results: rounded in the current mode, saturated.
-inline void vpass_float(const float* r0, const float* r1, float f, uint8_t* d, int32_t n) {
+inline void vpass_float(const float* r0, const float* r1, float f, uint8_t* d, int32_t n, bool) {
     const VF fv = simd::broadcast<VF>(f);
     const VFI lo = simd::broadcast<VFI>(0), hi = simd::broadcast<VFI>(255);
     typedef simd::vec<kLanes, uint8_t> VO;
