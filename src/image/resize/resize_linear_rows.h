@@ -54,6 +54,17 @@ template <typename V> inline V row_order(V v) {
 #endif
 }
 
+// Half a vector's worth of bytes at p, zero-extended to 16-bit lanes.
+inline VW widen8(const uint8_t* p) {
+#if ZOR_INT_VECTOR_BYTES == 64
+    return (VW)_mm512_cvtepu8_epi16(_mm256_loadu_si256((const __m256i*)p));
+#elif ZOR_INT_VECTOR_BYTES == 32
+    return (VW)_mm256_cvtepu8_epi16(_mm_loadu_si128((const __m128i*)p));
+#else
+    return (VW)_mm_unpacklo_epi8(_mm_loadl_epi64((const __m128i*)p), _mm_setzero_si128());
+#endif
+}
+
 #if ZOR_HAS_SSSE3
 // Byte shuffle within each 128-bit lane (pshufb); a control byte with the
 // top bit set gives 0.
@@ -157,10 +168,8 @@ inline uint16_t blend_q14(int32_t a, int32_t b, const uint16_t* w) {
 inline void hpass_q14(const uint8_t* s, const int32_t* lx, const uint16_t* wpairs, uint16_t* out,
                       int32_t n, Columns columns) {
     constexpr int L = kIntLanes;
-    typedef simd::vec<2 * L, uint8_t> VH;  // L pairs
     auto blend_run = [&](const uint8_t* pairs, int32_t at) {
-        const VW p = __builtin_convertvector(simd::load<VH>(pairs), VW);
-        return (madd16(p, simd::load<VW>(wpairs + 2 * at)) + 128) >> 8;
+        return (madd16(widen8(pairs), simd::load<VW>(wpairs + 2 * at)) + 128) >> 8;
     };
     int32_t i = 0;
     if (columns == kStride2) {
