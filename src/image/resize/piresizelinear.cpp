@@ -98,6 +98,11 @@ struct Q14 {
     void vpass(const Row* r0, const Row* r1, int32_t y, uint8_t* d, int32_t n, bool) const {
         vpass_q14(r0, r1, cy[y], d, n);
     }
+    bool halving(const uint8_t* s0, const uint8_t* s1, int32_t x, int32_t y, uint8_t* d,
+                 int32_t n, bool) const {
+        hvpass_q14_halving(s0, s1, cx + 2 * x, cy[y], d, n);
+        return true;
+    }
 };
 
 template <typename T> struct Float {
@@ -119,6 +124,12 @@ template <typename T> struct Float {
     }
     void vpass(const Row* r0, const Row* r1, int32_t y, T* d, int32_t n, bool stream) const {
         vpass_float(r0, r1, cy[y], d, n, stream);
+    }
+    bool halving(const T* s0, const T* s1, int32_t x, int32_t y, T* d, int32_t n,
+                 bool stream) const {
+        if constexpr (sizeof(T) == 1) return false;
+        else hvpass_float_halving(s0, s1, cx + x, cy[y], d, n, stream);
+        return true;
     }
 };
 
@@ -175,6 +186,14 @@ void core(const A& ar, const typename A::Pixel* pSrc, int32_t srcStep, typename 
     ar.hpass(row_at(pSrc, srcStep, prev + 1), lx, x, next, w, columns);
     for (int32_t j = 0; j < h; ++j) {
         const int32_t y = ly[j];
+        // Halving, neither row needed again: no row goes through the ring.
+        if (columns == kStride2 && y > prev + 1 && (j + 1 == h || ly[j + 1] > y + 1) &&
+            ar.halving(row_at(pSrc, srcStep, y) + lx[0], row_at(pSrc, srcStep, y + 1) + lx[0], x,
+                       y0 + j, row_at(pDst, dstStep, j), w, stream)) {
+            // The ring holds nothing the next row can use: it filters both.
+            if (j + 1 < h) prev = ly[j + 1] - 2;
+            continue;
+        }
         if (y > prev) {
             typename A::Row* const t = cur;
             cur = next;

@@ -223,6 +223,38 @@ inline void vpass_q14(const uint16_t* r0, const uint16_t* r1, int32_t w, uint8_t
     for (; i < n; ++i) d[i] = (uint8_t)((r0[i] * (16384 - w) + r1[i] * w + 0x80000) >> 20);
 }
 
+// Halving where neither source row serves a later destination row: both
+// rows' horizontal results stay in registers and go straight into the
+// vertical blend, with the arithmetic of hpass_q14 then vpass_q14. s0 and
+// s1 are the two rows at lx[0]; pair i lies at 2i.
+inline void hvpass_q14_halving(const uint8_t* s0, const uint8_t* s1, const uint16_t* wpairs,
+                               int32_t w, uint8_t* d, int32_t n) {
+    constexpr int L = kIntLanes;
+    const VW wv = (VW)simd::broadcast<VI>((int32_t)(((uint32_t)w << 16) | (uint32_t)(16384 - w)));
+    const VI half = simd::broadcast<VI>(0x80000);
+    auto hrow = [&](const uint8_t* s, int32_t at) {  // 2L results in row order
+        const VI a = (madd16(widen8(s + 2 * at), simd::load<VW>(wpairs + 2 * at)) + 128) >> 8;
+        const VI b =
+            (madd16(widen8(s + 2 * (at + L)), simd::load<VW>(wpairs + 2 * (at + L))) + 128) >> 8;
+        return row_order(pack32(a, b));
+    };
+    auto vblend = [&](int32_t at) {
+        const VW a = hrow(s0, at), b = hrow(s1, at);
+        return pack32((madd16(unpack_lo16(a, b), wv) + half) >> 20,
+                      (madd16(unpack_hi16(a, b), wv) + half) >> 20);
+    };
+    int32_t i = 0;
+    for (; i + 4 * L <= n; i += 4 * L) {
+        const VW v0 = vblend(i), v1 = vblend(i + 2 * L);
+        simd::store(d + i, row_order(packu16(v0, v1)));
+    }
+    for (; i < n; ++i) {
+        const int32_t r0 = blend_q14(s0[2 * i], s0[2 * i + 1], wpairs + 2 * i);
+        const int32_t r1 = blend_q14(s1[2 * i], s1[2 * i + 1], wpairs + 2 * i);
+        d[i] = (uint8_t)((r0 * (16384 - w) + r1 * w + 0x80000) >> 20);
+    }
+}
+
 // ---- float rows -------------------------------------------------------------------------
 
 // Two pixel pairs of a float row (at s + i0 and s + i1) as one vector
@@ -306,27 +338,51 @@ inline void hpass_float(const T* s, const int32_t* lx, const float* f, float* ou
     for (; i < n; ++i) out[i] = lerp((float)pixel(s + lx[i]), (float)pixel(s + lx[i] + 1), f[i]);
 }
 
-// stream: store past the caches where the row allows aligned vectors (the
+// A float destination row from vec(i) (kLanes results) and one(i); with
+// stream, stored past the caches where the row allows aligned vectors (the
 // caller fences).
+template <typename Vec, typename One>
+inline void write_row(float* d, int32_t n, bool stream, Vec vec, One one) {
+    int32_t i = 0;
+    if (stream && ((uintptr_t)d & 3) == 0) {
+        const int32_t head = (int32_t)(align_up(d, ZOR_VECTOR_BYTES) - d);
+        for (; i < head && i < n; ++i) {
+            const float v = one(i);
+            memcpy(d + i, &v, 4);
+        }
+        for (; i + kLanes <= n; i += kLanes) simd::stream(d + i, vec(i));
+    }
+    for (; i + kLanes <= n; i += kLanes) simd::store(d + i, vec(i));
+    for (; i < n; ++i) {
+        const float v = one(i);
+        memcpy(d + i, &v, 4);  // destination rows may sit off their element boundary
+    }
+}
+
 inline void vpass_float(const float* r0, const float* r1, float f, float* d, int32_t n,
                         bool stream) {
     const VF fv = simd::broadcast<VF>(f);
-    int32_t i = 0;
-    if (stream && ((uintptr_t)d & 3) == 0) {
-        const int32_t head = (int32_t)((align_up(d, ZOR_VECTOR_BYTES) - d));
-        for (; i < head && i < n; ++i) {
-            const float v = lerp(r0[i], r1[i], f);
-            memcpy(d + i, &v, 4);
-        }
-        for (; i + kLanes <= n; i += kLanes)
-            simd::stream(d + i, lerp(simd::load<VF>(r0 + i), simd::load<VF>(r1 + i), fv));
-    }
-    for (; i + kLanes <= n; i += kLanes)
-        simd::store(d + i, lerp(simd::load<VF>(r0 + i), simd::load<VF>(r1 + i), fv));
-    for (; i < n; ++i) {
-        const float v = lerp(r0[i], r1[i], f);
-        memcpy(d + i, &v, 4);  // destination rows may sit off their element boundary
-    }
+    write_row(
+        d, n, stream,
+        [&](int32_t i) { return lerp(simd::load<VF>(r0 + i), simd::load<VF>(r1 + i), fv); },
+        [&](int32_t i) { return lerp(r0[i], r1[i], f); });
+}
+
+// The float counterpart of hvpass_q14_halving.
+inline void hvpass_float_halving(const float* s0, const float* s1, const float* fx, float fy,
+                                 float* d, int32_t n, bool stream) {
+    const VF fv = simd::broadcast<VF>(fy);
+    auto hrow = [&](const float* s, int32_t i) {
+        VF a, b;
+        split_pairs(s + 2 * i, &a, &b);
+        return lerp(a, b, simd::load<VF>(fx + i));
+    };
+    write_row(
+        d, n, stream, [&](int32_t i) { return lerp(hrow(s0, i), hrow(s1, i), fv); },
+        [&](int32_t i) {
+            return lerp(lerp(s0[2 * i], s0[2 * i + 1], fx[i]), lerp(s1[2 * i], s1[2 * i + 1], fx[i]),
+                        fy);
+        });
 }
 
 // 8u results: rounded in the current mode, saturated.
