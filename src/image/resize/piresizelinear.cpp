@@ -98,9 +98,15 @@ struct Q14 {
     void vpass(const Row* r0, const Row* r1, int32_t y, uint8_t* d, int32_t n, bool) const {
         vpass_q14(r0, r1, cy[y], d, n);
     }
+    // Every column weight of the block one half.
+    bool halves(int32_t x, int32_t n) const {
+        for (int32_t i = 0; i < 2 * n; ++i)
+            if (cx[2 * x + i] != 8192) return false;
+        return true;
+    }
     bool halving(const uint8_t* s0, const uint8_t* s1, int32_t x, int32_t y, uint8_t* d,
-                 int32_t n, bool) const {
-        hvpass_q14_halving(s0, s1, cx + 2 * x, cy[y], d, n);
+                 int32_t n, bool, bool halves) const {
+        hvpass_q14_halving(s0, s1, cx + 2 * x, cy[y], d, n, halves);
         return true;
     }
 };
@@ -125,8 +131,9 @@ template <typename T> struct Float {
     void vpass(const Row* r0, const Row* r1, int32_t y, T* d, int32_t n, bool stream) const {
         vpass_float(r0, r1, cy[y], d, n, stream);
     }
-    bool halving(const T* s0, const T* s1, int32_t x, int32_t y, T* d, int32_t n,
-                 bool stream) const {
+    bool halves(int32_t, int32_t) const { return false; }
+    bool halving(const T* s0, const T* s1, int32_t x, int32_t y, T* d, int32_t n, bool stream,
+                 bool) const {
         if constexpr (sizeof(T) == 1) return false;
         else hvpass_float_halving(s0, s1, cx + x, cy[y], d, n, stream);
         return true;
@@ -177,6 +184,7 @@ void core(const A& ar, const typename A::Pixel* pSrc, int32_t srcStep, typename 
           int32_t dstStep, const int32_t* lx, const int32_t* ly, int32_t x, int32_t y0,
           int32_t w, int32_t h, typename A::Row* cur, typename A::Row* next) {
     const Columns columns = columns_of(lx, w);
+    const bool halves = columns == kStride2 && ar.halves(x, w);
     // A destination larger than the caches is stored past them: it would
     // only push out the source rows still to come.
     int32_t cache = 0;
@@ -189,7 +197,7 @@ void core(const A& ar, const typename A::Pixel* pSrc, int32_t srcStep, typename 
         // Halving, neither row needed again: no row goes through the ring.
         if (columns == kStride2 && y > prev + 1 && (j + 1 == h || ly[j + 1] > y + 1) &&
             ar.halving(row_at(pSrc, srcStep, y) + lx[0], row_at(pSrc, srcStep, y + 1) + lx[0], x,
-                       y0 + j, row_at(pDst, dstStep, j), w, stream)) {
+                       y0 + j, row_at(pDst, dstStep, j), w, stream, halves)) {
             // The ring holds nothing the next row can use: it filters both.
             if (j + 1 < h) prev = ly[j + 1] - 2;
             continue;

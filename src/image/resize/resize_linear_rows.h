@@ -69,6 +69,10 @@ inline VW widen8(const uint8_t* p) {
 // Byte shuffle within each 128-bit lane (pshufb); a control byte with the
 // top bit set gives 0.
 inline VB shuffle8(VB v, VB control) { return (VB)ZOR_LIN_I(shuffle_epi8)((IV)v, (IV)control); }
+// Adjacent bytes summed into 16-bit lanes (pmaddubsw with ones).
+inline VW sum_pairs8(VB v) {
+    return (VW)ZOR_LIN_I(maddubs_epi16)((IV)v, (IV)simd::broadcast<VB>(1));
+}
 // Lane 0 of each 128-bit lane, repeated over it.
 inline VI lane_first(VI v) {
 #if ZOR_INT_VECTOR_BYTES == 64
@@ -226,10 +230,29 @@ inline void vpass_q14(const uint16_t* r0, const uint16_t* r1, int32_t w, uint8_t
 // Halving where neither source row serves a later destination row: both
 // rows' horizontal results stay in registers and go straight into the
 // vertical blend, with the arithmetic of hpass_q14 then vpass_q14. s0 and
-// s1 are the two rows at lx[0]; pair i lies at 2i.
+// s1 are the two rows at lx[0]; pair i lies at 2i. halves: every weight of
+// the block is 8192, and then the two passes reduce exactly to the rounded
+// mean of the four pixels: r = ((a + b) * 8192 + 128) >> 8 = (a + b) * 32,
+// and ((r0 + r1) * 8192 + 0x80000) >> 20 = (a + b + c + d + 2) >> 2.
 inline void hvpass_q14_halving(const uint8_t* s0, const uint8_t* s1, const uint16_t* wpairs,
-                               int32_t w, uint8_t* d, int32_t n) {
+                               int32_t w, uint8_t* d, int32_t n, bool halves) {
     constexpr int L = kIntLanes;
+    int32_t i = 0;
+#if ZOR_HAS_SSSE3
+    if (halves && w == 8192) {
+        constexpr int B = ZOR_INT_VECTOR_BYTES;
+        const VW two = simd::broadcast<VW>(2);
+        auto mean = [&](int32_t at) {
+            return (sum_pairs8(simd::load<VB>(s0 + 2 * at)) +
+                    sum_pairs8(simd::load<VB>(s1 + 2 * at)) + two) >> 2;
+        };
+        for (; i + B <= n; i += B) {
+            const VW lo = mean(i), hi = mean(i + B / 2);
+            simd::store(d + i, row_order(packu16(lo, hi)));
+        }
+    }
+#endif
+    (void)halves;
     const VW wv = (VW)simd::broadcast<VI>((int32_t)(((uint32_t)w << 16) | (uint32_t)(16384 - w)));
     const VI half = simd::broadcast<VI>(0x80000);
     auto hrow = [&](const uint8_t* s, int32_t at) {  // 2L results in row order
@@ -243,7 +266,6 @@ inline void hvpass_q14_halving(const uint8_t* s0, const uint8_t* s1, const uint1
         return pack32((madd16(unpack_lo16(a, b), wv) + half) >> 20,
                       (madd16(unpack_hi16(a, b), wv) + half) >> 20);
     };
-    int32_t i = 0;
     for (; i + 4 * L <= n; i += 4 * L) {
         const VW v0 = vblend(i), v1 = vblend(i + 2 * L);
         simd::store(d + i, row_order(packu16(v0, v1)));
