@@ -334,6 +334,17 @@ inline void split_pairs(const float* s, VF* a, VF* b) {
 #endif
 }
 
+#if ZOR_HAS_AVX2
+// Lanes of v picked by idx across the whole vector (vpermps).
+inline VF permute(VF v, VFI idx) {
+#if ZOR_VECTOR_BYTES == 64
+    return (VF)_mm512_permutexvar_ps((__m512i)idx, (__m512)v);
+#else
+    return (VF)_mm256_permutevar8x32_ps((__m256)v, (__m256i)idx);
+#endif
+}
+#endif
+
 inline void gather_pairs(const uint8_t* s, const int32_t* lx, VF* a, VF* b) {
     VFI g;
     for (int k = 0; k < kLanes; ++k) g[k] = pair_8u(s + lx[k]);
@@ -345,13 +356,30 @@ template <typename T>
 inline void hpass_float(const T* s, const int32_t* lx, const float* f, float* out, int32_t n,
                         Columns columns) {
     int32_t i = 0;
-    if constexpr (sizeof(T) == 4)
+    if constexpr (sizeof(T) == 4) {
         if (columns == kStride2)
             for (; i + kLanes <= n; i += kLanes) {
                 VF a, b;
                 split_pairs(s + lx[i], &a, &b);
                 simd::store(out + i, lerp(a, b, simd::load<VF>(f + i)));
             }
+#if ZOR_HAS_AVX2 && ZOR_VECTOR_BYTES >= 32
+        // Contiguous columns: the pairs of a vector lie within one vector
+        // from its first pair on (enlarging), picked by permutes, while
+        // that vector stays within the row's pairs.
+        if (columns == kContiguous) {
+            const int32_t last = lx[n - 1] + 1;
+            const VFI one = simd::broadcast<VFI>(1);
+            for (; i + kLanes <= n && lx[i] + kLanes - 1 <= last; i += kLanes) {
+                const int32_t base = lx[i];
+                if (lx[i + kLanes - 1] + 1 - base >= kLanes) break;
+                const VFI d = simd::load<VFI>(lx + i) - simd::broadcast<VFI>(base);
+                const VF win = simd::load<VF>(s + base);
+                simd::store(out + i, lerp(permute(win, d), permute(win, d + one), simd::load<VF>(f + i)));
+            }
+        }
+#endif
+    }
     for (; i + kLanes <= n; i += kLanes) {
         VF a, b;
         gather_pairs(s, lx + i, &a, &b);
