@@ -343,6 +343,16 @@ inline VF permute(VF v, VFI idx) {
     return (VF)_mm256_permutevar8x32_ps((__m256)v, (__m256i)idx);
 #endif
 }
+// Lanes of the concatenation (v0, v1) picked by idx (0 to 2 * kLanes - 1).
+inline VF permute2(VF v0, VF v1, VFI idx) {
+#if ZOR_VECTOR_BYTES == 64
+    return (VF)_mm512_permutex2var_ps((__m512)v0, (__m512i)idx, (__m512)v1);
+#else
+    // vpermps reads the low three bits; bit 3, moved to the sign, picks v1.
+    return (VF)_mm256_blendv_ps((__m256)permute(v0, idx), (__m256)permute(v1, idx),
+                                _mm256_castsi256_ps(_mm256_slli_epi32((__m256i)idx, 28)));
+#endif
+}
 #endif
 
 inline void gather_pairs(const uint8_t* s, const int32_t* lx, VF* a, VF* b) {
@@ -364,18 +374,28 @@ inline void hpass_float(const T* s, const int32_t* lx, const float* f, float* ou
                 simd::store(out + i, lerp(a, b, simd::load<VF>(f + i)));
             }
 #if ZOR_HAS_AVX2 && ZOR_VECTOR_BYTES >= 32
-        // Contiguous columns: the pairs of a vector lie within one vector
-        // from its first pair on (enlarging), picked by permutes, while
-        // that vector stays within the row's pairs.
+        // Contiguous columns: the pairs of a vector lie within one or two
+        // vectors from its first pair on, picked by permutes, while those
+        // stay within the row's pairs.
         if (columns == kContiguous) {
             const int32_t last = lx[n - 1] + 1;
             const VFI one = simd::broadcast<VFI>(1);
-            for (; i + kLanes <= n && lx[i] + kLanes - 1 <= last; i += kLanes) {
-                const int32_t base = lx[i];
-                if (lx[i + kLanes - 1] + 1 - base >= kLanes) break;
+            for (; i + kLanes <= n && lx[i] + 2 * kLanes - 1 <= last; i += kLanes) {
+                const int32_t base = lx[i], span = lx[i + kLanes - 1] + 1 - base;
                 const VFI d = simd::load<VFI>(lx + i) - simd::broadcast<VFI>(base);
-                const VF win = simd::load<VF>(s + base);
-                simd::store(out + i, lerp(permute(win, d), permute(win, d + one), simd::load<VF>(f + i)));
+                const VF w0 = simd::load<VF>(s + base);
+                VF a, b;
+                if (span < kLanes) {
+                    a = permute(w0, d);
+                    b = permute(w0, d + one);
+                } else if (span < 2 * kLanes) {
+                    const VF w1 = simd::load<VF>(s + base + kLanes);
+                    a = permute2(w0, w1, d);
+                    b = permute2(w0, w1, d + one);
+                } else {
+                    break;
+                }
+                simd::store(out + i, lerp(a, b, simd::load<VF>(f + i)));
             }
         }
 #endif
