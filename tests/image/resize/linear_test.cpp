@@ -26,7 +26,8 @@ std::vector<Tap> taps(int32_t src, int32_t dst) {
     std::vector<Tap> t;
     for (int32_t i = 0; i < dst; ++i) {
         const double pos = (i + 0.5) * ((double)(src / g) / (dst / g)) - 0.5, index = floor(pos);
-        t.push_back({(int32_t)index, (int32_t)((pos - index) * 16384 + 1e-7), (float)(pos - index)});
+        t.push_back(
+            {(int32_t)index, (int32_t)((pos - index) * 16384 + 1e-7), (float)(pos - index)});
     }
     return t;
 }
@@ -41,7 +42,9 @@ template <typename T> struct Model {
     std::vector<Tap> tx, ty;
 
     double at(int32_t x, int32_t y) const { return (double)src.get(x + 1, y + 1); }
-    float lerp(float a, float b, float f) const { return fused ? fmaf(b - a, f, a) : a + (b - a) * f; }
+    float lerp(float a, float b, float f) const {
+        return fused ? fmaf(b - a, f, a) : a + (b - a) * f;
+    }
     T out(double v) const {
         if (path == kFloat8u) return (T)std::clamp((int32_t)nearbyintf((float)v), 0, 255);
         return (T)v;
@@ -60,7 +63,8 @@ template <typename T> struct Model {
     T pixel(int32_t i, int32_t j) const {
         const Tap &x = tx[i], &y = ty[j];
         const bool top = !(border & 16) && y.index < 0, bottom = !(border & 32) && y.index >= H - 1;
-        const bool left = !(border & 64) && x.index < 0, right = !(border & 128) && x.index >= W - 1;
+        const bool left = !(border & 64) && x.index < 0,
+                   right = !(border & 128) && x.index >= W - 1;
         if (top || bottom) {
             const int32_t r = top ? 0 : H - 1, c = left ? 0 : right ? W - 1 : x.index;
             return out(edge(at(c, r), at(left || right ? c : c + 1, r), x, false));
@@ -70,14 +74,28 @@ template <typename T> struct Model {
             return out(edge(at(c, y.index), at(c, y.index + 1), y, true));
         }
         const double r0 = row(y.index, x), r1 = row(y.index + 1, x);
-        if (path == kQ14) return (T)std::min(255, ((int32_t)r0 * (16384 - y.w) + (int32_t)r1 * y.w + 0x80000) >> 20);
+        if (path == kQ14)
+            return (T)std::min(255,
+                               ((int32_t)r0 * (16384 - y.w) + (int32_t)r1 * y.w + 0x80000) >> 20);
         return out(lerp((float)r0, (float)r1, y.f));
     }
 };
 
 template <typename T> bool same(T a, T b) {
-    if constexpr (sizeof(T) == 4) return (isnan(a) && isnan(b)) || zortest::f_bits(a) == zortest::f_bits(b);
+    if constexpr (sizeof(T) == 4)
+        return (isnan(a) && isnan(b)) || zortest::f_bits(a) == zortest::f_bits(b);
     return a == b;
+}
+
+template <typename T> ZorStatus resize(const T* s, int32_t ss, T* d, int32_t ds, ZoriPoint o,
+                                       ZoriSize z, int32_t border, const ZoriResizeSpec* spec,
+                                       Zor8u* buf) {
+    if constexpr (sizeof(T) == 1)
+        return zoriResizeLinear_8u_C1R(s, ss, d, ds, o, z, (ZoriBorderType)border, nullptr, spec,
+                                       buf);
+    else
+        return zoriResizeLinear_32f_C1R(s, ss, d, ds, o, z, (ZoriBorderType)border, nullptr, spec,
+                                        buf);
 }
 
 // One resize as tiles (a random partition, the last one asking past the
@@ -85,61 +103,64 @@ template <typename T> bool same(T a, T b) {
 // of the largest source magnitude (8u: 1) of the unfused model: each pass
 // differs by at most 2 ulp of its inputs' magnitude, the vertical one
 // carries the horizontal one's difference.
-template <typename T>
-void run_case(Path path, ZoriSize S, ZoriSize D, int32_t border, bool fused, Rng& rng, int round = FE_TONEAREST, bool stripes = false) {
+template <typename T> void run_case(Path path, ZoriSize S, ZoriSize D, int32_t border, bool fused,
+                                    Rng& rng, int round = FE_TONEAREST, bool stripes = false) {
+    SCOPED_TRACE(::testing::Message() << S.width << "x" << S.height << " -> " << D.width << "x"
+                                      << D.height << " border " << border << " path " << path);
     zortest::ResizeRecord rec = zortest::resize_record(S, D, zoriInterLinear, rng.below(64));
-    ASSERT_EQ((path == kQ14 ? zoriResizeLinearInit_8u : zoriResizeLinearInit_32f)(S, D, rec.spec()), zorStsNoErr);
+    ASSERT_EQ((path == kQ14 ? zoriResizeLinearInit_8u : zoriResizeLinearInit_32f)(S, D, rec.spec()),
+              zorStsNoErr);
     ASSERT_TRUE(zortest::record_guards_intact(rec));
     Image<T> src(S.width + 2, S.height + 2, 0, rng.below(8) * sizeof(T));
     src.randomize(rng);
     if (stripes) src.fill([](int x, int y) { return 5 + ((x + y) & 1); });
-    Image<T> got(D.width, D.height, (D.width + (int32_t)rng.below(5)) * sizeof(T), rng.below(4) * sizeof(T));
+    Image<T> got(D.width, D.height, (D.width + (int32_t)rng.below(5)) * sizeof(T),
+                 rng.below(4) * sizeof(T));
     Image<T> want = got, loose = got;
-    Model<T> m{src, S.width, S.height, border, path, fused, taps(S.width, D.width), taps(S.height, D.height)};
+    Model<T> m{src,
+               S.width,
+               S.height,
+               border,
+               path,
+               fused,
+               taps(S.width, D.width),
+               taps(S.height, D.height)};
     fesetround(round);
-    for (int32_t j = 0; j < D.height; ++j)
-        for (int32_t i = 0; i < D.width; ++i) want.set(i, j, m.pixel(i, j));
-    m.fused = false;
-    for (int32_t j = 0; j < D.height; ++j)
-        for (int32_t i = 0; i < D.width; ++i) loose.set(i, j, m.pixel(i, j));
-    std::vector<ZoriRect> tiles = zortest::random_tiles(D, rng);
-    for (size_t k = 0; k < tiles.size(); ++k) {
-        const ZoriRect r = tiles[k];
-        const bool over = k + 1 == tiles.size() && rng.below(2);
-        const ZoriSize size{r.width + (over ? 1 + (int32_t)rng.below(9) : 0), r.height + (over ? (int32_t)rng.below(3) : 0)};
+    for (Image<T>* im : {&want, &loose}) {
+        for (int32_t j = 0; j < D.height; ++j)
+            for (int32_t i = 0; i < D.width; ++i) im->set(i, j, m.pixel(i, j));
+        m.fused = false;
+    }
+    const std::vector<ZoriRect> tiles = zortest::random_tiles(D, rng);
+    for (const ZoriRect& r : tiles) {
+        const int32_t over = &r == &tiles.back() && rng.below(2) ? D.width : 0;
+        const ZoriSize size{r.width + over, r.height + (over ? (int32_t)rng.below(3) : 0)};
         ZoriPoint off;
         ASSERT_EQ(zoriResizeGetSrcOffset_8u(rec.spec(), {r.x, r.y}, &off), zorStsNoErr);
         int32_t n = 0;
         std::vector<uint8_t> buf = zortest::resize_buffer(rec.spec(), size, &n);
-        const T* s = src.ptr(off.x + 1, off.y + 1);
-        T* d = got.ptr(r.x, r.y);
-        ZorStatus st;
-        if constexpr (sizeof(T) == 1)
-            st = zoriResizeLinear_8u_C1R(s, src.step, d, got.step, {r.x, r.y}, size, (ZoriBorderType)border, nullptr, rec.spec(), buf.data());
-        else
-            st = zoriResizeLinear_32f_C1R(s, src.step, d, got.step, {r.x, r.y}, size, (ZoriBorderType)border, nullptr, rec.spec(), buf.data());
-        ASSERT_EQ(st, size.width > D.width || size.height > D.height ? zorStsSizeWrn : zorStsNoErr);
+        ASSERT_EQ(resize(src.ptr(off.x + 1, off.y + 1), src.step, got.ptr(r.x, r.y), got.step,
+                         {r.x, r.y}, size, border, rec.spec(), buf.data()),
+                  over ? zorStsSizeWrn : zorStsNoErr);
         ASSERT_TRUE(zortest::guard_intact(buf, (size_t)n));
     }
     fesetround(FE_TONEAREST);
-    for (Image<T>* im : {&got, &want})  // NaN payloads depend on operand order
-        for (int32_t y = 0; y < D.height; ++y)
-            for (int32_t x = 0; x < D.width; ++x)
-                if (im->get(x, y) != im->get(x, y)) im->set(x, y, (T)NAN);
-    const std::string what = std::to_string(S.width) + "x" + std::to_string(S.height) + " -> " + std::to_string(D.width) + "x" + std::to_string(D.height) + " border " + std::to_string(border) + " path " + std::to_string(path);
-    ASSERT_TRUE(same_bytes(got, want)) << what;
     double M = 0;
     for (int32_t y = 0; y < src.h; ++y)
-        for (int32_t x = 0; x < src.w; ++x) M = std::max(M, isfinite((double)src.get(x, y)) ? fabs((double)src.get(x, y)) : 0.0);
+        for (int32_t x = 0; x < src.w; ++x)
+            if (isfinite((double)src.get(x, y))) M = std::max(M, fabs((double)src.get(x, y)));
     const double bound = path == kFloat32f ? 8 * ldexp(1.0, ilogb(std::max(M, 1e-30)) - 23) : 1;
     for (int32_t y = 0; y < D.height; ++y)
         for (int32_t x = 0; x < D.width; ++x) {
-            const double g = got.get(x, y), l = loose.get(x, y);
-            ASSERT_TRUE(same(got.get(x, y), loose.get(x, y)) || fabs(g - l) <= bound) << what << " at " << x << "," << y;
+            const T g = got.get(x, y), l = loose.get(x, y);
+            ASSERT_TRUE(same(g, l) || fabs((double)g - l) <= bound) << x << "," << y;
+            if (g != g) got.set(x, y, want.get(x, y));  // NaN payloads follow operand order
         }
+    ASSERT_TRUE(same_bytes(got, want));
 }
 
-const int32_t kBorders[] = {1, 240, 241, 1 | 16, 1 | 32, 1 | 64, 1 | 128, 1 | 16 | 128, 1 | 32 | 64};
+const int32_t kBorders[] = {1,      240,     241,          1 | 16,     1 | 32,
+                            1 | 64, 1 | 128, 1 | 16 | 128, 1 | 32 | 64};
 
 using Linear = zortest::LevelTest;
 
@@ -151,37 +172,38 @@ TEST_P(Linear, SizesBordersAndTilesMatchTheModel) {
     const bool fused = GetParam().index >= 4;  // l9, n0, k0 fuse the float kernels
     Rng rng(GetParam().index + 1);
     int k = 0;
-    for (Path path : {kQ14, kFloat8u, kFloat32f}) {
-        const int32_t maxW = path == kFloat32f ? 33 : 129;
-        for (int32_t dw = 1; dw <= maxW; ++dw, ++k) {
+    auto one = [&](Path path, ZoriSize S, ZoriSize D, int round) {
+        if (path == kFloat32f) return run_case<Zor32f>(path, S, D, kBorders[k % 9], fused, rng);
+        run_case<Zor8u>(path, S, D, kBorders[k % 9], fused, rng,
+                        path == kQ14 ? FE_TONEAREST : round);
+    };
+    for (Path path : {kQ14, kFloat8u, kFloat32f})
+        for (int32_t dw = 1; dw <= (path == kFloat32f ? 33 : 129); ++dw, ++k) {
             const int32_t widths[] = {dw * 2, dw / 2, dw, dw * 3 / 2 + 1, 2 * dw + 3};
-            const int32_t sw = std::max(2, widths[k % 5]);
-            const ZoriSize S{sw, 2 + (int32_t)rng.below(6)}, D{dw, 1 + (int32_t)rng.below(9)};
-            const int round = path == kFloat8u && k % 3 == 0 ? (k % 2 ? FE_UPWARD : FE_DOWNWARD) : FE_TONEAREST;
-            if (path == kFloat32f)
-                ASSERT_NO_FATAL_FAILURE(run_case<Zor32f>(path, S, D, kBorders[k % 9], fused, rng));
-            else
-                ASSERT_NO_FATAL_FAILURE(run_case<Zor8u>(path, S, D, kBorders[k % 9], fused, rng, round));
+            const ZoriSize S{std::max(2, widths[k % 5]), 2 + (int32_t)rng.below(6)};
+            const int round = k % 3 ? FE_TONEAREST : k % 2 ? FE_UPWARD : FE_DOWNWARD;
+            ASSERT_NO_FATAL_FAILURE(one(path, S, {dw, 1 + (int32_t)rng.below(9)}, round));
         }
-    }
     for (const ZoriSize& S : {ZoriSize{2, 2}, ZoriSize{240, 136}})
-        for (const ZoriSize& D : {ZoriSize{1, 1}, ZoriSize{S.width * 2, S.height * 2}, ZoriSize{S.width / 2, S.height / 2}, ZoriSize{S.width * 2 / 3 + 1, S.height * 4 / 3}})
+        for (const ZoriSize& D :
+             {ZoriSize{1, 1}, ZoriSize{S.width * 2, S.height * 2},
+              ZoriSize{S.width / 2, S.height / 2}, ZoriSize{S.width * 2 / 3 + 1, S.height * 4 / 3}})
             for (Path path : {kQ14, kFloat8u, kFloat32f}) {
-                if (path == kFloat32f)
-                    ASSERT_NO_FATAL_FAILURE(run_case<Zor32f>(path, S, D, kBorders[++k % 9], fused, rng));
-                else
-                    ASSERT_NO_FATAL_FAILURE(run_case<Zor8u>(path, S, D, kBorders[++k % 9], fused, rng));
+                ASSERT_NO_FATAL_FAILURE(one(path, S, D, FE_TONEAREST));
+                ++k;
             }
     // An edge weight of 8191 between 5 and 6: the odd integer part makes
     // 5 + 8191/16384 round up.
-    ASSERT_NO_FATAL_FAILURE(run_case<Zor8u>(kQ14, {2, 2}, {16384, 4}, 1, fused, rng, FE_TONEAREST, true));
+    ASSERT_NO_FATAL_FAILURE(
+        run_case<Zor8u>(kQ14, {2, 2}, {16384, 4}, 1, fused, rng, FE_TONEAREST, true));
 }
 
 // Sources against unreadable pages, rows back to back: the replicated
-// border reads nothing outside the image.
+// border reads nothing outside the image, on either record for 8u.
 TEST_P(Linear, ReadsOnlyTheImage) {
     for (const ZoriSize S : {ZoriSize{2, 2}, ZoriSize{37, 5}, ZoriSize{100, 3}})
-        for (const ZoriSize D : {ZoriSize{1, 1}, ZoriSize{S.width * 3, S.height * 2}, ZoriSize{S.width / 2 + 1, 2}})
+        for (const ZoriSize D :
+             {ZoriSize{1, 1}, ZoriSize{S.width * 3, S.height * 2}, ZoriSize{S.width / 2 + 1, 2}})
             for (bool atEnd : {false, true}) {
                 zortest::ResizeRecord r8 = zortest::resize_record(S, D, zoriInterLinear), rf = r8;
                 ASSERT_EQ(zoriResizeLinearInit_8u(S, D, r8.spec()), zorStsNoErr);
@@ -192,50 +214,81 @@ TEST_P(Linear, ReadsOnlyTheImage) {
                 s8.fill([](int x, int y) { return x * 7 + y; });
                 sf.fill([](int x, int y) { return x * 0.5f - y; });
                 std::vector<Zor32f> out((size_t)D.width * D.height);
-                Zor8u* o8 = (Zor8u*)out.data();
-                EXPECT_EQ(zoriResizeLinear_8u_C1R(s8.ptr(), s8.step, o8, D.width, {0, 0}, D, zorBorderRepl, nullptr, r8.spec(), buf.data()), zorStsNoErr);
-                EXPECT_EQ(zoriResizeLinear_8u_C1R(s8.ptr(), s8.step, o8, D.width, {0, 0}, D, zorBorderRepl, nullptr, rf.spec(), buf.data()), zorStsNoErr);
-                EXPECT_EQ(zoriResizeLinear_32f_C1R(sf.ptr(), sf.step, out.data(), D.width * 4, {0, 0}, D, zorBorderRepl, nullptr, rf.spec(), buf.data()), zorStsNoErr);
+                for (const ZoriResizeSpec* spec : {r8.spec(), rf.spec()})
+                    EXPECT_EQ(resize(s8.ptr(), s8.step, (Zor8u*)out.data(), D.width, {0, 0}, D, 1,
+                                     spec, buf.data()),
+                              zorStsNoErr);
+                EXPECT_EQ(resize(sf.ptr(), sf.step, out.data(), D.width * 4, {0, 0}, D, 1,
+                                 rf.spec(), buf.data()),
+                          zorStsNoErr);
             }
 }
 
 TEST_P(Linear, ChecksInOrderWriteNothing) {
     const ZoriSize S{9, 7}, D{5, 4};
-    zortest::ResizeRecord q = zortest::resize_record(S, D, zoriInterLinear), f = q, nn = zortest::resize_record(S, D, zoriInterNN);
-    zortest::ResizeRecord bad = q;
+    zortest::ResizeRecord q = zortest::resize_record(S, D, zoriInterLinear), f = q, bad = q,
+                          nn = zortest::resize_record(S, D, zoriInterNN);
+    struct InitRow {
+        ZorStatus want;
+        const char* what;
+        ZoriSize src, dst;
+        ZoriResizeSpec* spec;
+    };
+    const InitRow inits[] = {{zorStsNullPtrErr, "null record", S, D, nullptr},
+                             {zorStsNoOperation, "zero length", S, {0, -3}, bad.spec()},
+                             {zorStsSizeErr, "negative length", S, {5, -1}, bad.spec()},
+                             {zorStsSizeErr, "one source column", {1, 7}, D, bad.spec()},
+                             {zorStsSizeErr, "one source row", {9, 1}, D, bad.spec()}};
+    std::vector<zortest::CheckRow> rows;
     for (auto init : {zoriResizeLinearInit_8u, zoriResizeLinearInit_32f})
-        zortest::run_checks({{zorStsNullPtrErr, "null record", [&] { return init(S, D, nullptr); }},
-                             {zorStsNoOperation, "zero length", [&] { return init(S, {0, -3}, bad.spec()); }},
-                             {zorStsSizeErr, "negative length", [&] { return init(S, {5, -1}, bad.spec()); }},
-                             {zorStsSizeErr, "one source column", [&] { return init({1, 7}, D, bad.spec()); }},
-                             {zorStsSizeErr, "one source row", [&] { return init({9, 1}, D, bad.spec()); }}},
-                            [&] { return zortest::guard_intact(bad.mem, 0); });
+        for (const InitRow& r : inits)
+            rows.push_back({r.want, r.what, [=] { return init(r.src, r.dst, r.spec); }});
+    zortest::run_checks(rows, [&] { return zortest::guard_intact(bad.mem, 0); });
     ASSERT_EQ(zoriResizeLinearInit_8u(S, D, q.spec()), zorStsNoErr);
     ASSERT_EQ(zoriResizeLinearInit_32f(S, D, f.spec()), zorStsNoErr);
     ASSERT_EQ(zoriResizeNearestInit_8u(S, D, nn.spec()), zorStsNoErr);
     std::vector<uint8_t> buf = zortest::resize_buffer(q.spec(), D);
     Image<Zor32f> src(S.width, S.height), dst(D.width, D.height);
     const Image<Zor32f> before = dst;
-    const Zor32f* s = src.ptr();
-    Zor32f* d = dst.ptr();
-    auto run = [&](int32_t border, const Zor32f* ps, int32_t ss, Zor32f* pd, ZoriPoint o, ZoriSize z, ZoriResizeSpec* spec, Zor8u* b) {
-        return zoriResizeLinear_32f_C1R(ps, ss, pd, dst.step, o, z, (ZoriBorderType)border, nullptr, spec, b);
+    struct OpRow {
+        ZorStatus want;
+        const char* what;
+        int32_t border, step;
+        bool noSrc, noBuf;
+        ZoriPoint off;
+        ZoriSize size;
+        ZoriResizeSpec* spec;
     };
-    Zor8u* b = buf.data();
-    zortest::run_checks({{zorStsBorderErr, "border 0 first", [&] { return run(0, nullptr, 1, d, {0, 0}, D, nullptr, b); }},
-                         {zorStsBorderErr, "border 256", [&] { return run(256 | 1, s, 36, d, {0, 0}, D, f.spec(), b); }},
-                         {zorStsBorderErr, "mirror", [&] { return run(3 | 16, s, 36, d, {0, 0}, D, f.spec(), b); }},
-                         {zorStsNullPtrErr, "null source", [&] { return run(1, nullptr, 36, d, {0, 0}, D, f.spec(), b); }},
-                         {zorStsNullPtrErr, "null buffer", [&] { return run(1, s, 36, d, {0, 0}, D, f.spec(), nullptr); }},
-                         {zorStsNoOperation, "zero size, bad record", [&] { return run(1, s, 36, d, {0, 0}, {0, 4}, bad.spec(), b); }},
-                         {zorStsContextMatchErr, "record id", [&] { return run(1, s, 36, d, {0, 0}, {-1, 4}, bad.spec(), b); }},
-                         {zorStsSizeErr, "negative size", [&] { return run(1, s, 37, d, {0, 0}, {-1, 4}, f.spec(), b); }},
-                         {zorStsStepErr, "step", [&] { return run(1, s, 37, d, {9, 0}, D, f.spec(), b); }},
-                         {zorStsOutOfRangeErr, "offset", [&] { return run(1, s, 36, d, {5, 0}, D, f.spec(), b); }},
-                         {zorStsOutOfRangeErr, "negative offset", [&] { return run(1, s, 36, d, {0, -1}, D, f.spec(), b); }},
-                         {zorStsContextMatchErr, "nearest record", [&] { return run(1, s, 36, d, {0, 0}, D, nn.spec(), b); }},
-                         {zorStsContextMatchErr, "fixed-point record", [&] { return run(1, s, 36, d, {0, 0}, D, q.spec(), b); }}},
-                        [&] { return (bool)same_bytes(dst, before); });
+    const OpRow ops[] = {
+        {zorStsBorderErr, "border 0 before all", 0, 1, true, true, {0, 0}, D, nullptr},
+        {zorStsBorderErr, "border 257", 257, 36, false, false, {0, 0}, D, f.spec()},
+        {zorStsBorderErr, "mirror", 3 | 16, 36, false, false, {0, 0}, D, f.spec()},
+        {zorStsNullPtrErr, "null source", 1, 36, true, false, {0, 0}, D, f.spec()},
+        {zorStsNullPtrErr, "null buffer", 1, 36, false, true, {0, 0}, D, f.spec()},
+        {zorStsNoOperation,
+         "zero size, bad record",
+         1,
+         36,
+         false,
+         false,
+         {0, 0},
+         {0, 4},
+         bad.spec()},
+        {zorStsContextMatchErr, "record id", 1, 36, false, false, {0, 0}, {-1, 4}, bad.spec()},
+        {zorStsSizeErr, "negative size", 1, 37, false, false, {0, 0}, {-1, 4}, f.spec()},
+        {zorStsStepErr, "step", 1, 37, false, false, {9, 0}, D, f.spec()},
+        {zorStsOutOfRangeErr, "offset", 1, 36, false, false, {5, 0}, D, f.spec()},
+        {zorStsOutOfRangeErr, "negative offset", 1, 36, false, false, {0, -1}, D, f.spec()},
+        {zorStsContextMatchErr, "nearest record", 1, 36, false, false, {0, 0}, D, nn.spec()},
+        {zorStsContextMatchErr, "fixed-point record", 1, 36, false, false, {0, 0}, D, q.spec()}};
+    rows.clear();
+    for (const OpRow& r : ops)
+        rows.push_back({r.want, r.what, [&, r] {
+                            return resize(r.noSrc ? nullptr : src.ptr(), r.step, dst.ptr(),
+                                          dst.step, r.off, r.size, r.border, r.spec,
+                                          r.noBuf ? nullptr : buf.data());
+                        }});
+    zortest::run_checks(rows, [&] { return (bool)same_bytes(dst, before); });
 }
 
 ZOR_INSTANTIATE_LEVELS(Linear);
