@@ -152,7 +152,9 @@ void edge_strips(const A& ar, const ResizeSpec* s, const ResizeTile& t, const Re
     const int32_t firstX = -t.shiftX, lastX = s->axisX.srcLen - t.shiftX - 1;
     const int32_t firstY = -t.shiftY, lastY = s->axisY.srcLen - t.shiftY - 1;
     auto at = [&](int32_t x, int32_t y) { return pixel(row_at(pSrc, srcStep, y) + x); };
-    auto put = [&](int32_t i, int32_t j, T v) { memcpy(row_at(pDst, dstStep, j) + i, &v, sizeof v); };
+    auto put = [&](int32_t i, int32_t j, T v) {
+        memcpy(row_at(pDst, dstStep, j) + i, &v, sizeof v);
+    };
     auto edge_row = [&](int32_t j, int32_t y) {
         for (int32_t i = 0; i < t.w; ++i) {
             int32_t c0 = t.localX[i], c1 = c0 + 1;
@@ -234,8 +236,9 @@ ZorStatus run(const A& ar, const ResizeSpec* s, const typename A::Pixel* pSrc, i
 }
 
 template <typename T>
-ZorStatus resize_linear(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriPoint dstOffset,
-                 ZoriSize dstSize, int32_t border, const ZoriResizeSpec* pSpec, Zor8u* pBuffer) {
+ZorStatus resize_linear(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep,
+                        ZoriPoint dstOffset, ZoriSize dstSize, int32_t border,
+                        const ZoriResizeSpec* pSpec, Zor8u* pBuffer) {
     if (!resize_border_ok(border)) return zorStsBorderErr;
     const ResizeSpec* s;
     const ZorStatus st = resize_check(pSrc, srcStep, pDst, dstStep, dstOffset, dstSize, pSpec,

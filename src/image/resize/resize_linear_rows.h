@@ -324,7 +324,8 @@ inline void split_pairs(const float* s, VF* a, VF* b) {
     *b = (VF)_mm512_permutexvar_pd(order, _mm512_castps_pd(_mm512_shuffle_ps(x0, x1, 0xDD)));
 #elif ZOR_VECTOR_BYTES == 32
     const __m256 y0 = _mm256_loadu_ps(s), y1 = _mm256_loadu_ps(s + 8);
-    const __m256 x0 = _mm256_permute2f128_ps(y0, y1, 0x20), x1 = _mm256_permute2f128_ps(y0, y1, 0x31);
+    const __m256 x0 = _mm256_permute2f128_ps(y0, y1, 0x20);
+    const __m256 x1 = _mm256_permute2f128_ps(y0, y1, 0x31);
     *a = (VF)_mm256_shuffle_ps(x0, x1, 0x88);
     *b = (VF)_mm256_shuffle_ps(x0, x1, 0xDD);
 #else
@@ -450,8 +451,8 @@ inline void hvpass_float_halving(const float* s0, const float* s1, const float* 
     write_row(
         d, n, stream, [&](int32_t i) { return lerp(hrow(s0, i), hrow(s1, i), fv); },
         [&](int32_t i) {
-            return lerp(lerp(s0[2 * i], s0[2 * i + 1], fx[i]), lerp(s1[2 * i], s1[2 * i + 1], fx[i]),
-                        fy);
+            const float r0 = lerp(s0[2 * i], s0[2 * i + 1], fx[i]);
+            return lerp(r0, lerp(s1[2 * i], s1[2 * i + 1], fx[i]), fy);
         });
 }
 
