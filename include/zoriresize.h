@@ -36,7 +36,7 @@
  *     Identical on every level.
  *   - zoriResizeLinearInit_32f makes a float record. Given to the 8u
  *     operation it runs the accurate path: float rows, results rounded to
- *     nearest even and saturated. The 32f operation needs a float record.
+ *     nearest even and saturated. The 32f operation refuses others (-13).
  *   - On AVX2 and AVX-512 levels the float passes use fused multiply-add:
  *     the last bit of a float result may differ from the other levels.
  *

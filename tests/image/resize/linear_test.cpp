@@ -1,0 +1,296 @@
+// Linear resize through the public stubs on every level against a model
+// made from the formulas: per axis pos = (i + 0.5) * ratio - 0.5, its floor
+// and fraction (and the 14-bit weight), then per pixel the edge or the
+// interior arithmetic, whichever the strip rule gives that pixel.
+#include <fenv.h>
+#include <math.h>
+
+#include <numeric>
+
+#include "resize_support.h"
+#include "zortest.h"
+
+namespace {
+
+using zortest::Image;
+using zortest::Rng;
+
+enum Path { kQ14, kFloat8u, kFloat32f };
+
+struct Tap {
+    int32_t index, w;  // w: the 14-bit weight
+    float f;
+};
+std::vector<Tap> taps(int32_t src, int32_t dst) {
+    const int32_t g = std::gcd(src, dst);
+    std::vector<Tap> t;
+    for (int32_t i = 0; i < dst; ++i) {
+        const double pos = (i + 0.5) * ((double)(src / g) / (dst / g)) - 0.5, index = floor(pos);
+        t.push_back(
+            {(int32_t)index, (int32_t)((pos - index) * 16384 + 1e-7), (float)(pos - index)});
+    }
+    return t;
+}
+
+// The source with one real pixel around it: (x, y) of the image is
+// (x + 1, y + 1) here, so in-memory sides read true neighbours.
+template <typename T> struct Model {
+    const Image<T>& src;
+    int32_t W, H, border;
+    Path path;
+    bool fused;
+    std::vector<Tap> tx, ty;
+
+    double at(int32_t x, int32_t y) const { return (double)src.get(x + 1, y + 1); }
+    float lerp(float a, float b, float f) const {
+        return fused ? fmaf(b - a, f, a) : a + (b - a) * f;
+    }
+    T out(double v) const {
+        if (path == kFloat8u) return (T)std::clamp((int32_t)nearbyintf((float)v), 0, 255);
+        return (T)v;
+    }
+    double edge(double a, double b, const Tap& t, bool alongY) const {
+        if (path != kQ14) return lerp((float)a, (float)b, t.f);
+        const int32_t v = alongY ? ((int32_t)a << 14) + ((int32_t)b - (int32_t)a) * t.w
+                                 : (int32_t)a * (16384 - t.w) + (int32_t)b * t.w;
+        return (v + ((v >> 14) & 1) + 8192) >> 14;
+    }
+    double row(int32_t y, const Tap& x) const {
+        const double a = at(x.index, y), b = at(x.index + 1, y);
+        if (path == kQ14) return ((int32_t)a * (16384 - x.w) + (int32_t)b * x.w + 128) >> 8;
+        return lerp((float)a, (float)b, x.f);
+    }
+    T pixel(int32_t i, int32_t j) const {
+        const Tap &x = tx[i], &y = ty[j];
+        const bool top = !(border & 16) && y.index < 0, bottom = !(border & 32) && y.index >= H - 1;
+        const bool left = !(border & 64) && x.index < 0,
+                   right = !(border & 128) && x.index >= W - 1;
+        if (top || bottom) {
+            const int32_t r = top ? 0 : H - 1, c = left ? 0 : right ? W - 1 : x.index;
+            return out(edge(at(c, r), at(left || right ? c : c + 1, r), x, false));
+        }
+        if (left || right) {
+            const int32_t c = left ? 0 : W - 1;
+            return out(edge(at(c, y.index), at(c, y.index + 1), y, true));
+        }
+        const double r0 = row(y.index, x), r1 = row(y.index + 1, x);
+        if (path == kQ14)
+            return (T)std::min(255,
+                               ((int32_t)r0 * (16384 - y.w) + (int32_t)r1 * y.w + 0x80000) >> 20);
+        return out(lerp((float)r0, (float)r1, y.f));
+    }
+};
+
+template <typename T> bool same(T a, T b) {
+    if constexpr (sizeof(T) == 4)
+        return (isnan(a) && isnan(b)) || zortest::f_bits(a) == zortest::f_bits(b);
+    return a == b;
+}
+
+template <typename T> ZorStatus resize(const T* s, int32_t ss, T* d, int32_t ds, ZoriPoint o,
+                                       ZoriSize z, int32_t border, const ZoriResizeSpec* spec,
+                                       Zor8u* buf) {
+    if constexpr (sizeof(T) == 1)
+        return zoriResizeLinear_8u_C1R(s, ss, d, ds, o, z, (ZoriBorderType)border, nullptr, spec,
+                                       buf);
+    else
+        return zoriResizeLinear_32f_C1R(s, ss, d, ds, o, z, (ZoriBorderType)border, nullptr, spec,
+                                        buf);
+}
+
+// One resize as tiles (a random partition, the last one asking past the
+// destination: 48), against the model; the fused levels also within 8 ulp
+// of the largest source magnitude (8u: 1) of the unfused model: each pass
+// differs by at most 2 ulp of its inputs' magnitude, the vertical one
+// carries the horizontal one's difference.
+template <typename T> void run_case(Path path, ZoriSize S, ZoriSize D, int32_t border, bool fused,
+                                    Rng& rng, int round = FE_TONEAREST, bool stripes = false) {
+    SCOPED_TRACE(::testing::Message() << S.width << "x" << S.height << " -> " << D.width << "x"
+                                      << D.height << " border " << border << " path " << path);
+    zortest::ResizeRecord rec = zortest::resize_record(S, D, zoriInterLinear, rng.below(64));
+    ASSERT_EQ((path == kQ14 ? zoriResizeLinearInit_8u : zoriResizeLinearInit_32f)(S, D, rec.spec()),
+              zorStsNoErr);
+    ASSERT_TRUE(zortest::record_guards_intact(rec));
+    Image<T> src(S.width + 2, S.height + 2, 0, rng.below(8) * sizeof(T));
+    src.randomize(rng);
+    if (stripes) src.fill([](int x, int y) { return 5 + ((x + y) & 1); });
+    Image<T> got(D.width, D.height, (D.width + (int32_t)rng.below(5)) * sizeof(T),
+                 rng.below(4) * sizeof(T));
+    Image<T> want = got, loose = got;
+    Model<T> m{src,
+               S.width,
+               S.height,
+               border,
+               path,
+               fused,
+               taps(S.width, D.width),
+               taps(S.height, D.height)};
+    fesetround(round);
+    for (Image<T>* im : {&want, &loose}) {
+        for (int32_t j = 0; j < D.height; ++j)
+            for (int32_t i = 0; i < D.width; ++i) im->set(i, j, m.pixel(i, j));
+        m.fused = false;
+    }
+    const std::vector<ZoriRect> tiles = zortest::random_tiles(D, rng);
+    for (const ZoriRect& r : tiles) {
+        const int32_t over = &r == &tiles.back() && rng.below(2) ? D.width : 0;
+        const ZoriSize size{r.width + over, r.height + (over ? (int32_t)rng.below(3) : 0)};
+        ZoriPoint off;
+        ASSERT_EQ(zoriResizeGetSrcOffset_8u(rec.spec(), {r.x, r.y}, &off), zorStsNoErr);
+        int32_t n = 0;
+        std::vector<uint8_t> buf = zortest::resize_buffer(rec.spec(), size, &n);
+        ASSERT_EQ(resize(src.ptr(off.x + 1, off.y + 1), src.step, got.ptr(r.x, r.y), got.step,
+                         {r.x, r.y}, size, border, rec.spec(), buf.data()),
+                  over ? zorStsSizeWrn : zorStsNoErr);
+        ASSERT_TRUE(zortest::guard_intact(buf, (size_t)n));
+    }
+    fesetround(FE_TONEAREST);
+    double M = 0;
+    for (int32_t y = 0; y < src.h; ++y)
+        for (int32_t x = 0; x < src.w; ++x)
+            if (isfinite((double)src.get(x, y))) M = std::max(M, fabs((double)src.get(x, y)));
+    const double bound = path == kFloat32f ? 8 * ldexp(1.0, ilogb(std::max(M, 1e-30)) - 23) : 1;
+    for (int32_t y = 0; y < D.height; ++y)
+        for (int32_t x = 0; x < D.width; ++x) {
+            const T g = got.get(x, y), l = loose.get(x, y);
+            ASSERT_TRUE(same(g, l) || fabs((double)g - l) <= bound) << x << "," << y;
+            if (g != g) got.set(x, y, want.get(x, y));  // NaN payloads follow operand order
+        }
+    ASSERT_TRUE(same_bytes(got, want));
+}
+
+const int32_t kBorders[] = {1,      240,     241,          1 | 16,     1 | 32,
+                            1 | 64, 1 | 128, 1 | 16 | 128, 1 | 32 | 64};
+
+using Linear = zortest::LevelTest;
+
+// Widths across every vector tail (to two 64-byte vectors and one more),
+// shrinking and enlarging by integer and other ratios, 2x2 sources and
+// 1-pixel destinations, each border form in turn; the float 8u path also
+// under directed rounding.
+TEST_P(Linear, SizesBordersAndTilesMatchTheModel) {
+    const bool fused = GetParam().index >= 4;  // l9, n0, k0 fuse the float kernels
+    Rng rng(GetParam().index + 1);
+    int k = 0;
+    auto one = [&](Path path, ZoriSize S, ZoriSize D, int round) {
+        if (path == kFloat32f) return run_case<Zor32f>(path, S, D, kBorders[k % 9], fused, rng);
+        run_case<Zor8u>(path, S, D, kBorders[k % 9], fused, rng,
+                        path == kQ14 ? FE_TONEAREST : round);
+    };
+    for (Path path : {kQ14, kFloat8u, kFloat32f})
+        for (int32_t dw = 1; dw <= (path == kFloat32f ? 33 : 129); ++dw, ++k) {
+            const int32_t widths[] = {dw * 2, dw / 2, dw, dw * 3 / 2 + 1, 2 * dw + 3};
+            const ZoriSize S{std::max(2, widths[k % 5]), 2 + (int32_t)rng.below(6)};
+            const int round = k % 3 ? FE_TONEAREST : k % 2 ? FE_UPWARD : FE_DOWNWARD;
+            ASSERT_NO_FATAL_FAILURE(one(path, S, {dw, 1 + (int32_t)rng.below(9)}, round));
+        }
+    for (const ZoriSize& S : {ZoriSize{2, 2}, ZoriSize{240, 136}})
+        for (const ZoriSize& D :
+             {ZoriSize{1, 1}, ZoriSize{S.width * 2, S.height * 2},
+              ZoriSize{S.width / 2, S.height / 2}, ZoriSize{S.width * 2 / 3 + 1, S.height * 4 / 3}})
+            for (Path path : {kQ14, kFloat8u, kFloat32f}) {
+                ASSERT_NO_FATAL_FAILURE(one(path, S, D, FE_TONEAREST));
+                ++k;
+            }
+    // An edge weight of 8191 between 5 and 6: the odd integer part makes
+    // 5 + 8191/16384 round up.
+    ASSERT_NO_FATAL_FAILURE(
+        run_case<Zor8u>(kQ14, {2, 2}, {16384, 4}, 1, fused, rng, FE_TONEAREST, true));
+}
+
+// Sources against unreadable pages, rows back to back: the replicated
+// border reads nothing outside the image, on either record for 8u.
+TEST_P(Linear, ReadsOnlyTheImage) {
+    for (const ZoriSize S : {ZoriSize{2, 2}, ZoriSize{37, 5}, ZoriSize{100, 3}})
+        for (const ZoriSize D :
+             {ZoriSize{1, 1}, ZoriSize{S.width * 3, S.height * 2}, ZoriSize{S.width / 2 + 1, 2}})
+            for (bool atEnd : {false, true}) {
+                zortest::ResizeRecord r8 = zortest::resize_record(S, D, zoriInterLinear), rf = r8;
+                ASSERT_EQ(zoriResizeLinearInit_8u(S, D, r8.spec()), zorStsNoErr);
+                ASSERT_EQ(zoriResizeLinearInit_32f(S, D, rf.spec()), zorStsNoErr);
+                std::vector<uint8_t> buf = zortest::resize_buffer(r8.spec(), D);
+                zortest::Fenced<Zor8u> s8(S.width, S.height, atEnd);
+                zortest::Fenced<Zor32f> sf(S.width, S.height, atEnd);
+                s8.fill([](int x, int y) { return x * 7 + y; });
+                sf.fill([](int x, int y) { return x * 0.5f - y; });
+                std::vector<Zor32f> out((size_t)D.width * D.height);
+                for (const ZoriResizeSpec* spec : {r8.spec(), rf.spec()})
+                    EXPECT_EQ(resize(s8.ptr(), s8.step, (Zor8u*)out.data(), D.width, {0, 0}, D, 1,
+                                     spec, buf.data()),
+                              zorStsNoErr);
+                EXPECT_EQ(resize(sf.ptr(), sf.step, out.data(), D.width * 4, {0, 0}, D, 1,
+                                 rf.spec(), buf.data()),
+                          zorStsNoErr);
+            }
+}
+
+TEST_P(Linear, ChecksInOrderWriteNothing) {
+    const ZoriSize S{9, 7}, D{5, 4};
+    zortest::ResizeRecord q = zortest::resize_record(S, D, zoriInterLinear), f = q, bad = q,
+                          nn = zortest::resize_record(S, D, zoriInterNN);
+    struct InitRow {
+        ZorStatus want;
+        const char* what;
+        ZoriSize src, dst;
+        ZoriResizeSpec* spec;
+    };
+    const InitRow inits[] = {{zorStsNullPtrErr, "null record", S, D, nullptr},
+                             {zorStsNoOperation, "zero length", S, {0, -3}, bad.spec()},
+                             {zorStsSizeErr, "negative length", S, {5, -1}, bad.spec()},
+                             {zorStsSizeErr, "one source column", {1, 7}, D, bad.spec()},
+                             {zorStsSizeErr, "one source row", {9, 1}, D, bad.spec()}};
+    std::vector<zortest::CheckRow> rows;
+    for (auto init : {zoriResizeLinearInit_8u, zoriResizeLinearInit_32f})
+        for (const InitRow& r : inits)
+            rows.push_back({r.want, r.what, [=] { return init(r.src, r.dst, r.spec); }});
+    zortest::run_checks(rows, [&] { return zortest::guard_intact(bad.mem, 0); });
+    ASSERT_EQ(zoriResizeLinearInit_8u(S, D, q.spec()), zorStsNoErr);
+    ASSERT_EQ(zoriResizeLinearInit_32f(S, D, f.spec()), zorStsNoErr);
+    ASSERT_EQ(zoriResizeNearestInit_8u(S, D, nn.spec()), zorStsNoErr);
+    std::vector<uint8_t> buf = zortest::resize_buffer(q.spec(), D);
+    Image<Zor32f> src(S.width, S.height), dst(D.width, D.height);
+    const Image<Zor32f> before = dst;
+    struct OpRow {
+        ZorStatus want;
+        const char* what;
+        int32_t border, step;
+        bool noSrc, noBuf;
+        ZoriPoint off;
+        ZoriSize size;
+        ZoriResizeSpec* spec;
+    };
+    const OpRow ops[] = {
+        {zorStsBorderErr, "border 0 before all", 0, 1, true, true, {0, 0}, D, nullptr},
+        {zorStsBorderErr, "border 257", 257, 36, false, false, {0, 0}, D, f.spec()},
+        {zorStsBorderErr, "mirror", 3 | 16, 36, false, false, {0, 0}, D, f.spec()},
+        {zorStsNullPtrErr, "null source", 1, 36, true, false, {0, 0}, D, f.spec()},
+        {zorStsNullPtrErr, "null buffer", 1, 36, false, true, {0, 0}, D, f.spec()},
+        {zorStsNoOperation,
+         "zero size, bad record",
+         1,
+         36,
+         false,
+         false,
+         {0, 0},
+         {0, 4},
+         bad.spec()},
+        {zorStsContextMatchErr, "record id", 1, 36, false, false, {0, 0}, {-1, 4}, bad.spec()},
+        {zorStsSizeErr, "negative size", 1, 37, false, false, {0, 0}, {-1, 4}, f.spec()},
+        {zorStsStepErr, "step", 1, 37, false, false, {9, 0}, D, f.spec()},
+        {zorStsOutOfRangeErr, "offset", 1, 36, false, false, {5, 0}, D, f.spec()},
+        {zorStsOutOfRangeErr, "negative offset", 1, 36, false, false, {0, -1}, D, f.spec()},
+        {zorStsContextMatchErr, "nearest record", 1, 36, false, false, {0, 0}, D, nn.spec()},
+        {zorStsContextMatchErr, "fixed-point record", 1, 36, false, false, {0, 0}, D, q.spec()}};
+    rows.clear();
+    for (const OpRow& r : ops)
+        rows.push_back({r.want, r.what, [&, r] {
+                            return resize(r.noSrc ? nullptr : src.ptr(), r.step, dst.ptr(),
+                                          dst.step, r.off, r.size, r.border, r.spec,
+                                          r.noBuf ? nullptr : buf.data());
+                        }});
+    zortest::run_checks(rows, [&] { return (bool)same_bytes(dst, before); });
+}
+
+ZOR_INSTANTIATE_LEVELS(Linear);
+
+}  // namespace
