@@ -37,12 +37,12 @@ template <typename T> void zor_linear(benchmark::State& state, uint64_t select, 
     int32_t specSize = 0, initSize = 0, bufSize = 0;
     zoriResizeGetSize_8u(src, dst, zoriInterLinear, 0, &specSize, &initSize);
     std::vector<Zor8u> rec((size_t)specSize);
-    ZoriResizeSpec* spec = (ZoriResizeSpec*)rec.data();
+    ZoriResizeSpec* record = (ZoriResizeSpec*)rec.data();
     if (sizeof(T) == 1)
-        zoriResizeLinearInit_8u(src, dst, spec);
+        zoriResizeLinearInit_8u(src, dst, record);
     else
-        zoriResizeLinearInit_32f(src, dst, spec);
-    zoriResizeGetBufferSize_8u(spec, dst, 1, &bufSize);
+        zoriResizeLinearInit_32f(src, dst, record);
+    zoriResizeGetBufferSize_8u(record, dst, 1, &bufSize);
     std::vector<Zor8u> buf((size_t)bufSize);
     T* in = picture<T>(kW, kH);
     T* out = picture<T>(dst.width, dst.height);
@@ -50,11 +50,11 @@ template <typename T> void zor_linear(benchmark::State& state, uint64_t select, 
     for (auto _ : state) {
         ZorStatus s;
         if constexpr (sizeof(T) == 1)
-            s = zoriResizeLinear_8u_C1R(in, ss, out, ds, {0, 0}, dst, zorBorderRepl, nullptr, spec,
+            s = zoriResizeLinear_8u_C1R(in, ss, out, ds, {0, 0}, dst, zorBorderRepl, nullptr, record,
                                         buf.data());
         else
             s = zoriResizeLinear_32f_C1R(in, ss, out, ds, {0, 0}, dst, zorBorderRepl, nullptr,
-                                         spec, buf.data());
+                                         record, buf.data());
         benchmark::DoNotOptimize(s);
         benchmark::ClobberMemory();
     }

@@ -88,13 +88,13 @@ template <typename T> bool same(T a, T b) {
 }
 
 template <typename T> ZorStatus resize(const T* s, int32_t ss, T* d, int32_t ds, ZoriPoint o,
-                                       ZoriSize z, int32_t border, const ZoriResizeSpec* spec,
+                                       ZoriSize z, int32_t border, const ZoriResizeSpec* record,
                                        Zor8u* buf) {
     if constexpr (sizeof(T) == 1)
-        return zoriResizeLinear_8u_C1R(s, ss, d, ds, o, z, (ZoriBorderType)border, nullptr, spec,
+        return zoriResizeLinear_8u_C1R(s, ss, d, ds, o, z, (ZoriBorderType)border, nullptr, record,
                                        buf);
     else
-        return zoriResizeLinear_32f_C1R(s, ss, d, ds, o, z, (ZoriBorderType)border, nullptr, spec,
+        return zoriResizeLinear_32f_C1R(s, ss, d, ds, o, z, (ZoriBorderType)border, nullptr, record,
                                         buf);
 }
 
@@ -108,7 +108,7 @@ template <typename T> void run_case(Path path, ZoriSize S, ZoriSize D, int32_t b
     SCOPED_TRACE(::testing::Message() << S.width << "x" << S.height << " -> " << D.width << "x"
                                       << D.height << " border " << border << " path " << path);
     zortest::ResizeRecord rec = zortest::resize_record(S, D, zoriInterLinear, rng.below(64));
-    ASSERT_EQ((path == kQ14 ? zoriResizeLinearInit_8u : zoriResizeLinearInit_32f)(S, D, rec.spec()),
+    ASSERT_EQ((path == kQ14 ? zoriResizeLinearInit_8u : zoriResizeLinearInit_32f)(S, D, rec.record()),
               zorStsNoErr);
     ASSERT_TRUE(zortest::record_guards_intact(rec));
     Image<T> src(S.width + 2, S.height + 2, 0, rng.below(8) * sizeof(T));
@@ -136,11 +136,11 @@ template <typename T> void run_case(Path path, ZoriSize S, ZoriSize D, int32_t b
         const int32_t over = &r == &tiles.back() && rng.below(2) ? D.width : 0;
         const ZoriSize size{r.width + over, r.height + (over ? (int32_t)rng.below(3) : 0)};
         ZoriPoint off;
-        ASSERT_EQ(zoriResizeGetSrcOffset_8u(rec.spec(), {r.x, r.y}, &off), zorStsNoErr);
+        ASSERT_EQ(zoriResizeGetSrcOffset_8u(rec.record(), {r.x, r.y}, &off), zorStsNoErr);
         int32_t n = 0;
-        std::vector<uint8_t> buf = zortest::resize_buffer(rec.spec(), size, &n);
+        std::vector<uint8_t> buf = zortest::resize_buffer(rec.record(), size, &n);
         ASSERT_EQ(resize(src.ptr(off.x + 1, off.y + 1), src.step, got.ptr(r.x, r.y), got.step,
-                         {r.x, r.y}, size, border, rec.spec(), buf.data()),
+                         {r.x, r.y}, size, border, rec.record(), buf.data()),
                   over ? zorStsSizeWrn : zorStsNoErr);
         ASSERT_TRUE(zortest::guard_intact(buf, (size_t)n));
     }
@@ -206,20 +206,20 @@ TEST_P(Linear, ReadsOnlyTheImage) {
              {ZoriSize{1, 1}, ZoriSize{S.width * 3, S.height * 2}, ZoriSize{S.width / 2 + 1, 2}})
             for (bool atEnd : {false, true}) {
                 zortest::ResizeRecord r8 = zortest::resize_record(S, D, zoriInterLinear), rf = r8;
-                ASSERT_EQ(zoriResizeLinearInit_8u(S, D, r8.spec()), zorStsNoErr);
-                ASSERT_EQ(zoriResizeLinearInit_32f(S, D, rf.spec()), zorStsNoErr);
-                std::vector<uint8_t> buf = zortest::resize_buffer(r8.spec(), D);
+                ASSERT_EQ(zoriResizeLinearInit_8u(S, D, r8.record()), zorStsNoErr);
+                ASSERT_EQ(zoriResizeLinearInit_32f(S, D, rf.record()), zorStsNoErr);
+                std::vector<uint8_t> buf = zortest::resize_buffer(r8.record(), D);
                 zortest::Fenced<Zor8u> s8(S.width, S.height, atEnd);
                 zortest::Fenced<Zor32f> sf(S.width, S.height, atEnd);
                 s8.fill([](int x, int y) { return x * 7 + y; });
                 sf.fill([](int x, int y) { return x * 0.5f - y; });
                 std::vector<Zor32f> out((size_t)D.width * D.height);
-                for (const ZoriResizeSpec* spec : {r8.spec(), rf.spec()})
+                for (const ZoriResizeSpec* record : {r8.record(), rf.record()})
                     EXPECT_EQ(resize(s8.ptr(), s8.step, (Zor8u*)out.data(), D.width, {0, 0}, D, 1,
-                                     spec, buf.data()),
+                                     record, buf.data()),
                               zorStsNoErr);
                 EXPECT_EQ(resize(sf.ptr(), sf.step, out.data(), D.width * 4, {0, 0}, D, 1,
-                                 rf.spec(), buf.data()),
+                                 rf.record(), buf.data()),
                           zorStsNoErr);
             }
 }
@@ -232,22 +232,22 @@ TEST_P(Linear, ChecksInOrderWriteNothing) {
         ZorStatus want;
         const char* what;
         ZoriSize src, dst;
-        ZoriResizeSpec* spec;
+        ZoriResizeSpec* record;
     };
     const InitRow inits[] = {{zorStsNullPtrErr, "null record", S, D, nullptr},
-                             {zorStsNoOperation, "zero length", S, {0, -3}, bad.spec()},
-                             {zorStsSizeErr, "negative length", S, {5, -1}, bad.spec()},
-                             {zorStsSizeErr, "one source column", {1, 7}, D, bad.spec()},
-                             {zorStsSizeErr, "one source row", {9, 1}, D, bad.spec()}};
+                             {zorStsNoOperation, "zero length", S, {0, -3}, bad.record()},
+                             {zorStsSizeErr, "negative length", S, {5, -1}, bad.record()},
+                             {zorStsSizeErr, "one source column", {1, 7}, D, bad.record()},
+                             {zorStsSizeErr, "one source row", {9, 1}, D, bad.record()}};
     std::vector<zortest::CheckRow> rows;
     for (auto init : {zoriResizeLinearInit_8u, zoriResizeLinearInit_32f})
         for (const InitRow& r : inits)
-            rows.push_back({r.want, r.what, [=] { return init(r.src, r.dst, r.spec); }});
+            rows.push_back({r.want, r.what, [=] { return init(r.src, r.dst, r.record); }});
     zortest::run_checks(rows, [&] { return zortest::guard_intact(bad.mem, 0); });
-    ASSERT_EQ(zoriResizeLinearInit_8u(S, D, q.spec()), zorStsNoErr);
-    ASSERT_EQ(zoriResizeLinearInit_32f(S, D, f.spec()), zorStsNoErr);
-    ASSERT_EQ(zoriResizeNearestInit_8u(S, D, nn.spec()), zorStsNoErr);
-    std::vector<uint8_t> buf = zortest::resize_buffer(q.spec(), D);
+    ASSERT_EQ(zoriResizeLinearInit_8u(S, D, q.record()), zorStsNoErr);
+    ASSERT_EQ(zoriResizeLinearInit_32f(S, D, f.record()), zorStsNoErr);
+    ASSERT_EQ(zoriResizeNearestInit_8u(S, D, nn.record()), zorStsNoErr);
+    std::vector<uint8_t> buf = zortest::resize_buffer(q.record(), D);
     Image<Zor32f> src(S.width, S.height), dst(D.width, D.height);
     const Image<Zor32f> before = dst;
     struct OpRow {
@@ -257,14 +257,14 @@ TEST_P(Linear, ChecksInOrderWriteNothing) {
         bool noSrc, noBuf;
         ZoriPoint off;
         ZoriSize size;
-        ZoriResizeSpec* spec;
+        ZoriResizeSpec* record;
     };
     const OpRow ops[] = {
         {zorStsBorderErr, "border 0 before all", 0, 1, true, true, {0, 0}, D, nullptr},
-        {zorStsBorderErr, "border 257", 257, 36, false, false, {0, 0}, D, f.spec()},
-        {zorStsBorderErr, "mirror", 3 | 16, 36, false, false, {0, 0}, D, f.spec()},
-        {zorStsNullPtrErr, "null source", 1, 36, true, false, {0, 0}, D, f.spec()},
-        {zorStsNullPtrErr, "null buffer", 1, 36, false, true, {0, 0}, D, f.spec()},
+        {zorStsBorderErr, "border 257", 257, 36, false, false, {0, 0}, D, f.record()},
+        {zorStsBorderErr, "mirror", 3 | 16, 36, false, false, {0, 0}, D, f.record()},
+        {zorStsNullPtrErr, "null source", 1, 36, true, false, {0, 0}, D, f.record()},
+        {zorStsNullPtrErr, "null buffer", 1, 36, false, true, {0, 0}, D, f.record()},
         {zorStsNoOperation,
          "zero size, bad record",
          1,
@@ -273,19 +273,19 @@ TEST_P(Linear, ChecksInOrderWriteNothing) {
          false,
          {0, 0},
          {0, 4},
-         bad.spec()},
-        {zorStsContextMatchErr, "record id", 1, 36, false, false, {0, 0}, {-1, 4}, bad.spec()},
-        {zorStsSizeErr, "negative size", 1, 37, false, false, {0, 0}, {-1, 4}, f.spec()},
-        {zorStsStepErr, "step", 1, 37, false, false, {9, 0}, D, f.spec()},
-        {zorStsOutOfRangeErr, "offset", 1, 36, false, false, {5, 0}, D, f.spec()},
-        {zorStsOutOfRangeErr, "negative offset", 1, 36, false, false, {0, -1}, D, f.spec()},
-        {zorStsContextMatchErr, "nearest record", 1, 36, false, false, {0, 0}, D, nn.spec()},
-        {zorStsContextMatchErr, "fixed-point record", 1, 36, false, false, {0, 0}, D, q.spec()}};
+         bad.record()},
+        {zorStsContextMatchErr, "record id", 1, 36, false, false, {0, 0}, {-1, 4}, bad.record()},
+        {zorStsSizeErr, "negative size", 1, 37, false, false, {0, 0}, {-1, 4}, f.record()},
+        {zorStsStepErr, "step", 1, 37, false, false, {9, 0}, D, f.record()},
+        {zorStsOutOfRangeErr, "offset", 1, 36, false, false, {5, 0}, D, f.record()},
+        {zorStsOutOfRangeErr, "negative offset", 1, 36, false, false, {0, -1}, D, f.record()},
+        {zorStsContextMatchErr, "nearest record", 1, 36, false, false, {0, 0}, D, nn.record()},
+        {zorStsContextMatchErr, "fixed-point record", 1, 36, false, false, {0, 0}, D, q.record()}};
     rows.clear();
     for (const OpRow& r : ops)
         rows.push_back({r.want, r.what, [&, r] {
                             return resize(r.noSrc ? nullptr : src.ptr(), r.step, dst.ptr(),
-                                          dst.step, r.off, r.size, r.border, r.spec,
+                                          dst.step, r.off, r.size, r.border, r.record,
                                           r.noBuf ? nullptr : buf.data());
                         }});
     zortest::run_checks(rows, [&] { return (bool)same_bytes(dst, before); });
