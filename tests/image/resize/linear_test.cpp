@@ -32,16 +32,16 @@ std::vector<Tap> taps(int32_t src, int32_t dst) {
     return t;
 }
 
-// The source with one real pixel around it: (x, y) of the image is
-// (x + 1, y + 1) here, so in-memory sides read true neighbours.
+// The source carries a pixel on each in-memory side: those read true
+// neighbours.
 template <typename T> struct Model {
-    const Image<T>& src;
+    zortest::ResizeSource<T>& src;
     int32_t W, H, border;
     Path path;
     bool fused;
     std::vector<Tap> tx, ty;
 
-    double at(int32_t x, int32_t y) const { return (double)src.get(x + 1, y + 1); }
+    double at(int32_t x, int32_t y) const { return src.get(x, y); }
     float lerp(float a, float b, float f) const {
         return fused ? fmaf(b - a, f, a) : a + (b - a) * f;
     }
@@ -87,17 +87,6 @@ template <typename T> bool same(T a, T b) {
     return a == b;
 }
 
-template <typename T> ZorStatus resize(const T* s, int32_t ss, T* d, int32_t ds, ZoriPoint o,
-                                       ZoriSize z, int32_t border, const ZoriResizeSpec* record,
-                                       Zor8u* buf) {
-    if constexpr (sizeof(T) == 1)
-        return zoriResizeLinear_8u_C1R(s, ss, d, ds, o, z, (ZoriBorderType)border, nullptr, record,
-                                       buf);
-    else
-        return zoriResizeLinear_32f_C1R(s, ss, d, ds, o, z, (ZoriBorderType)border, nullptr, record,
-                                        buf);
-}
-
 // One resize as tiles (a random partition, the last one asking past the
 // destination: 48), against the model; the fused levels also within 8 ulp
 // of the largest source magnitude (8u: 1) of the unfused model: each pass
@@ -111,9 +100,10 @@ template <typename T> void run_case(Path path, ZoriSize S, ZoriSize D, int32_t b
     ASSERT_EQ((path == kQ14 ? zoriResizeLinearInit_8u : zoriResizeLinearInit_32f)(S, D, rec.record()),
               zorStsNoErr);
     ASSERT_TRUE(zortest::record_guards_intact(rec));
-    Image<T> src(S.width + 2, S.height + 2, 0, rng.below(8) * sizeof(T));
-    src.randomize(rng);
-    if (stripes) src.fill([](int x, int y) { return 5 + ((x + y) & 1); });
+    zortest::ResizeSource<T> src(S.width, S.height, border, 1, rng.below(2));
+    src.f.fill([&](int x, int y) {
+        return stripes ? (T)(5 + ((x + y) & 1)) : zortest::Type<T>::random(rng);
+    });
     Image<T> got(D.width, D.height, (D.width + (int32_t)rng.below(5)) * sizeof(T),
                  rng.below(4) * sizeof(T));
     Image<T> want = got, loose = got;
@@ -131,24 +121,17 @@ template <typename T> void run_case(Path path, ZoriSize S, ZoriSize D, int32_t b
             for (int32_t i = 0; i < D.width; ++i) im->set(i, j, m.pixel(i, j));
         m.fused = false;
     }
-    const std::vector<ZoriRect> tiles = zortest::random_tiles(D, rng);
-    for (const ZoriRect& r : tiles) {
-        const int32_t over = &r == &tiles.back() && rng.below(2) ? D.width : 0;
-        const ZoriSize size{r.width + over, r.height + (over ? (int32_t)rng.below(3) : 0)};
-        ZoriPoint off;
-        ASSERT_EQ(zoriResizeGetSrcOffset_8u(rec.record(), {r.x, r.y}, &off), zorStsNoErr);
-        int32_t n = 0;
-        std::vector<uint8_t> buf = zortest::resize_buffer(rec.record(), size, &n);
-        ASSERT_EQ(resize(src.ptr(off.x + 1, off.y + 1), src.step, got.ptr(r.x, r.y), got.step,
-                         {r.x, r.y}, size, border, rec.record(), buf.data()),
-                  over ? zorStsSizeWrn : zorStsNoErr);
-        ASSERT_TRUE(zortest::guard_intact(buf, (size_t)n));
-    }
+    ASSERT_NO_FATAL_FAILURE(zortest::resize_tiles(
+        rec.record(), D, rng, rng.below(2), [&](ZoriPoint o, ZoriRect r, ZoriSize z, Zor8u* b) {
+            return zortest::resize_op<T>(zoriInterLinear, src.ptr(o.x, o.y), src.f.step,
+                                         got.ptr(r.x, r.y), got.step, {r.x, r.y}, z, border,
+                                         rec.record(), b);
+        }));
     fesetround(FE_TONEAREST);
     double M = 0;
-    for (int32_t y = 0; y < src.h; ++y)
-        for (int32_t x = 0; x < src.w; ++x)
-            if (isfinite((double)src.get(x, y))) M = std::max(M, fabs((double)src.get(x, y)));
+    for (int32_t y = -src.u; y < src.f.h - src.u; ++y)
+        for (int32_t x = -src.l; x < src.f.w - src.l; ++x)
+            if (isfinite(src.get(x, y))) M = std::max(M, fabs(src.get(x, y)));
     const double bound = path == kFloat32f ? 8 * ldexp(1.0, ilogb(std::max(M, 1e-30)) - 23) : 1;
     for (int32_t y = 0; y < D.height; ++y)
         for (int32_t x = 0; x < D.width; ++x) {
@@ -159,9 +142,6 @@ template <typename T> void run_case(Path path, ZoriSize S, ZoriSize D, int32_t b
     ASSERT_TRUE(same_bytes(got, want));
 }
 
-const int32_t kBorders[] = {1,      240,     241,          1 | 16,     1 | 32,
-                            1 | 64, 1 | 128, 1 | 16 | 128, 1 | 32 | 64};
-
 using Linear = zortest::LevelTest;
 
 // Widths across every vector tail (to two 64-byte vectors and one more),
@@ -169,12 +149,12 @@ using Linear = zortest::LevelTest;
 // 1-pixel destinations, each border form in turn; the float 8u path also
 // under directed rounding.
 TEST_P(Linear, SizesBordersAndTilesMatchTheModel) {
-    const bool fused = GetParam().index >= 4;  // l9, n0, k0 fuse the float kernels
+    const bool fused = zortest::fuses(GetParam());
     Rng rng(GetParam().index + 1);
     int k = 0;
     auto one = [&](Path path, ZoriSize S, ZoriSize D, int round) {
-        if (path == kFloat32f) return run_case<Zor32f>(path, S, D, kBorders[k % 9], fused, rng);
-        run_case<Zor8u>(path, S, D, kBorders[k % 9], fused, rng,
+        if (path == kFloat32f) return run_case<Zor32f>(path, S, D, zortest::kResizeBorders[k % 9], fused, rng);
+        run_case<Zor8u>(path, S, D, zortest::kResizeBorders[k % 9], fused, rng,
                         path == kQ14 ? FE_TONEAREST : round);
     };
     for (Path path : {kQ14, kFloat8u, kFloat32f})
@@ -198,36 +178,9 @@ TEST_P(Linear, SizesBordersAndTilesMatchTheModel) {
         run_case<Zor8u>(kQ14, {2, 2}, {16384, 4}, 1, fused, rng, FE_TONEAREST, true));
 }
 
-// Sources against unreadable pages, rows back to back: the replicated
-// border reads nothing outside the image, on either record for 8u.
-TEST_P(Linear, ReadsOnlyTheImage) {
-    for (const ZoriSize S : {ZoriSize{2, 2}, ZoriSize{37, 5}, ZoriSize{100, 3}})
-        for (const ZoriSize D :
-             {ZoriSize{1, 1}, ZoriSize{S.width * 3, S.height * 2}, ZoriSize{S.width / 2 + 1, 2}})
-            for (bool atEnd : {false, true}) {
-                zortest::ResizeRecord r8 = zortest::resize_record(S, D, zoriInterLinear), rf = r8;
-                ASSERT_EQ(zoriResizeLinearInit_8u(S, D, r8.record()), zorStsNoErr);
-                ASSERT_EQ(zoriResizeLinearInit_32f(S, D, rf.record()), zorStsNoErr);
-                std::vector<uint8_t> buf = zortest::resize_buffer(r8.record(), D);
-                zortest::Fenced<Zor8u> s8(S.width, S.height, atEnd);
-                zortest::Fenced<Zor32f> sf(S.width, S.height, atEnd);
-                s8.fill([](int x, int y) { return x * 7 + y; });
-                sf.fill([](int x, int y) { return x * 0.5f - y; });
-                std::vector<Zor32f> out((size_t)D.width * D.height);
-                for (const ZoriResizeSpec* record : {r8.record(), rf.record()})
-                    EXPECT_EQ(resize(s8.ptr(), s8.step, (Zor8u*)out.data(), D.width, {0, 0}, D, 1,
-                                     record, buf.data()),
-                              zorStsNoErr);
-                EXPECT_EQ(resize(sf.ptr(), sf.step, out.data(), D.width * 4, {0, 0}, D, 1,
-                                 rf.record(), buf.data()),
-                          zorStsNoErr);
-            }
-}
-
 TEST_P(Linear, ChecksInOrderWriteNothing) {
     const ZoriSize S{9, 7}, D{5, 4};
-    zortest::ResizeRecord q = zortest::resize_record(S, D, zoriInterLinear), f = q, bad = q,
-                          nn = zortest::resize_record(S, D, zoriInterNN);
+    zortest::ResizeRecord q = zortest::resize_record(S, D, zoriInterLinear), f = q, bad = q;
     struct InitRow {
         ZorStatus want;
         const char* what;
@@ -246,49 +199,7 @@ TEST_P(Linear, ChecksInOrderWriteNothing) {
     zortest::run_checks(rows, [&] { return zortest::guard_intact(bad.mem, 0); });
     ASSERT_EQ(zoriResizeLinearInit_8u(S, D, q.record()), zorStsNoErr);
     ASSERT_EQ(zoriResizeLinearInit_32f(S, D, f.record()), zorStsNoErr);
-    ASSERT_EQ(zoriResizeNearestInit_8u(S, D, nn.record()), zorStsNoErr);
-    std::vector<uint8_t> buf = zortest::resize_buffer(q.record(), D);
-    Image<Zor32f> src(S.width, S.height), dst(D.width, D.height);
-    const Image<Zor32f> before = dst;
-    struct OpRow {
-        ZorStatus want;
-        const char* what;
-        int32_t border, step;
-        bool noSrc, noBuf;
-        ZoriPoint off;
-        ZoriSize size;
-        ZoriResizeSpec* record;
-    };
-    const OpRow ops[] = {
-        {zorStsBorderErr, "border 0 before all", 0, 1, true, true, {0, 0}, D, nullptr},
-        {zorStsBorderErr, "border 257", 257, 36, false, false, {0, 0}, D, f.record()},
-        {zorStsBorderErr, "mirror", 3 | 16, 36, false, false, {0, 0}, D, f.record()},
-        {zorStsNullPtrErr, "null source", 1, 36, true, false, {0, 0}, D, f.record()},
-        {zorStsNullPtrErr, "null buffer", 1, 36, false, true, {0, 0}, D, f.record()},
-        {zorStsNoOperation,
-         "zero size, bad record",
-         1,
-         36,
-         false,
-         false,
-         {0, 0},
-         {0, 4},
-         bad.record()},
-        {zorStsContextMatchErr, "record id", 1, 36, false, false, {0, 0}, {-1, 4}, bad.record()},
-        {zorStsSizeErr, "negative size", 1, 37, false, false, {0, 0}, {-1, 4}, f.record()},
-        {zorStsStepErr, "step", 1, 37, false, false, {9, 0}, D, f.record()},
-        {zorStsOutOfRangeErr, "offset", 1, 36, false, false, {5, 0}, D, f.record()},
-        {zorStsOutOfRangeErr, "negative offset", 1, 36, false, false, {0, -1}, D, f.record()},
-        {zorStsContextMatchErr, "nearest record", 1, 36, false, false, {0, 0}, D, nn.record()},
-        {zorStsContextMatchErr, "fixed-point record", 1, 36, false, false, {0, 0}, D, q.record()}};
-    rows.clear();
-    for (const OpRow& r : ops)
-        rows.push_back({r.want, r.what, [&, r] {
-                            return resize(r.noSrc ? nullptr : src.ptr(), r.step, dst.ptr(),
-                                          dst.step, r.off, r.size, r.border, r.record,
-                                          r.noBuf ? nullptr : buf.data());
-                        }});
-    zortest::run_checks(rows, [&] { return (bool)same_bytes(dst, before); });
+    zortest::filter_op_checks(zoriInterLinear, S, D, f.record(), {q.record()});  // 8u record
 }
 
 ZOR_INSTANTIATE_LEVELS(Linear);

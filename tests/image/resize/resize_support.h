@@ -5,9 +5,11 @@
 #define ZOR_TEST_RESIZE_SUPPORT_H
 
 #include <algorithm>
+#include <map>
 #include <vector>
 
 #include "image.h"
+#include "zortest.h"
 
 namespace zortest {
 
@@ -67,6 +69,126 @@ inline std::vector<ZoriRect> random_tiles(ZoriSize dst, Rng& rng, int32_t maxCut
         for (size_t i = 0; i + 1 < xs.size(); ++i)
             tiles.push_back({xs[i], ys[j], xs[i + 1] - xs[i], ys[j + 1] - ys[j]});
     return tiles;
+}
+
+
+// The border forms the filter methods take: replicate, all in memory, and
+// replicate with one or two sides in memory.
+const int32_t kResizeBorders[] = {1,      240,     241,          1 | 16,      1 | 32,
+                                  1 | 64, 1 | 128, 1 | 16 | 128, 1 | 32 | 64};
+
+// l9, n0 and k0 fuse the float kernels; the others multiply, then add.
+inline bool fuses(const Level& l) { return l.index >= 4; }
+
+// Results of levels with one arithmetic agree bit for bit: the first level
+// to run case `key` keeps its bytes for the others.
+inline bool agrees_within_group(bool fused, uint64_t key, const std::vector<uint8_t>& bytes) {
+    static std::map<uint64_t, std::vector<uint8_t>> seen[2];
+    std::vector<uint8_t>& first = seen[fused][key];
+    if (first.empty()) first = bytes;
+    return first == bytes;
+}
+
+// One name for the six operations: method, then the type of the pixels.
+template <typename T>
+ZorStatus resize_op(ZoriInterpolationType m, const T* s, int32_t ss, T* d, int32_t ds, ZoriPoint o,
+                    ZoriSize z, int32_t border, const ZoriResizeSpec* r, Zor8u* b) {
+    const ZoriBorderType bt = (ZoriBorderType)border;
+    if constexpr (sizeof(T) == 1) {
+        if (m == zoriInterNN) return zoriResizeNearest_8u_C1R(s, ss, d, ds, o, z, r, b);
+        if (m == zoriInterLinear) return zoriResizeLinear_8u_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
+        return zoriResizeCubic_8u_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
+    } else {
+        if (m == zoriInterNN) return zoriResizeNearest_32f_C1R(s, ss, d, ds, o, z, r, b);
+        if (m == zoriInterLinear) return zoriResizeLinear_32f_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
+        return zoriResizeCubic_32f_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
+    }
+}
+
+// A W x H source with `margin` real pixels on each side a border form puts
+// in memory and none elsewhere, rows with a pixel of slack, against an
+// unreadable page: no read may leave what the flags promise.
+template <typename T> struct ResizeSource {
+    int32_t l, u;
+    Fenced<T> f;
+    ResizeSource(int32_t W, int32_t H, int32_t border, int32_t margin, bool atEnd)
+        : l(border & 64 ? margin : 0), u(border & 16 ? margin : 0),
+          f(W + l + (border & 128 ? margin : 0), H + u + (border & 32 ? margin : 0), atEnd,
+            (W + l + (border & 128 ? margin : 0) + 1) * (int32_t)sizeof(T)) {}
+    T* ptr(int32_t x, int32_t y) { return f.ptr(x + l, y + u); }
+    double get(int32_t x, int32_t y) {
+        T v;
+        memcpy(&v, ptr(x, y), sizeof v);
+        return (double)v;
+    }
+};
+
+// The destination as random tiles, each from the source offset the record
+// gives, with a guarded buffer of the size queried for it; with `over`, the
+// tiles at the right edge ask past the destination (and the bottom one
+// below it): clipped, 48. `call(offset, tile, size, buffer)`.
+template <typename F>
+void resize_tiles(const ZoriResizeSpec* record, ZoriSize dst, Rng& rng, bool over, F call) {
+    for (const ZoriRect& t : random_tiles(dst, rng)) {
+        ZoriPoint off{-1, -1};
+        ASSERT_EQ(zoriResizeGetSrcOffset_8u(record, {t.x, t.y}, &off), zorStsNoErr);
+        const bool past = over && t.x + t.width == dst.width;
+        const ZoriSize size{past ? dst.width + 1 : t.width,
+                            t.height + (past && t.y + t.height == dst.height)};
+        int32_t n = 0;
+        std::vector<uint8_t> buf = resize_buffer(record, size, &n);
+        ASSERT_EQ(call(off, t, size, buf.data()), past ? zorStsSizeWrn : zorStsNoErr)
+            << t.x << "," << t.y << " " << size.width << "x" << size.height;
+        ASSERT_TRUE(guard_intact(buf, (size_t)n));
+    }
+}
+
+// The operation checks of a filter method (32f), in order: each row breaks
+// one argument and passes every earlier check, nothing is written; `extra`
+// rows follow. Then a tile past the destination is clipped, 48, written.
+inline void filter_op_checks(ZoriInterpolationType m, ZoriSize S, ZoriSize D,
+                             const ZoriResizeSpec* ok,
+                             const std::vector<const ZoriResizeSpec*>& extra = {}) {
+    ResizeRecord nn = resize_record(S, D, zoriInterNN);
+    EXPECT_EQ(zoriResizeNearestInit_8u(S, D, nn.record()), zorStsNoErr);
+    std::vector<uint8_t> buf = resize_buffer(ok, D), zero(512, 0);
+    Image<Zor32f> src(S.width, S.height), dst(D.width, D.height);
+    const Image<Zor32f> before = dst;
+    src.fill([](int x, int y) { return 1.0f + (float)(x + y); });
+    const ZoriResizeSpec* bad = (const ZoriResizeSpec*)zero.data();
+    const int32_t st = src.step, odd = src.step + 1;
+    auto row = [&](ZorStatus want, const char* what, int32_t border, int32_t step, ZoriPoint at,
+                   ZoriSize size, const ZoriResizeSpec* r, int nulls) {  // 1 src, 2 dst, 4 buffer
+        return CheckRow{want, what, [=, &src, &dst, &buf] {
+                            return resize_op<Zor32f>(m, nulls & 1 ? nullptr : src.ptr(), step,
+                                                     nulls & 2 ? nullptr : dst.ptr(), dst.step, at,
+                                                     size, border, r, nulls & 4 ? nullptr : buf.data());
+                        }};
+    };
+    std::vector<CheckRow> rows = {
+        row(zorStsBorderErr, "border 0 before all", 0, st, {0, 0}, D, nullptr, 7),
+        row(zorStsBorderErr, "border 3", 3, st, {0, 0}, D, ok, 0),
+        row(zorStsBorderErr, "mirror", 3 | 16, st, {0, 0}, D, ok, 0),
+        row(zorStsBorderErr, "border 257", 257, st, {0, 0}, D, ok, 0),
+        row(zorStsNullPtrErr, "null source", 1, st, {0, 0}, D, ok, 1),
+        row(zorStsNullPtrErr, "null destination", 1, st, {0, 0}, D, ok, 2),
+        row(zorStsNullPtrErr, "null record", 1, st, {0, 0}, D, nullptr, 0),
+        row(zorStsNullPtrErr, "null buffer", 1, st, {0, 0}, D, ok, 4),
+        row(zorStsNoOperation, "zero size before id", 1, odd, {9, 0}, {0, 1}, bad, 0),
+        row(zorStsContextMatchErr, "record id", 1, odd, {9, 0}, {-1, 1}, bad, 0),
+        row(zorStsSizeErr, "negative size", 1, odd, {9, 0}, {-1, 1}, ok, 0),
+        row(zorStsStepErr, "step", 1, odd, {9, 0}, D, ok, 0),
+        row(zorStsOutOfRangeErr, "x", 1, st, {D.width, 0}, D, ok, 0),
+        row(zorStsOutOfRangeErr, "negative y", 1, st, {0, -1}, D, ok, 0),
+        row(zorStsOutOfRangeErr, "y", 1, st, {0, D.height}, D, ok, 0),
+        row(zorStsContextMatchErr, "nearest record", 1, st, {0, 0}, D, nn.record(), 0)};
+    for (const ZoriResizeSpec* r : extra)
+        rows.push_back(row(zorStsContextMatchErr, "other record", 1, st, {0, 0}, D, r, 0));
+    run_checks(rows, [&] { return (bool)same_bytes(dst, before); });
+    EXPECT_EQ(resize_op<Zor32f>(m, src.ptr(), st, dst.ptr(), dst.step, {0, 0},
+                                {D.width + 1, D.height + 1}, 1, ok, buf.data()),
+              zorStsSizeWrn);
+    EXPECT_FALSE(same_bytes(dst, before)) << "the clipped tile was not written";
 }
 
 }  // namespace zortest
