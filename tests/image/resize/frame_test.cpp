@@ -95,20 +95,6 @@ int32_t model_shift(int64_t off, int64_t srcLen, int64_t dstLen) {
     return (int32_t)floor((double)off * ((double)srcLen / (double)dstLen));
 }
 
-// The index rule's stated cases, so that the model cannot drift with the
-// library: halving takes even pixels, doubling repeats, one pixel out of
-// 2n is n - 1 (of an odd length the middle).
-TEST(ResizeFrame, ModelKeepsTheTieBreak) {
-    for (int i = 0; i < 50; ++i)
-        ASSERT_TRUE(model_index(i, 100, 50) == 2 * i && model_index(i, 50, 100) == i / 2 &&
-                    model_index(0, 2 * i + 2, 1) == i && model_index(0, 2 * i + 1, 1) == i);
-}
-
-template <typename T> ZorStatus run(const T* s, int32_t ss, T* d, int32_t ds, ZoriPoint o,
-                                    ZoriSize z, const ZoriResizeSpec* r, Zor8u* b) {
-    return zortest::resize_op<T>(zoriInterNN, s, ss, d, ds, o, z, 0, r, b);
-}
-
 // One record, made under `initLevel` through the 8u or the float name in
 // turn; the destination in random tiles; then the whole image against the
 // model, bit for bit.
@@ -162,8 +148,8 @@ void nearest_case(ZoriSize src, ZoriSize dst, uint32_t seed, const zortest::Leve
                 o.y == model_shift(t.y, src.height, dst.height) && o32.y == o.y && ro.y == o.y &&
                 rs.width == rw - o.x && rs.height == rh - o.y;
             if (!ok) return (ZorStatus)-999;  // reading from a wrong offset may fault
-            return run(s.ptr(o.x, o.y), s.step, out.ptr(t.x, t.y), out.step, {t.x, t.y}, z,
-                       rec.record(), b);
+            return zortest::resize_op<T>(zoriInterNN, s.ptr(o.x, o.y), s.step, out.ptr(t.x, t.y),
+                                         out.step, {t.x, t.y}, z, 0, rec.record(), b);
         }));
     ASSERT_TRUE(same_bytes(out, want));
     ASSERT_TRUE(zortest::record_guards_intact(rec));
@@ -189,17 +175,12 @@ TEST_P(ResizeNearest, TilesMatchTheModel) {
             ASSERT_NO_FATAL_FAILURE(nearest_case<Zor8u>(src, dst, seed, GetParam(), other));
             ASSERT_NO_FATAL_FAILURE(nearest_case<Zor32f>(src, dst, seed + 99, GetParam(), other));
         }
-    const ZoriSize wide[][2] = {{{1920, 4}, {960, 3}},
-                                {{1920, 3}, {1280, 5}},
-                                {{960, 2}, {1920, 4}},
-                                {{999, 3}, {461, 3}},
-                                {{1000, 3}, {1000, 3}}};
+    const ZoriSize wide[][2] = {{{1920, 4}, {960, 3}}, {{1920, 3}, {1280, 5}}, {{960, 2}, {1920, 4}},
+                                {{999, 3}, {461, 3}},  {{1000, 3}, {1000, 3}}};
     for (const auto& c : wide)
         for (int k = 0; k < 4; ++k) {
-            ASSERT_NO_FATAL_FAILURE(
-                nearest_case<Zor8u>(c[0], c[1], ++seed, GetParam(), GetParam()));
-            ASSERT_NO_FATAL_FAILURE(
-                nearest_case<Zor32f>(c[0], c[1], ++seed, GetParam(), GetParam()));
+            ASSERT_NO_FATAL_FAILURE(nearest_case<Zor8u>(c[0], c[1], ++seed, GetParam(), GetParam()));
+            ASSERT_NO_FATAL_FAILURE(nearest_case<Zor32f>(c[0], c[1], ++seed, GetParam(), GetParam()));
         }
 }
 
@@ -272,42 +253,11 @@ TEST(ResizeFrame, QueriesCheckInOrder) {
 }
 
 TEST_P(ResizeNearest, OperationsCheckInOrderWriteNothing) {
-    auto body = [](auto t) {
-        typedef decltype(t) T;
-        zortest::ResizeRecord rec = nearest_record(), bad = nearest_record(0);
-        zortest::ResizeRecord other = zortest::resize_record({8, 6}, {5, 4}, zoriInterLinear);
-        EXPECT_EQ(zoriResizeLinearInit_8u({8, 6}, {5, 4}, other.record()), zorStsNoErr);
-        Image<T> src(8, 6), dst(5, 4);
-        const Image<T> before = dst;
-        std::vector<uint8_t> buf = zortest::resize_buffer(rec.record(), {5, 4});
-        const ZoriResizeSpec *sp = rec.record(), *bp = bad.record(), *op = other.record();
-        const T* s = src.ptr();
-        T* d = dst.ptr();
-        Zor8u* b = buf.data();
-        const int32_t ss = src.step, ds = dst.step, odd = sizeof(T) == 4 ? 2 : 0;
-        std::vector<zortest::CheckRow> rows = {
-            {zorStsNullPtrErr, "src", CALL(run<T>(nullptr, 1, d, ds, {0, 0}, {0, 4}, bp, b))},
-            {zorStsNullPtrErr, "dst", CALL(run<T>(s, 1, nullptr, ds, {0, 0}, {0, 4}, bp, b))},
-            {zorStsNullPtrErr, "record", CALL(run<T>(s, 1, d, ds, {0, 0}, {0, 4}, nullptr, b))},
-            {zorStsNullPtrErr, "buffer", CALL(run<T>(s, 1, d, ds, {0, 0}, {0, 4}, bp, nullptr))},
-            {zorStsNoOperation, "zero, id", CALL(run<T>(s, 1, d, ds, {-1, 0}, {5, 0}, bp, b))},
-            {zorStsContextMatchErr, "id", CALL(run<T>(s, 1, d, ds, {-1, 0}, {-5, 4}, bp, b))},
-            {zorStsSizeErr, "negative", CALL(run<T>(s, 1, d, ds, {-1, 0}, {-5, 4}, sp, b))},
-            {odd ? zorStsStepErr : zorStsOutOfRangeErr, "src step",
-             CALL(run<T>(s, ss + odd, d, ds, {-1, 0}, {5, 4}, sp, b))},
-            {odd ? zorStsStepErr : zorStsOutOfRangeErr, "dst step",
-             CALL(run<T>(s, ss, d, ds - odd, {-1, 0}, {5, 4}, sp, b))},
-            {zorStsOutOfRangeErr, "x", CALL(run<T>(s, ss, d, ds, {5, 0}, {5, 4}, sp, b))},
-            {zorStsOutOfRangeErr, "y", CALL(run<T>(s, ss, d, ds, {0, 4}, {5, 4}, sp, b))},
-            {zorStsContextMatchErr, "method", CALL(run<T>(s, ss, d, ds, {0, 0}, {5, 4}, op, b))}};
-        zortest::run_checks(rows, [&] { return (bool)same_bytes(dst, before); });
-        // The 8u rows may start anywhere and take odd steps.
-        if (!odd) {
-            EXPECT_EQ(run(s, ss + 1, d, ds - 1, {0, 0}, {4, 4}, sp, b), zorStsNoErr);
-        }
-    };
-    body(Zor8u());
-    body(Zor32f());
+    zortest::ResizeRecord rec = nearest_record(),
+                          lin = zortest::resize_record({8, 6}, {5, 4}, zoriInterLinear);
+    EXPECT_EQ(zoriResizeLinearInit_8u({8, 6}, {5, 4}, lin.record()), zorStsNoErr);
+    zortest::resize_op_checks<Zor8u>(zoriInterNN, {8, 6}, {5, 4}, rec.record(), {lin.record()});
+    zortest::resize_op_checks<Zor32f>(zoriInterNN, {8, 6}, {5, 4}, rec.record(), {lin.record()});
 }
 
 ZOR_INSTANTIATE_LEVELS(ResizeNearest);

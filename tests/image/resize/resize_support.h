@@ -143,50 +143,59 @@ void resize_tiles(const ZoriResizeSpec* record, ZoriSize dst, Rng& rng, bool ove
     }
 }
 
-// The operation checks of a filter method (32f), in order: each row breaks
-// one argument and passes every earlier check, nothing is written; `extra`
-// rows follow. Then a tile past the destination is clipped, 48, written.
-inline void filter_op_checks(ZoriInterpolationType m, ZoriSize S, ZoriSize D,
-                             const ZoriResizeSpec* ok,
-                             const std::vector<const ZoriResizeSpec*>& extra = {}) {
+// The operation checks, in order: each row breaks one argument and passes
+// every earlier check, nothing is written. A record of each method in
+// `others` (and nearest's, for a filter method) is refused. Odd steps fail
+// 32f only: for 8u that row fails the offset after them. Then a tile past
+// the destination is clipped, 48, and written.
+template <typename T>
+void resize_op_checks(ZoriInterpolationType m, ZoriSize S, ZoriSize D, const ZoriResizeSpec* ok,
+                      std::vector<const ZoriResizeSpec*> others) {
     ResizeRecord nn = resize_record(S, D, zoriInterNN);
     EXPECT_EQ(zoriResizeNearestInit_8u(S, D, nn.record()), zorStsNoErr);
+    if (m != zoriInterNN) others.push_back(nn.record());
     std::vector<uint8_t> buf = resize_buffer(ok, D), zero(512, 0);
-    Image<Zor32f> src(S.width, S.height), dst(D.width, D.height);
-    const Image<Zor32f> before = dst;
-    src.fill([](int x, int y) { return 1.0f + (float)(x + y); });
+    Image<T> src(S.width, S.height), dst(D.width, D.height);
+    const Image<T> before = dst;
+    src.fill([](int x, int y) { return (T)(1 + x + y); });
     const ZoriResizeSpec* bad = (const ZoriResizeSpec*)zero.data();
-    const int32_t st = src.step, odd = src.step + 1;
-    auto row = [&](ZorStatus want, const char* what, int32_t border, int32_t step, ZoriPoint at,
-                   ZoriSize size, const ZoriResizeSpec* r, int nulls) {  // 1 src, 2 dst, 4 buffer
-        return CheckRow{want, what, [=, &src, &dst, &buf] {
-                            return resize_op<Zor32f>(m, nulls & 1 ? nullptr : src.ptr(), step,
-                                                     nulls & 2 ? nullptr : dst.ptr(), dst.step, at,
-                                                     size, border, r, nulls & 4 ? nullptr : buf.data());
+    const int32_t st = src.step, odd = src.step + 1, dodd = dst.step - 1;
+    const ZorStatus step = sizeof(T) == 4 ? zorStsStepErr : zorStsOutOfRangeErr;
+    auto row = [&](ZorStatus want, const char* what, int32_t border, int32_t ss, ZoriPoint at,
+                   ZoriSize size, const ZoriResizeSpec* r, int nulls, int32_t ds = 0) {
+        return CheckRow{want, what, [=, &src, &dst, &buf] {  // nulls: 1 src, 2 dst, 4 buffer
+                            return resize_op<T>(m, nulls & 1 ? nullptr : src.ptr(), ss,
+                                                nulls & 2 ? nullptr : dst.ptr(), ds ? ds : dst.step,
+                                                at, size, border, r, nulls & 4 ? nullptr : buf.data());
                         }};
     };
-    std::vector<CheckRow> rows = {
-        row(zorStsBorderErr, "border 0 before all", 0, st, {0, 0}, D, nullptr, 7),
-        row(zorStsBorderErr, "border 3", 3, st, {0, 0}, D, ok, 0),
-        row(zorStsBorderErr, "mirror", 3 | 16, st, {0, 0}, D, ok, 0),
-        row(zorStsBorderErr, "border 257", 257, st, {0, 0}, D, ok, 0),
-        row(zorStsNullPtrErr, "null source", 1, st, {0, 0}, D, ok, 1),
-        row(zorStsNullPtrErr, "null destination", 1, st, {0, 0}, D, ok, 2),
-        row(zorStsNullPtrErr, "null record", 1, st, {0, 0}, D, nullptr, 0),
-        row(zorStsNullPtrErr, "null buffer", 1, st, {0, 0}, D, ok, 4),
-        row(zorStsNoOperation, "zero size before id", 1, odd, {9, 0}, {0, 1}, bad, 0),
-        row(zorStsContextMatchErr, "record id", 1, odd, {9, 0}, {-1, 1}, bad, 0),
-        row(zorStsSizeErr, "negative size", 1, odd, {9, 0}, {-1, 1}, ok, 0),
-        row(zorStsStepErr, "step", 1, odd, {9, 0}, D, ok, 0),
-        row(zorStsOutOfRangeErr, "x", 1, st, {D.width, 0}, D, ok, 0),
-        row(zorStsOutOfRangeErr, "negative y", 1, st, {0, -1}, D, ok, 0),
-        row(zorStsOutOfRangeErr, "y", 1, st, {0, D.height}, D, ok, 0),
-        row(zorStsContextMatchErr, "nearest record", 1, st, {0, 0}, D, nn.record(), 0)};
-    for (const ZoriResizeSpec* r : extra)
+    std::vector<CheckRow> rows;
+    if (m != zoriInterNN)
+        rows = {row(zorStsBorderErr, "border 0 before all", 0, st, {0, 0}, D, nullptr, 7),
+                row(zorStsBorderErr, "border 3", 3, st, {0, 0}, D, ok, 0),
+                row(zorStsBorderErr, "mirror", 3 | 16, st, {0, 0}, D, ok, 0),
+                row(zorStsBorderErr, "border 257", 257, st, {0, 0}, D, ok, 0)};
+    for (const CheckRow& r :
+         {row(zorStsNullPtrErr, "null source", 1, st, {0, 0}, D, ok, 1),
+          row(zorStsNullPtrErr, "null destination", 1, st, {0, 0}, D, ok, 2),
+          row(zorStsNullPtrErr, "null record", 1, st, {0, 0}, D, nullptr, 0),
+          row(zorStsNullPtrErr, "null buffer", 1, st, {0, 0}, D, ok, 4),
+          row(zorStsNoOperation, "zero size before id", 1, odd, {9, 0}, {0, 1}, bad, 0),
+          row(zorStsContextMatchErr, "record id", 1, odd, {9, 0}, {-1, 1}, bad, 0),
+          row(zorStsSizeErr, "negative size", 1, odd, {9, 0}, {-1, 1}, ok, 0),
+          row(step, "source step", 1, odd, {9, 0}, D, ok, 0),
+          row(step, "destination step", 1, st, {-1, 0}, D, ok, 0, dodd),
+          row(zorStsOutOfRangeErr, "x", 1, st, {D.width, 0}, D, ok, 0),
+          row(zorStsOutOfRangeErr, "negative y", 1, st, {0, -1}, D, ok, 0),
+          row(zorStsOutOfRangeErr, "y", 1, st, {0, D.height}, D, ok, 0)})
+        rows.push_back(r);
+    for (const ZoriResizeSpec* r : others)
         rows.push_back(row(zorStsContextMatchErr, "other record", 1, st, {0, 0}, D, r, 0));
     run_checks(rows, [&] { return (bool)same_bytes(dst, before); });
-    EXPECT_EQ(resize_op<Zor32f>(m, src.ptr(), st, dst.ptr(), dst.step, {0, 0},
-                                {D.width + 1, D.height + 1}, 1, ok, buf.data()),
+    if (sizeof(T) == 1)  // 8u rows may start anywhere and take odd steps
+        EXPECT_EQ(row(zorStsNoErr, "", 1, odd, {0, 0}, {D.width - 1, D.height}, ok, 0, dodd).call(),
+                  zorStsNoErr);
+    EXPECT_EQ(row(zorStsSizeWrn, "", 1, st, {0, 0}, {D.width + 1, D.height + 1}, ok, 0).call(),
               zorStsSizeWrn);
     EXPECT_FALSE(same_bytes(dst, before)) << "the clipped tile was not written";
 }
