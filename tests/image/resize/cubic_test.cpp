@@ -22,15 +22,14 @@ struct Pair {
     float B, C;
     bool folded;  // the library folds the constants: weights may differ by an ulp
 };
-const Pair kPairs[] = {{0, 0.5f, false}, {1, 0, true}, {0.5f, 0.3f, true},
-                       {1 / 3.0f, 1 / 3.0f, false}, {-1, 2.5f, false}, {NAN, 0, false}};
+const Pair kPairs[] = {{0, 0.5f, false},   {1, 0, true},
+                       {0.5f, 0.3f, true}, {1 / 3.0f, 1 / 3.0f, false},
+                       {-1, 2.5f, false},  {NAN, 0, false}};
 
 double weight(double x, double B, double C) {
     if (x >= 2) return 0;
     if (x < 1) return ((2 - 1.5 * B - C) * x + (-3 + 2 * B + C)) * (x * x) + (1 - B / 3);
-    if (x < 2)
-        return (((-B / 6 - C) * x + (B + 5 * C)) * x - (2 * B + 8 * C)) * x + (4 * B / 3 + 4 * C);
-    return 1;
+    return (((-B / 6 - C) * x + (B + 5 * C)) * x - (2 * B + 8 * C)) * x + (4 * B / 3 + 4 * C);
 }
 
 // Per destination position: source index and four weights (Init flushes
@@ -83,11 +82,11 @@ bool near(float got, float v, float tol) { return isnan(v) ? isnan(got) : fabsf(
 // weight sums, four taps per pass and the passes' roundings move a result
 // by less than 2^-19 (1 + S T) M; the check allows twice that. Results of
 // levels with the same arithmetic must agree bit for bit.
-template <typename T>
-void run_case(int32_t W, int32_t H, ZoriSize dst, const Pair& p, int32_t border, bool fused,
-              uint32_t seed) {
-    SCOPED_TRACE(::testing::Message() << zortest::Type<T>::name << " " << W << "x" << H << " to "
-                 << dst.width << "x" << dst.height << " (" << p.B << ", " << p.C << ") " << border);
+template <typename T> void run_case(int32_t W, int32_t H, ZoriSize dst, const Pair& p,
+                                    int32_t border, bool fused, uint32_t seed) {
+    SCOPED_TRACE(::testing::Message()
+                 << zortest::Type<T>::name << " " << W << "x" << H << " to " << dst.width << "x"
+                 << dst.height << " (" << p.B << ", " << p.C << ") " << border);
     Rng rng(seed);
     // Two pixels on each in-memory side: an enlargement's first window
     // starts at -2.
@@ -116,9 +115,11 @@ void run_case(int32_t W, int32_t H, ZoriSize dst, const Pair& p, int32_t border,
             float r[4], m = 0, S = 0, Tw = 0;
             for (int a = 0; a < 4; ++a) {
                 float px[4];
-                const int32_t sy = tap(ay.index[y], a, H, mem || (border & 16), mem || (border & 32));
+                const int32_t sy =
+                    tap(ay.index[y], a, H, mem || (border & 16), mem || (border & 32));
                 for (int b = 0; b < 4; ++b) {
-                    px[b] = (float)s.get(tap(ax.index[x], b, W, mem || (border & 64), mem || (border & 128)), sy);
+                    px[b] = (float)s.get(
+                        tap(ax.index[x], b, W, mem || (border & 64), mem || (border & 128)), sy);
                     m = fmaxf(m, fabsf(px[b]));
                 }
                 r[a] = quad(px, &ax.w[4 * x], fused);

@@ -42,7 +42,7 @@ Sizes model_sizes(ZoriSize s, ZoriSize d, int interp, int aa) {
         const int64_t tx = sx <= 1 ? t0 : 2 * (int64_t)ceil(t0 * sx);
         const int64_t ty = sy <= 1 ? t0 : 2 * (int64_t)ceil(t0 * sy);
         r.record = 368 + 4 * (aw + ah) + a32(4 * dw * tx) + a32(4 * dh * ty) +
-                 (sx <= 1 && interp == 2 ? a32(4 * dw) : 0);
+                   (sx <= 1 && interp == 2 ? a32(4 * dw) : 0);
         r.init = 64 + 8 * (aw + ah);
     } else if (interp == 1 || interp == 2) {
         r.record = 368 + 4 * interp * (aw + ah);
@@ -81,7 +81,8 @@ TEST(ResizeFrame, GetSizeFollowsTheFormulas) {
             ASSERT_EQ(query(s, d, (ZoriInterpolationType)interp, aa, &record, &init), want.st)
                 << s.width << "x" << s.height << " -> " << d.width << "x" << d.height << " method "
                 << interp << " aa " << aa;
-            ASSERT_TRUE(record == (written ? want.record : -7) && init == (written ? want.init : -7));
+            ASSERT_TRUE(record == (written ? want.record : -7) &&
+                        init == (written ? want.init : -7));
         }
     }
 }
@@ -98,9 +99,9 @@ int32_t model_shift(int64_t off, int64_t srcLen, int64_t dstLen) {
 // One record, made under `initLevel` through the 8u or the float name in
 // turn; the destination in random tiles; then the whole image against the
 // model, bit for bit.
-template <typename T>
-void nearest_case(ZoriSize src, ZoriSize dst, uint32_t seed, const zortest::Level& runLevel,
-                  const zortest::Level& initLevel) {
+template <typename T> void nearest_case(ZoriSize src, ZoriSize dst, uint32_t seed,
+                                        const zortest::Level& runLevel,
+                                        const zortest::Level& initLevel) {
     SCOPED_TRACE(::testing::Message() << zortest::Type<T>::name << " " << src.width << "x"
                                       << src.height << " -> " << dst.width << "x" << dst.height
                                       << " seed " << seed << " init " << initLevel.name);
@@ -116,19 +117,13 @@ void nearest_case(ZoriSize src, ZoriSize dst, uint32_t seed, const zortest::Leve
     // pixel or after its last: no path may read outside the image.
     const int32_t e = sizeof(T), pad = (int32_t)rng.below(3) * (e == 1 ? 3 : 4);
     zortest::Fenced<T> s(src.width, src.height, seed & 2, src.width * e + pad);
-    s.fill([&](int, int) {
-        if constexpr (sizeof(T) == 1)
-            return (T)rng.next();
-        else
-            return zortest::bits_f(rng.next());  // any bits: NaN payloads too
-    });
+    // Any bits for 32f: NaN payloads too.
+    s.fill([&](int, int) { return e == 1 ? (T)rng.next() : (T)zortest::bits_f(rng.next()); });
+    auto mx = [&](int32_t i) { return model_index(i, src.width, dst.width); };
+    auto my = [&](int32_t i) { return model_index(i, src.height, dst.height); };
     Image<T> out(dst.width, dst.height, dst.width * e + pad, seed % 7), want = out;
     for (int32_t y = 0; y < dst.height; ++y)
-        for (int32_t x = 0; x < dst.width; ++x)
-            memcpy(
-                want.bytes(x, y),
-                s.ptr(model_index(x, src.width, dst.width), model_index(y, src.height, dst.height)),
-                e);
+        for (int32_t x = 0; x < dst.width; ++x) memcpy(want.bytes(x, y), s.ptr(mx(x), my(y)), e);
     ASSERT_NO_FATAL_FAILURE(zortest::resize_tiles(
         rec.record(), dst, rng, seed & 4, [&](ZoriPoint o, ZoriRect t, ZoriSize z, Zor8u* b) {
             const int32_t lx = t.x + t.width, ly = t.y + t.height;
@@ -136,10 +131,8 @@ void nearest_case(ZoriSize src, ZoriSize dst, uint32_t seed, const zortest::Leve
             ZoriSize rs{-1, -1};
             // The source rectangle runs to the last centre's pixel, or to the
             // source's end for a tile at the destination's last column or row.
-            const int32_t rw =
-                lx == dst.width ? src.width : model_index(lx - 1, src.width, dst.width) + 1;
-            const int32_t rh =
-                ly == dst.height ? src.height : model_index(ly - 1, src.height, dst.height) + 1;
+            const int32_t rw = lx == dst.width ? src.width : mx(lx - 1) + 1;
+            const int32_t rh = ly == dst.height ? src.height : my(ly - 1) + 1;
             const bool ok =
                 zoriResizeGetSrcOffset_32f(rec.record(), {t.x, t.y}, &o32) == zorStsNoErr &&
                 zoriResizeGetSrcRoi_8u(rec.record(), {t.x, t.y}, {t.width, t.height}, &ro, &rs) ==
@@ -175,12 +168,16 @@ TEST_P(ResizeNearest, TilesMatchTheModel) {
             ASSERT_NO_FATAL_FAILURE(nearest_case<Zor8u>(src, dst, seed, GetParam(), other));
             ASSERT_NO_FATAL_FAILURE(nearest_case<Zor32f>(src, dst, seed + 99, GetParam(), other));
         }
-    const ZoriSize wide[][2] = {{{1920, 4}, {960, 3}}, {{1920, 3}, {1280, 5}}, {{960, 2}, {1920, 4}},
-                                {{999, 3}, {461, 3}},  {{1000, 3}, {1000, 3}}};
+    const int32_t wide[][4] = {{1920, 4, 960, 3},
+                               {1920, 3, 1280, 5},
+                               {960, 2, 1920, 4},
+                               {999, 3, 461, 3},
+                               {1000, 3, 1000, 3}};
     for (const auto& c : wide)
         for (int k = 0; k < 4; ++k) {
-            ASSERT_NO_FATAL_FAILURE(nearest_case<Zor8u>(c[0], c[1], ++seed, GetParam(), GetParam()));
-            ASSERT_NO_FATAL_FAILURE(nearest_case<Zor32f>(c[0], c[1], ++seed, GetParam(), GetParam()));
+            const ZoriSize s{c[0], c[1]}, d{c[2], c[3]};
+            ASSERT_NO_FATAL_FAILURE(nearest_case<Zor8u>(s, d, ++seed, GetParam(), GetParam()));
+            ASSERT_NO_FATAL_FAILURE(nearest_case<Zor32f>(s, d, ++seed, GetParam(), GetParam()));
         }
 }
 

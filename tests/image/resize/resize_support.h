@@ -57,7 +57,8 @@ inline std::vector<ZoriRect> random_tiles(ZoriSize dst, Rng& rng, int32_t maxCut
     auto cuts = [&](int32_t len) {
         std::vector<int32_t> c{0};
         const int32_t n = (int32_t)rng.below((uint32_t)maxCuts + 1);
-        for (int32_t i = 0; i < n && len > 1; ++i) c.push_back(1 + (int32_t)rng.below((uint32_t)len - 1));
+        for (int32_t i = 0; i < n && len > 1; ++i)
+            c.push_back(1 + (int32_t)rng.below((uint32_t)len - 1));
         c.push_back(len);
         std::sort(c.begin(), c.end());
         c.erase(std::unique(c.begin(), c.end()), c.end());
@@ -71,10 +72,9 @@ inline std::vector<ZoriRect> random_tiles(ZoriSize dst, Rng& rng, int32_t maxCut
     return tiles;
 }
 
-
 // The border forms the filter methods take: replicate, all in memory, and
 // replicate with one or two sides in memory.
-const int32_t kResizeBorders[] = {1,      240,     241,          1 | 16,      1 | 32,
+const int32_t kResizeBorders[] = {1,      240,     241,          1 | 16,     1 | 32,
                                   1 | 64, 1 | 128, 1 | 16 | 128, 1 | 32 | 64};
 
 // l9, n0 and k0 fuse the float kernels; the others multiply, then add.
@@ -90,17 +90,19 @@ inline bool agrees_within_group(bool fused, uint64_t key, const std::vector<uint
 }
 
 // One name for the six operations: method, then the type of the pixels.
-template <typename T>
-ZorStatus resize_op(ZoriInterpolationType m, const T* s, int32_t ss, T* d, int32_t ds, ZoriPoint o,
-                    ZoriSize z, int32_t border, const ZoriResizeSpec* r, Zor8u* b) {
+template <typename T> ZorStatus resize_op(ZoriInterpolationType m, const T* s, int32_t ss, T* d,
+                                          int32_t ds, ZoriPoint o, ZoriSize z, int32_t border,
+                                          const ZoriResizeSpec* r, Zor8u* b) {
     const ZoriBorderType bt = (ZoriBorderType)border;
     if constexpr (sizeof(T) == 1) {
         if (m == zoriInterNN) return zoriResizeNearest_8u_C1R(s, ss, d, ds, o, z, r, b);
-        if (m == zoriInterLinear) return zoriResizeLinear_8u_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
+        if (m == zoriInterLinear)
+            return zoriResizeLinear_8u_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
         return zoriResizeCubic_8u_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
     } else {
         if (m == zoriInterNN) return zoriResizeNearest_32f_C1R(s, ss, d, ds, o, z, r, b);
-        if (m == zoriInterLinear) return zoriResizeLinear_32f_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
+        if (m == zoriInterLinear)
+            return zoriResizeLinear_32f_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
         return zoriResizeCubic_32f_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
     }
 }
@@ -112,7 +114,8 @@ template <typename T> struct ResizeSource {
     int32_t l, u;
     Fenced<T> f;
     ResizeSource(int32_t W, int32_t H, int32_t border, int32_t margin, bool atEnd)
-        : l(border & 64 ? margin : 0), u(border & 16 ? margin : 0),
+        : l(border & 64 ? margin : 0),
+          u(border & 16 ? margin : 0),
           f(W + l + (border & 128 ? margin : 0), H + u + (border & 32 ? margin : 0), atEnd,
             (W + l + (border & 128 ? margin : 0) + 1) * (int32_t)sizeof(T)) {}
     T* ptr(int32_t x, int32_t y) { return f.ptr(x + l, y + u); }
@@ -148,9 +151,9 @@ void resize_tiles(const ZoriResizeSpec* record, ZoriSize dst, Rng& rng, bool ove
 // `others` (and nearest's, for a filter method) is refused. Odd steps fail
 // 32f only: for 8u that row fails the offset after them. Then a tile past
 // the destination is clipped, 48, and written.
-template <typename T>
-void resize_op_checks(ZoriInterpolationType m, ZoriSize S, ZoriSize D, const ZoriResizeSpec* ok,
-                      std::vector<const ZoriResizeSpec*> others) {
+template <typename T> void resize_op_checks(ZoriInterpolationType m, ZoriSize S, ZoriSize D,
+                                            const ZoriResizeSpec* ok,
+                                            std::vector<const ZoriResizeSpec*> others) {
     ResizeRecord nn = resize_record(S, D, zoriInterNN);
     EXPECT_EQ(zoriResizeNearestInit_8u(S, D, nn.record()), zorStsNoErr);
     if (m != zoriInterNN) others.push_back(nn.record());
@@ -166,7 +169,8 @@ void resize_op_checks(ZoriInterpolationType m, ZoriSize S, ZoriSize D, const Zor
         return CheckRow{want, what, [=, &src, &dst, &buf] {  // nulls: 1 src, 2 dst, 4 buffer
                             return resize_op<T>(m, nulls & 1 ? nullptr : src.ptr(), ss,
                                                 nulls & 2 ? nullptr : dst.ptr(), ds ? ds : dst.step,
-                                                at, size, border, r, nulls & 4 ? nullptr : buf.data());
+                                                at, size, border, r,
+                                                nulls & 4 ? nullptr : buf.data());
                         }};
     };
     std::vector<CheckRow> rows;
