@@ -87,8 +87,6 @@ TEST(ResizeFrame, GetSizeFollowsTheFormulas) {
     }
 }
 
-// ---- nearest ----------------------------------------------------------------------
-
 int32_t model_index(int64_t i, int64_t srcLen, int64_t dstLen) {
     return (int32_t)(((double)i + 0.5) * ((double)srcLen / (double)dstLen) - 1e-10);
 }
@@ -180,8 +178,6 @@ TEST_P(ResizeNearest, TilesMatchTheModel) {
             ASSERT_NO_FATAL_FAILURE(nearest_case<Zor32f>(s, d, ++seed, GetParam(), GetParam()));
         }
 }
-
-// ---- checks in order ----------------------------------------------------------------
 
 // A nearest record 8x6 -> 5x4, its id (the first word) then set.
 zortest::ResizeRecord nearest_record(uint32_t id = 0x4B617389u) {

@@ -96,14 +96,12 @@ template <typename T> ZorStatus resize_op(ZoriInterpolationType m, const T* s, i
     const ZoriBorderType bt = (ZoriBorderType)border;
     if constexpr (sizeof(T) == 1) {
         if (m == zoriInterNN) return zoriResizeNearest_8u_C1R(s, ss, d, ds, o, z, r, b);
-        if (m == zoriInterLinear)
-            return zoriResizeLinear_8u_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
-        return zoriResizeCubic_8u_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
+        auto f = m == zoriInterLinear ? zoriResizeLinear_8u_C1R : zoriResizeCubic_8u_C1R;
+        return f(s, ss, d, ds, o, z, bt, nullptr, r, b);
     } else {
         if (m == zoriInterNN) return zoriResizeNearest_32f_C1R(s, ss, d, ds, o, z, r, b);
-        if (m == zoriInterLinear)
-            return zoriResizeLinear_32f_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
-        return zoriResizeCubic_32f_C1R(s, ss, d, ds, o, z, bt, nullptr, r, b);
+        auto f = m == zoriInterLinear ? zoriResizeLinear_32f_C1R : zoriResizeCubic_32f_C1R;
+        return f(s, ss, d, ds, o, z, bt, nullptr, r, b);
     }
 }
 
@@ -144,6 +142,30 @@ void resize_tiles(const ZoriResizeSpec* record, ZoriSize dst, Rng& rng, bool ove
             << t.x << "," << t.y << " " << size.width << "x" << size.height;
         ASSERT_TRUE(guard_intact(buf, (size_t)n));
     }
+}
+
+// Init's checks in order, writing nothing: a null record (and init buffer,
+// where one is taken), zero, then negative lengths, then a source below
+// `least` pixels on either axis. `init(src, dst, record, initBuffer)`.
+template <typename F>
+void resize_init_checks(F init, ZoriSize S, ZoriSize D, int32_t least, bool initBuffer) {
+    ResizeRecord r = resize_record(S, D, zoriInterCubic);
+    const std::vector<uint8_t> blank = r.mem;
+    ZoriResizeSpec* sp = r.record();
+    Zor8u* ib = r.initBuf();
+    auto row = [&](ZorStatus want, const char* what, ZoriSize s, ZoriSize d, ZoriResizeSpec* rp,
+                   Zor8u* b) {
+        return CheckRow{want, what, [=] { return init(s, d, rp, b); }};
+    };
+    std::vector<CheckRow> rows = {row(zorStsNullPtrErr, "null record", S, D, nullptr, ib)};
+    if (initBuffer) rows.push_back(row(zorStsNullPtrErr, "null init buffer", S, D, sp, nullptr));
+    for (const CheckRow& c :
+         {row(zorStsNoOperation, "zero length", {-1, S.height}, {0, D.height}, sp, ib),
+          row(zorStsSizeErr, "negative length", S, {D.width, -1}, sp, ib),
+          row(zorStsSizeErr, "narrow source", {least - 1, S.height}, D, sp, ib),
+          row(zorStsSizeErr, "short source", {S.width, least - 1}, D, sp, ib)})
+        rows.push_back(c);
+    run_checks(rows, [&] { return r.mem == blank; });
 }
 
 // The operation checks, in order: each row breaks one argument and passes
