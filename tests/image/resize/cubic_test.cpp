@@ -1,7 +1,6 @@
-// Cubic resize on every level against a model: (B, C) weights in double
-// from the general formula, two passes of (x0*c0 + x1*c1) + (x2*c2 + x3*c3)
-// (fused levels round x1*c1 onto the rounded x0*c0), taps replicated on the
-// sides without an in-memory flag.
+// Cubic resize against a model: (B, C) weights in double, two passes of
+// (x0*c0 + x1*c1) + (x2*c2 + x3*c3) (fused levels round x1*c1 onto the
+// rounded x0*c0), taps replicated on the sides without an in-memory flag.
 #include <float.h>
 #include <math.h>
 #include <xmmintrin.h>
@@ -74,20 +73,17 @@ uint8_t to_u8(float v) {
 bool near(Zor8u got, float v, float tol) { return to_u8(v - tol) <= got && got <= to_u8(v + tol); }
 bool near(float got, float v, float tol) { return isnan(v) ? isnan(got) : fabsf(got - v) <= tol; }
 
-// One call over the destination against the model, then random tiles
-// against that call. A folded kernel's weights lie within 2^-22 of the
-// general formula's: with M the largest tap and S, T the two axes' absolute
-// weight sums, four taps per pass and the passes' roundings move a result
-// by less than 2^-19 (1 + S T) M; the check allows twice that. Results of
-// levels with the same arithmetic must agree bit for bit.
+// One call against the model, then tiles against that call. A folded
+// kernel's weights lie within 2^-22 of the formula's: with M the largest tap
+// and S, T the axes' absolute weight sums, a result moves by less than
+// 2^-19 (1 + S T) M; the check allows twice that.
 template <typename T> void run_case(int32_t W, int32_t H, ZoriSize dst, const Pair& p,
                                     int32_t border, bool fused, uint32_t seed) {
     SCOPED_TRACE(::testing::Message()
                  << zortest::Type<T>::name << " " << W << "x" << H << " to " << dst.width << "x"
                  << dst.height << " (" << p.B << ", " << p.C << ") " << border);
     Rng rng(seed);
-    // Two pixels on each in-memory side: an enlargement's first window
-    // starts at -2.
+    // Two pixels per in-memory side: an enlargement's first window starts at -2.
     zortest::ResizeSource<T> s(W, H, border, 2, seed & 1);
     s.f.fill([&](int32_t, int32_t) {
         return sizeof(T) == 1 ? (T)rng.next() : (T)(((int32_t)rng.below(2001) - 1000) * 0.37f);
@@ -151,9 +147,8 @@ template <typename T> void run_case(int32_t W, int32_t H, ZoriSize dst, const Pa
 
 using Cubic = zortest::LevelTest;
 
-// Destination widths across every vector tail, from sources shrunk and
-// enlarged by integer and other ratios or equal (the smallest 4), each
-// pair with the border forms in turn. Sizes do not depend on the level.
+// Widths across every vector tail, sources shrunk, enlarged or equal (at
+// least 4), each pair with the border forms in turn; sizes level-independent.
 TEST_P(Cubic, SweepMatchesModel) {
     Rng rng(7);
     uint32_t seed = 1;
@@ -170,8 +165,6 @@ TEST_P(Cubic, SweepMatchesModel) {
     }
 }
 
-// Each row breaks one argument of a good call and passes every earlier
-// check; nothing is written.
 TEST_P(Cubic, ChecksInOrder) {
     const ZoriSize src{6, 5}, dst{4, 7};
     zortest::ResizeRecord rec = zortest::resize_record(src, dst, zoriInterCubic);

@@ -1,6 +1,5 @@
-// The resize frame through the public stubs: the size queries against their
-// formulas, the argument checks in order, and nearest neighbour against a
-// model of its index rule, tile by tile, on every level.
+// The resize frame: size queries against their formulas, argument checks in
+// order, and nearest neighbour against a model of its index rule.
 #include <math.h>
 #include <stdint.h>
 #include <string.h>
@@ -94,9 +93,8 @@ int32_t model_shift(int64_t off, int64_t srcLen, int64_t dstLen) {
     return (int32_t)floor((double)off * ((double)srcLen / (double)dstLen));
 }
 
-// One record, made under `initLevel` through the 8u or the float name in
-// turn; the destination in random tiles; then the whole image against the
-// model, bit for bit.
+// A record made under `initLevel` (8u or float name in turn), run in tiles
+// under `runLevel`, against the model bit for bit.
 template <typename T> void nearest_case(ZoriSize src, ZoriSize dst, uint32_t seed,
                                         const zortest::Level& runLevel,
                                         const zortest::Level& initLevel) {
@@ -110,9 +108,8 @@ template <typename T> void nearest_case(ZoriSize src, ZoriSize dst, uint32_t see
     ASSERT_EQ((alt ? zoriResizeNearestInit_32f : zoriResizeNearestInit_8u)(src, dst, rec.record()),
               zorStsNoErr);
     zorSetCpuFeatures(runLevel.select);
-    // Steps with slack (odd for 8u), the destination off its element
-    // boundary, the source against an unreadable page before its first
-    // pixel or after its last: no path may read outside the image.
+    // Steps with slack (odd for 8u), the destination off its element boundary,
+    // the source against an unreadable page: no path may read outside it.
     const int32_t e = sizeof(T), pad = (int32_t)rng.below(3) * (e == 1 ? 3 : 4);
     zortest::Fenced<T> s(src.width, src.height, seed & 2, src.width * e + pad);
     // Any bits for 32f: NaN payloads too.
@@ -148,10 +145,8 @@ template <typename T> void nearest_case(ZoriSize src, ZoriSize dst, uint32_t see
 
 using ResizeNearest = zortest::LevelTest;
 
-// Down, up, equal, integer and fractional ratios, 1-pixel sources and
-// destinations, each record made under another level than the running
-// one; then the ratios the vector paths serve on long rows, and one just
-// past their windows.
+// Ratios of all kinds down to 1 pixel, records made under another level;
+// then the vector paths' ratios on long rows, and one past their windows.
 TEST_P(ResizeNearest, TilesMatchTheModel) {
     std::vector<const zortest::Level*> levels;
     for (const zortest::Level& l : zortest::all_levels())
@@ -227,8 +222,7 @@ TEST(ResizeFrame, QueriesCheckInOrder) {
          {zorStsNoOperation, "init", CALL(zoriResizeNearestInit_8u({-1, 1}, {1, 0}, sp))},
          {zorStsSizeErr, "init", CALL(zoriResizeNearestInit_8u({3, 1}, {1, -1}, sp))}},
         [&] { return a + b + p.x + p.y + z.width == -35 && rec.mem == before; });
-    // Work buffer: the two index tables and 64, for any channel count;
-    // still given, with 48, for a tile larger than the destination.
+    // Work buffer: two index tables and 64 for any channels; 48 if clipped.
     for (Zor32u c : {1u, 3u, 4u})
         for (const ZoriSize& t :
              {ZoriSize{1, 1}, ZoriSize{5, 4}, ZoriSize{9, 2}, ZoriSize{3, 70}}) {
@@ -237,8 +231,7 @@ TEST(ResizeFrame, QueriesCheckInOrder) {
                 t.width > 5 || t.height > 4 ? zorStsSizeWrn : zorStsNoErr);
             EXPECT_EQ(a, a32(4 * std::min(t.width, 5)) + a32(4 * std::min(t.height, 4)) + 64);
         }
-    // The last column with width 1 is in range; an oversized tile is
-    // clipped and warns.
+    // The last column with width 1 is in range; an oversized tile warns.
     ASSERT_EQ(zoriResizeGetSrcRoi_8u(sp, {4, 3}, {1, 1}, &p, &z), zorStsNoErr);
     EXPECT_TRUE(p.x == 6 && p.y == 4 && z.width == 2 && z.height == 2);
     ASSERT_EQ(zoriResizeGetSrcRoi_8u(sp, {1, 0}, {9, 3}, &p, &z), zorStsSizeWrn);

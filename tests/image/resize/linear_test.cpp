@@ -1,7 +1,6 @@
-// Linear resize through the public stubs on every level against a model
-// made from the formulas: per axis pos = (i + 0.5) * ratio - 0.5, its floor
-// and fraction (and the 14-bit weight), then per pixel the edge or the
-// interior arithmetic, whichever the strip rule gives that pixel.
+// Linear resize against a model: per axis pos = (i + 0.5) * ratio - 0.5, its
+// floor and fraction (and 14-bit weight), then per pixel the edge or the
+// interior arithmetic, whichever the strip rule gives it.
 #include <fenv.h>
 #include <math.h>
 
@@ -32,8 +31,7 @@ std::vector<Tap> taps(int32_t src, int32_t dst) {
     return t;
 }
 
-// The source carries a pixel on each in-memory side: those read true
-// neighbours.
+// The source has a pixel on each in-memory side: those read true neighbours.
 template <typename T> struct Model {
     zortest::ResizeSource<T>& src;
     int32_t W, H, border;
@@ -81,11 +79,9 @@ template <typename T> struct Model {
     }
 };
 
-// One resize as tiles (a random partition, the last one asking past the
-// destination: 48), against the model; the fused levels also within 8 ulp
-// of the largest source magnitude (8u: 1) of the unfused model: each pass
-// differs by at most 2 ulp of its inputs' magnitude, the vertical one
-// carries the horizontal one's difference.
+// One resize in tiles against the model; fused levels also within 8 ulp of
+// the largest source magnitude (8u: 1) of the unfused model: each pass adds
+// at most 2 ulp of its inputs' magnitude, the vertical one carries both.
 template <typename T> void run_case(Path path, ZoriSize S, ZoriSize D, int32_t border, bool fused,
                                     Rng& rng, int round = FE_TONEAREST, bool stripes = false) {
     SCOPED_TRACE(::testing::Message() << S.width << "x" << S.height << " -> " << D.width << "x"
@@ -139,10 +135,8 @@ template <typename T> void run_case(Path path, ZoriSize S, ZoriSize D, int32_t b
 
 using Linear = zortest::LevelTest;
 
-// Widths across every vector tail (to two 64-byte vectors and one more),
-// shrinking and enlarging by integer and other ratios, 2x2 sources and
-// 1-pixel destinations, each border form in turn; the float 8u path also
-// under directed rounding.
+// Widths across every vector tail, shrinking and enlarging, 2x2 sources, 1-pixel
+// destinations, border forms in turn; float 8u also under directed rounding.
 TEST_P(Linear, SizesBordersAndTilesMatchTheModel) {
     const bool fused = zortest::fuses(GetParam());
     Rng rng(GetParam().index + 1);
@@ -165,8 +159,7 @@ TEST_P(Linear, SizesBordersAndTilesMatchTheModel) {
               ZoriSize{S.width / 2, S.height / 2}, ZoriSize{S.width * 2 / 3 + 1, S.height * 4 / 3}})
             for (Path path : {kQ14, kFloat8u, kFloat32f})
                 ASSERT_NO_FATAL_FAILURE(one(path, S, D, FE_TONEAREST));
-    // An edge weight of 8191 between 5 and 6: the odd integer part makes
-    // 5 + 8191/16384 round up.
+    // Edge weight 8191 between 5 and 6: the odd integer part rounds it up.
     ASSERT_NO_FATAL_FAILURE(
         run_case<Zor8u>(kQ14, {2, 2}, {16384, 4}, 1, fused, rng, FE_TONEAREST, true));
 }

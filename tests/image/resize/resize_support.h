@@ -1,6 +1,5 @@
-// What the resize tests share: records and work buffers placed as a
-// caller would (odd addresses, guard bytes behind), and tilings of a
-// destination.
+// What the resize tests share: records and buffers placed as a caller would
+// (odd addresses, guard bytes behind), tilings, sources, check tables.
 #ifndef ZOR_TEST_RESIZE_SUPPORT_H
 #define ZOR_TEST_RESIZE_SUPPORT_H
 
@@ -27,8 +26,7 @@ inline ResizeRecord resize_record(ZoriSize src, ZoriSize dst, ZoriInterpolationT
                                   size_t misalign = 13) {
     ResizeRecord r;
     EXPECT_EQ(zoriResizeGetSize_8u(src, dst, method, 0, &r.specSize, &r.initSize), zorStsNoErr);
-    // Over-allocate, then pick the start so that it sits `misalign` past a
-    // 64-byte boundary; everything behind the record keeps the guard byte.
+    // Everything behind the record keeps the guard byte.
     r.mem = guarded((size_t)r.specSize + 128);
     r.offset = ((64 - ((uintptr_t)r.mem.data() & 63)) + misalign) & 63;
     r.init = guarded((size_t)r.initSize);
@@ -51,8 +49,7 @@ inline std::vector<uint8_t> resize_buffer(const ZoriResizeSpec* record, ZoriSize
     return guarded((size_t)n);
 }
 
-// A random partition of a w x h destination into rectangles: random cuts
-// of the columns and of the rows, each band pair a tile.
+// A random partition of a destination: cuts of columns and rows.
 inline std::vector<ZoriRect> random_tiles(ZoriSize dst, Rng& rng, int32_t maxCuts = 4) {
     auto cuts = [&](int32_t len) {
         std::vector<int32_t> c{0};
@@ -72,16 +69,14 @@ inline std::vector<ZoriRect> random_tiles(ZoriSize dst, Rng& rng, int32_t maxCut
     return tiles;
 }
 
-// The border forms the filter methods take: replicate, all in memory, and
-// replicate with one or two sides in memory.
+// Replicate, all in memory, and replicate with one or two sides in memory.
 const int32_t kResizeBorders[] = {1,      240,     241,          1 | 16,     1 | 32,
                                   1 | 64, 1 | 128, 1 | 16 | 128, 1 | 32 | 64};
 
 // l9, n0 and k0 fuse the float kernels; the others multiply, then add.
 inline bool fuses(const Level& l) { return l.index >= 4; }
 
-// Results of levels with one arithmetic agree bit for bit: the first level
-// to run case `key` keeps its bytes for the others.
+// Levels of one arithmetic agree bit for bit: the first keeps case `key`.
 inline bool agrees_within_group(bool fused, uint64_t key, const std::vector<uint8_t>& bytes) {
     static std::map<uint64_t, std::vector<uint8_t>> seen[2];
     std::vector<uint8_t>& first = seen[fused][key];
@@ -105,9 +100,8 @@ template <typename T> ZorStatus resize_op(ZoriInterpolationType m, const T* s, i
     }
 }
 
-// A W x H source with `margin` real pixels on each side a border form puts
-// in memory and none elsewhere, rows with a pixel of slack, against an
-// unreadable page: no read may leave what the flags promise.
+// A W x H source with `margin` pixels on each in-memory side, none elsewhere,
+// against an unreadable page: no read may leave what the flags promise.
 template <typename T> struct ResizeSource {
     int32_t l, u;
     Fenced<T> f;
@@ -124,10 +118,9 @@ template <typename T> struct ResizeSource {
     }
 };
 
-// The destination as random tiles, each from the source offset the record
-// gives, with a guarded buffer of the size queried for it; with `over`, the
-// tiles at the right edge ask past the destination (and the bottom one
-// below it): clipped, 48. `call(offset, tile, size, buffer)`.
+// The destination in random tiles, each with its guarded buffer; with `over`
+// right-edge tiles ask past the destination (and the bottom one below it):
+// clipped, 48. `call(source offset, tile, size, buffer)`.
 template <typename F>
 void resize_tiles(const ZoriResizeSpec* record, ZoriSize dst, Rng& rng, bool over, F call) {
     for (const ZoriRect& t : random_tiles(dst, rng)) {
@@ -144,9 +137,8 @@ void resize_tiles(const ZoriResizeSpec* record, ZoriSize dst, Rng& rng, bool ove
     }
 }
 
-// Init's checks in order, writing nothing: a null record (and init buffer,
-// where one is taken), zero, then negative lengths, then a source below
-// `least` pixels on either axis. `init(src, dst, record, initBuffer)`.
+// Init's checks in order, writing nothing; sources below `least` pixels
+// refused. `init(src, dst, record, initBuffer)`.
 template <typename F>
 void resize_init_checks(F init, ZoriSize S, ZoriSize D, int32_t least, bool initBuffer) {
     ResizeRecord r = resize_record(S, D, zoriInterCubic);
@@ -168,11 +160,9 @@ void resize_init_checks(F init, ZoriSize S, ZoriSize D, int32_t least, bool init
     run_checks(rows, [&] { return r.mem == blank; });
 }
 
-// The operation checks, in order: each row breaks one argument and passes
-// every earlier check, nothing is written. A record of each method in
-// `others` (and nearest's, for a filter method) is refused. Odd steps fail
-// 32f only: for 8u that row fails the offset after them. Then a tile past
-// the destination is clipped, 48, and written.
+// Operation checks in order, writing nothing; records of `others` (and
+// nearest's, for a filter) refused; odd steps fail 32f only (8u fails the
+// offset after them). Then a tile past the destination: clipped, 48, written.
 template <typename T> void resize_op_checks(ZoriInterpolationType m, ZoriSize S, ZoriSize D,
                                             const ZoriResizeSpec* ok,
                                             std::vector<const ZoriResizeSpec*> others) {
