@@ -19,6 +19,11 @@ uint8_t* resize_spec_begin(ResizeSpec* s, ZoriSize src, ZoriSize dst, int32_t in
     s->tapsX = s->tapsY = taps;
     for (int32_t& r : s->reach) r = taps;
     s->hint = hint;
+    // Every method keeps the sizes: the tile rule and the source ROI use them.
+    s->srcWidth = src.width;
+    s->srcHeight = src.height;
+    s->dstWidth = dst.width;
+    s->dstHeight = dst.height;
     const int64_t gy = gcd64(src.height, dst.height), gx = gcd64(src.width, dst.width);
     s->axisY = ResizeAxis{src.height, dst.height, (int32_t)(src.height / gy),
                           (int32_t)(dst.height / gy), nullptr, nullptr, nullptr, nullptr, 0, 0};
@@ -138,10 +143,6 @@ ZorStatus nearest_init(ZoriSize src, ZoriSize dst, ZoriResizeSpec* pSpec) {
     if (src.width < 0 || src.height < 0 || dst.width < 0 || dst.height < 0) return zorStsSizeErr;
     ResizeSpec* s = resize_spec(pSpec);
     resize_spec_begin(s, src, dst, kInterNearest, 0, kHintFloat, zor32f);
-    // The record keeps the destination for the tile rule; the source sizes
-    // live in the axes.
-    s->dstWidth = dst.width;
-    s->dstHeight = dst.height;
     for (ResizeAxis* a : {&s->axisY, &s->axisX}) {
         const double ratio = axis_ratio(*a);
         for (int32_t i = 0; i < a->dstLen; ++i)
@@ -381,14 +382,12 @@ ZOR_ENTRY ZorStatus ZOR_NAME(zoriResizeGetSrcRoi_8u)(const ZoriResizeSpec* pSpec
     if (dstRoiOffset.y + h > s->dstHeight) h = s->dstHeight - dstRoiOffset.y;
     const int32_t sx = tile_shift(s->axisX, dstRoiOffset.x);
     const int32_t sy = tile_shift(s->axisY, dstRoiOffset.y);
-    // The axes carry the source lengths for every method (nearest records
-    // leave the 64-bit source sizes unset).
     const int64_t lastX = dstRoiOffset.x + w - 1, lastY = dstRoiOffset.y + h - 1;
     pSrcRoiOffset->x = sx;
     pSrcRoiOffset->y = sy;
-    pSrcRoiSize->width = lastX == s->dstWidth - 1 ? s->axisX.srcLen - sx
+    pSrcRoiSize->width = lastX == s->dstWidth - 1 ? (int32_t)(s->srcWidth - sx)
                                                   : s->axisX.indexTable[lastX] - sx + 1;
-    pSrcRoiSize->height = lastY == s->dstHeight - 1 ? s->axisY.srcLen - sy
+    pSrcRoiSize->height = lastY == s->dstHeight - 1 ? (int32_t)(s->srcHeight - sy)
                                                     : s->axisY.indexTable[lastY] - sy + 1;
     return dstRoiSize.width > s->dstWidth || dstRoiSize.height > s->dstHeight ? zorStsSizeWrn
                                                                               : zorStsNoErr;

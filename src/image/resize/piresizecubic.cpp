@@ -91,10 +91,6 @@ ZorStatus cubic_init(ZoriSize src, ZoriSize dst, float B, float C, ZoriResizeSpe
 
     ResizeSpec* s = resize_spec(pSpec);
     uint8_t* at = resize_spec_begin(s, src, dst, kInterCubic, 2, kHintFloat, zor32f);
-    s->srcWidth = src.width;
-    s->srcHeight = src.height;
-    s->dstWidth = dst.width;
-    s->dstHeight = dst.height;
     s->dataType = zor8u;
     s->cubicB = B;
     s->cubicC = C;

@@ -54,10 +54,6 @@ ZorStatus linear_init(ZoriSize src, ZoriSize dst, ZoriResizeSpec* pSpec, bool q1
     ResizeSpec* s = resize_spec(pSpec);
     uint8_t* at = resize_spec_begin(s, src, dst, kInterLinear, 1, q14 ? kHintQ14 : kHintFloat,
                                     q14 ? zor16s : zor32f);
-    s->srcWidth = src.width;
-    s->srcHeight = src.height;
-    s->dstWidth = dst.width;
-    s->dstHeight = dst.height;
     s->dataType = q14 ? zor8u : zor16u;
     if (q14) {
         s->axisY.coefQ14 = take<uint16_t>(at, dst.height);
