@@ -142,6 +142,44 @@ ZorStatus zoriResizeCubic_32f_C1R(const Zor32f* pSrc, int32_t srcStep, Zor32f* p
                                   ZoriBorderType border, const Zor32f* pBorderValue,
                                   const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
 
+/* Lanczos: lobes 2 or 3 (else -14); sources of at least 4x4 (2 lobes) or
+ * 6x6 (3 lobes), else -6 with the record left unusable. */
+ZorStatus zoriResizeLanczosInit_8u(ZoriSize srcSize, ZoriSize dstSize, Zor32u lobes,
+                                   ZoriResizeSpec* pSpec, Zor8u* pInitBuf);
+ZorStatus zoriResizeLanczosInit_32f(ZoriSize srcSize, ZoriSize dstSize, Zor32u lobes,
+                                    ZoriResizeSpec* pSpec, Zor8u* pInitBuf);
+ZorStatus zoriResizeLanczos_8u_C1R(const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst,
+                                   int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                   ZoriBorderType border, const Zor8u* pBorderValue,
+                                   const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+ZorStatus zoriResizeLanczos_32f_C1R(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst,
+                                    int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                    ZoriBorderType border, const Zor32f* pBorderValue,
+                                    const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+
+/* Antialiasing: sizes from zoriResizeGetSize_8u with antialiasing 1 and
+ * the kernel's interpolation (linear, cubic or Lanczos); one record serves
+ * the three operations. */
+ZorStatus zoriResizeAntialiasingLinearInit(ZoriSize srcSize, ZoriSize dstSize,
+                                           ZoriResizeSpec* pSpec, Zor8u* pInitBuf);
+ZorStatus zoriResizeAntialiasingCubicInit(ZoriSize srcSize, ZoriSize dstSize, Zor32f cubicB,
+                                          Zor32f cubicC, ZoriResizeSpec* pSpec,
+                                          Zor8u* pInitBuf);
+ZorStatus zoriResizeAntialiasingLanczosInit(ZoriSize srcSize, ZoriSize dstSize, Zor32u lobes,
+                                            ZoriResizeSpec* pSpec, Zor8u* pInitBuf);
+ZorStatus zoriResizeAntialiasing_8u_C1R(const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst,
+                                        int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                        ZoriBorderType border, const Zor8u* pBorderValue,
+                                        const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+ZorStatus zoriResizeAntialiasing_8u_C3R(const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst,
+                                        int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                        ZoriBorderType border, const Zor8u* pBorderValue,
+                                        const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+ZorStatus zoriResizeAntialiasing_32f_C1R(const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst,
+                                         int32_t dstStep, ZoriPoint dstOffset, ZoriSize dstSize,
+                                         ZoriBorderType border, const Zor32f* pBorderValue,
+                                         const ZoriResizeSpec* pSpec, Zor8u* pBuffer);
+
 #ifdef __cplusplus
 }
 #endif

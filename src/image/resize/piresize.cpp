@@ -115,8 +115,15 @@ ZorStatus get_buffer_size(const ZoriResizeSpec* pSpec, ZoriSize dst, Zor32u numC
     const int64_t w = dst.width < s->dstWidth ? dst.width : s->dstWidth;
     const int64_t h = dst.height < s->dstHeight ? dst.height : s->dstHeight;
     int64_t size = a32(4 * h) + a32(4 * w);
-    if (s->interpolation != kInterNearest)
-        size += 2 * (int64_t)s->tapsY * a32(4 * (int64_t)numChannels * w);
+    const int64_t line = a32(4 * (int64_t)numChannels * w), T = s->tapsY;
+    if (s->interpolation != kInterNearest) size += 2 * T * line;
+    if (s->antialiasing) {
+        // The window's ring pointers, border tap tables and line buffer.
+        const ResizeAxis &x = s->axisX, &y = s->axisY;
+        size += a32(16 * T + 8) + a32(16 * (int64_t)x.lowCount * s->tapsX) +
+                a32(16 * (int64_t)x.highCount * s->tapsX) + a32(16 * (int64_t)y.lowCount * T) +
+                a32(16 * (int64_t)y.highCount * T) + line;
+    }
     size += 64;
     if (size >= 0x7FFFFFFF) return zorStsExceededSizeErr;
     *pBufSize = (int32_t)size;
@@ -304,8 +311,10 @@ ZorStatus resize_check(const void* pSrc, int32_t srcStep, const void* pDst, int3
     if (dstSize.width < 0 || dstSize.height < 0) return zorStsSizeErr;
     if (stepsInFloats && ((srcStep & 3) || (dstStep & 3))) return zorStsStepErr;
     if (!offset_in_range(s, dstOffset)) return zorStsOutOfRangeErr;
-    if (s->antialiasing) return zorStsNotSupportedModeErr;
-    if (s->interpolation != interpolation) return zorStsContextMatchErr;
+    if ((s->antialiasing != 0) != (interpolation == kAntialiasingOp))
+        return zorStsNotSupportedModeErr;
+    if (interpolation != kAntialiasingOp && s->interpolation != interpolation)
+        return zorStsContextMatchErr;
     *record = s;
     return zorStsNoErr;
 }

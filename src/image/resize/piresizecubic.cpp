@@ -356,11 +356,7 @@ inline void clamp_taps(int32_t index, int32_t len, bool low, bool high, int32_t*
     }
 }
 
-struct Tile {
-    const ResizeSpec* s;
-    ResizeTile t;
-    ResizeStrips st;
-};
+typedef ResizeJob Tile;
 
 // Column i of a source row (relative to the tile) through the horizontal
 // pass, columns clamped on the sides whose strips are not empty.
@@ -464,13 +460,27 @@ ZorStatus cubic(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriPo
     if (st != zorStsNoErr) return st;
     resize_tile(k.s, dstOffset, dstSize, pBuffer, &k.t);
     k.st = resize_strips(k.s, k.t, border);
-    border_pass(k, pSrc, srcStep, pDst, dstStep);
-    if (k.t.w - k.st.left - k.st.right >= 1 && k.t.h - k.st.top - k.st.bottom >= 1)
-        core(k, pSrc, srcStep, pDst, dstStep);
+    resize_four_taps(k, pSrc, srcStep, pDst, dstStep);
     return tile_status(k.t, zorStsNoErr);
 }
 
+template <typename T>
+void four_taps(const Tile& k, const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep) {
+    border_pass(k, pSrc, srcStep, pDst, dstStep);
+    if (k.t.w - k.st.left - k.st.right >= 1 && k.t.h - k.st.top - k.st.bottom >= 1)
+        core(k, pSrc, srcStep, pDst, dstStep);
+}
+
 }  // namespace
+
+void resize_four_taps(const ResizeJob& k, const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst,
+                      int32_t dstStep) {
+    four_taps(k, pSrc, srcStep, pDst, dstStep);
+}
+void resize_four_taps(const ResizeJob& k, const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst,
+                      int32_t dstStep) {
+    four_taps(k, pSrc, srcStep, pDst, dstStep);
+}
 
 ZOR_END
 

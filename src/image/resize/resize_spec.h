@@ -42,6 +42,9 @@ struct ResizeSpec {
     float cubicB, cubicC;
     void* initBuffer;
     int32_t lobes;
+    // Antialiasing records with tapsX 1: the second weight of each column's
+    // pair, so the linear row form a + (b - a) * w applies.
+    float* coefSecond;
 };
 
 // Tables start this far into the aligned record; the size formulas keep
@@ -88,7 +91,10 @@ inline bool resize_border_ok(int32_t border) {
 }
 
 // Checks 2 to 9 of an operation, in their order (the border, where there is
-// one, is checked before). On success *record is the record.
+// one, is checked before). On success *record is the record. The
+// antialiasing operations pass kAntialiasingOp: after check 7 they refuse
+// plain records and look no further.
+constexpr int32_t kAntialiasingOp = -1;
 ZorStatus resize_check(const void* pSrc, int32_t srcStep, const void* pDst, int32_t dstStep,
                        ZoriPoint dstOffset, ZoriSize dstSize, const ZoriResizeSpec* pSpec,
                        const void* pBuffer, bool stepsInFloats, int32_t interpolation,
@@ -126,6 +132,34 @@ struct ResizeStrips {
     int32_t top, bottom, left, right;
 };
 ResizeStrips resize_strips(const ResizeSpec* s, const ResizeTile& t, int32_t border);
+
+// Where the four-tap machinery (cubic, two-lobe Lanczos) and the general
+// window (three-lobe Lanczos, antialiasing) start: checks done, tile made.
+struct ResizeJob {
+    const ResizeSpec* s;
+    ResizeTile t;
+    ResizeStrips st;
+};
+
+// Cubic passes over a four-tap record (the border pass and the four-row
+// ring), for an operation whose checks are done.
+void resize_four_taps(const ResizeJob& k, const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst,
+                      int32_t dstStep);
+void resize_four_taps(const ResizeJob& k, const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst,
+                      int32_t dstStep);
+
+// The general window: 2 * tapsX taps per destination column from
+// index + 1 - tapsX on, 2 * tapsY rows likewise, each pixel summed in
+// groups of four taps; tapsX 1 takes the linear row form on coefSecond.
+// Strip pixels read taps clamped into the image. Channels 1 or 3 (8u).
+// Behind the 2 * tapsY row buffers an antialiasing record's work buffer
+// has, in order: the ring's pointers A32(16 tapsY + 8), the border tap
+// tables (X low, X high, Y low, Y high: A32(16 count taps) each) and one
+// line buffer A32(4 c w); a three-lobe record has none of these.
+void resize_window(const ResizeJob& k, const Zor8u* pSrc, int32_t srcStep, Zor8u* pDst,
+                   int32_t dstStep, int32_t channels);
+void resize_window(const ResizeJob& k, const Zor32f* pSrc, int32_t srcStep, Zor32f* pDst,
+                   int32_t dstStep, int32_t channels);
 
 // The operation's final status: 48 when the tile was clipped.
 inline ZorStatus tile_status(const ResizeTile& t, ZorStatus worker) {
