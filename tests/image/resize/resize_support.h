@@ -3,6 +3,8 @@
 #ifndef ZOR_TEST_RESIZE_SUPPORT_H
 #define ZOR_TEST_RESIZE_SUPPORT_H
 
+#include <math.h>
+
 #include <algorithm>
 #include <map>
 #include <vector>
@@ -214,6 +216,55 @@ template <typename T> void resize_op_checks(ZoriInterpolationType m, ZoriSize S,
     EXPECT_EQ(row(zorStsSizeWrn, "", 1, st, {0, 0}, {D.width + 1, D.height + 1}, ok, 0).call(),
               zorStsSizeWrn);
     EXPECT_FALSE(same_bytes(dst, before)) << "the clipped tile was not written";
+}
+
+// Per destination position of one axis: source index and 2 * taps weights.
+struct WindowAxis {
+    int32_t taps = 0;
+    std::vector<int32_t> index;
+    std::vector<float> w;
+};
+
+inline float window_pair(float x0, float c0, float x1, float c1, bool fused) {
+    return fused ? fmaf(x1, c1, x0 * c0) : x0 * c0 + x1 * c1;
+}
+
+// n taps summed in groups of four, (p0 + p1) + (p2 + p3), each added to
+// the running sum in order, a last pair alone.
+inline float window_sum(const float* x, const float* c, int32_t n, bool fused) {
+    float acc = 0;
+    for (int32_t k = 0; k < n; k += 4) {
+        float g = window_pair(x[k], c[k], x[k + 1], c[k + 1], fused);
+        if (k + 2 < n) g = g + window_pair(x[k + 2], c[k + 2], x[k + 3], c[k + 3], fused);
+        acc = k ? acc + g : g;
+    }
+    return acc;
+}
+
+// The general window at destination (x, y) before conversion: taps from
+// index + 1 - taps on, each index clamped into the image on a side without
+// its in-memory flag (240: none clamps); one tap a side is the linear row
+// form a + (b - a) * w1. `get(col, row)` reads the (one-channel) source.
+template <typename Get>
+float window_model(Get get, int32_t W, int32_t H, const WindowAxis& ax, const WindowAxis& ay,
+                   int32_t border, bool fused, int32_t x, int32_t y) {
+    const bool mem = border == 240;
+    auto at = [&](int32_t v, int32_t n, int lowFlag, int highFlag) {
+        if (!mem && !(border & lowFlag) && v < 0) v = 0;
+        if (!mem && !(border & highFlag) && v > n - 1) v = n - 1;
+        return v;
+    };
+    const int32_t nx = 2 * ax.taps, ny = 2 * ay.taps;
+    std::vector<float> rows((size_t)ny), px((size_t)nx);
+    for (int32_t a = 0; a < ny; ++a) {
+        const int32_t sy = at(ay.index[y] + 1 - ay.taps + a, H, 16, 32);
+        for (int32_t b = 0; b < nx; ++b)
+            px[b] = get(at(ax.index[x] + 1 - ax.taps + b, W, 64, 128), sy);
+        const float f = ax.w[(size_t)nx * x + 1];
+        rows[a] = nx == 2 ? (fused ? fmaf(px[1] - px[0], f, px[0]) : px[0] + (px[1] - px[0]) * f)
+                          : window_sum(px.data(), &ax.w[(size_t)nx * x], nx, fused);
+    }
+    return window_sum(rows.data(), &ay.w[(size_t)ny * y], ny, fused);
 }
 
 }  // namespace zortest
