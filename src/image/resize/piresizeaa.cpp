@@ -3,17 +3,137 @@
 // weights per destination position, run on the general window.
 #include "resize_spec.h"
 
+#include <math.h>
+
 ZOR_BEGIN
 
 namespace {
 
 enum AaKernel { kAaLinear, kAaCubic, kAaLanczos };
 
-ZorStatus aa_init(ZoriSize src, ZoriSize dst, AaKernel kernel, float B, float C, Zor32u lobes,
+struct Kernel {
+    AaKernel kind;
+    double B, C;  // cubic
+    int32_t lobes;
+    int32_t radius;  // taps a side at scale 1
+};
+
+// The kernel at distance x >= 0 (float), in double.
+double kernel_value(const Kernel& k, float xf) {
+    const double x = xf;
+    if (k.kind == kAaLinear) return x < 1 ? 1 - x : 0;
+    if (k.kind == kAaCubic) {
+        const double B = k.B, C = k.C;
+        if (x >= 2) return 0;
+        if (x < 1) return ((2 - 1.5 * B - C) * x + (-3 + 2 * B + C)) * (x * x) + (1 - B / 3);
+        if (x < 2)
+            return (((-B / 6 - C) * x + (B + 5 * C)) * x - (2 * B + 8 * C)) * x +
+                   (4 * B / 3 + 4 * C);
+        return 1.0;  // NaN distance
+    }
+    if (x >= k.lobes) return 0;
+    const double u = (double)3.1415927f * x;
+    auto sinc = [](double v) { return v == 0 ? 1.0 : ZOR_NAME(zorsSinOne)(v) / v; };
+    return sinc(u) * sinc(u / k.lobes);
+}
+
+struct AxisTaps {
+    int32_t taps;
+    double stretch;
+};
+
+// Along a shrinking axis the kernel widens by the reduction factor.
+AxisTaps axis_taps(int32_t src, int32_t dst, int32_t radius) {
+    const double r = (double)dst / src;
+    if (r < 1) return {(int32_t)ceil((double)radius * src / dst), r};
+    return {radius, 1.0};
+}
+
+// Index and double fraction per destination position; strip counts on pos.
+void build_axis(ResizeAxis* a, int32_t taps, double* fractions) {
+    const double ratio = axis_ratio(*a);
+    a->lowCount = a->highCount = 0;
+    for (int32_t i = 0; i < a->dstLen; ++i) {
+        const double pos = ((double)i + 0.5) * ratio - 0.5;
+        const double index = floor(pos);
+        a->indexTable[i] = (int32_t)index;
+        fractions[i] = pos - index;
+        a->lowCount += pos < taps - 1;
+        a->highCount += pos >= (double)a->srcLen - taps;
+    }
+}
+
+// Every weight divided by the sum, except that whole groups of eight at
+// 32-byte boundaries multiply by the refined reciprocal estimate: the last
+// bit of a weight depends on where it lies, the same on every level.
+void normalise(float* w, int32_t n, float sum) {
+    const float r = _mm_cvtss_f32(_mm_rcp_ss(_mm_set_ss(sum)));
+    const float refined = (r + r) - (sum * r) * r;
+    int32_t k = 0;
+    for (; k < n && ((uintptr_t)(w + k) & 31); ++k) w[k] /= sum;
+    for (; k + 8 <= n; k += 8)
+        for (int32_t m = 0; m < 8; ++m) w[k + m] *= refined;
+    for (; k < n; ++k) w[k] /= sum;
+}
+
+void axis_weights(ResizeAxis* a, const double* fractions, AxisTaps t, const Kernel& kernel) {
+    const int32_t n = 2 * t.taps;
+    for (int32_t i = 0; i < a->dstLen; ++i) {
+        float* w = a->coef32f + (int64_t)n * i;
+        float d = (float)((double)(1 - t.taps) - fractions[i]);
+        float sum = 0;
+        for (int32_t k = 0; k < n; ++k) {
+            const float x = (float)fabs((double)d * t.stretch);
+            w[k] = (float)(kernel_value(kernel, x) * t.stretch);
+            sum += w[k];
+            d += 1.0f;
+        }
+        normalise(w, n, sum);
+    }
+}
+
+ZorStatus aa_init(ZoriSize src, ZoriSize dst, AaKernel kind, float B, float C, Zor32u lobes,
                   ZoriResizeSpec* pSpec, Zor8u* pInitBuf) {
-    (void)src, (void)dst, (void)kernel, (void)B, (void)C, (void)lobes, (void)pSpec,
-        (void)pInitBuf;
-    return zorStsNotSupportedModeErr;  // TODO(init)
+    if (!pSpec || !pInitBuf) return zorStsNullPtrErr;
+    if (!src.width || !src.height || !dst.width || !dst.height) return zorStsNoOperation;
+    if (src.width < 0 || src.height < 0 || dst.width < 0 || dst.height < 0) return zorStsSizeErr;
+    if (kind == kAaLanczos && lobes != 2 && lobes != 3) return zorStsNotSupportedModeErr;
+    const Kernel kernel{kind, B, C, (int32_t)lobes,
+                        kind == kAaLinear ? 1 : kind == kAaCubic ? 2 : (int32_t)lobes};
+    // Tiny weights flush while the tables are made; the caller's control
+    // word comes back at the end.
+    const uint32_t saved = ps_get_ssx();
+    ps_set_ssx(0x8800, 0x8800);
+
+    const AxisTaps ty = axis_taps(src.height, dst.height, kernel.radius);
+    const AxisTaps tx = axis_taps(src.width, dst.width, kernel.radius);
+    ResizeSpec* s = resize_spec(pSpec);
+    uint8_t* at = resize_spec_begin(s, src, dst, kind == kAaLinear ? kInterLinear : kInterCubic,
+                                    tx.taps, 0, zor32f);
+    s->antialiasing = 1;
+    s->tapsY = ty.taps;
+    s->reach[1] = s->reach[3] = ty.taps;
+    s->dataType = zor8u;
+    s->cubicB = kind == kAaCubic ? B : 0;
+    s->cubicC = kind == kAaCubic ? C : 0;
+    s->lobes = kind == kAaLanczos ? (int32_t)lobes : 0;
+    s->initBuffer = pInitBuf;
+    s->axisY.coef32f = take<float>(at, 2 * (int64_t)ty.taps * dst.height);
+    s->axisX.coef32f = take<float>(at, 2 * (int64_t)tx.taps * dst.width);
+
+    uint8_t* f = align_up(pInitBuf, 32);
+    double* fy = take<double>(f, dst.height);
+    double* fx = take<double>(f, dst.width);
+    build_axis(&s->axisY, ty.taps, fy);
+    build_axis(&s->axisX, tx.taps, fx);
+    axis_weights(&s->axisX, fx, tx, kernel);
+    axis_weights(&s->axisY, fy, ty, kernel);
+    if (tx.taps == 1) {
+        s->coefSecond = take<float>(at, dst.width);
+        for (int32_t i = 0; i < dst.width; ++i) s->coefSecond[i] = s->axisX.coef32f[2 * i + 1];
+    }
+    ps_set_ssx(saved, 0x8810);
+    return zorStsNoErr;
 }
 
 template <typename T>

@@ -4,6 +4,8 @@
 #define ZOR_TEST_RESIZE_SUPPORT_H
 
 #include <math.h>
+#include <string.h>
+#include <xmmintrin.h>
 
 #include <algorithm>
 #include <map>
@@ -43,9 +45,9 @@ inline bool record_guards_intact(const ResizeRecord& r) {
 
 // A work buffer of the queried size for tiles up to `tile`, guard behind.
 inline std::vector<uint8_t> resize_buffer(const ZoriResizeSpec* record, ZoriSize tile,
-                                          int32_t* size = nullptr) {
+                                          int32_t* size = nullptr, Zor32u channels = 1) {
     int32_t n = 0;
-    const ZorStatus st = zoriResizeGetBufferSize_8u(record, tile, 1, &n);
+    const ZorStatus st = zoriResizeGetBufferSize_8u(record, tile, channels, &n);
     EXPECT_TRUE(st == zorStsNoErr || st == zorStsSizeWrn) << st;
     if (size) *size = n;
     return guarded((size_t)n);
@@ -86,18 +88,27 @@ inline bool agrees_within_group(bool fused, uint64_t key, const std::vector<uint
     return first == bytes;
 }
 
-// One name for the six operations: method, then the type of the pixels.
+// Selector of the antialiasing operations in resize_op (not an interpolation).
+constexpr ZoriInterpolationType kAntialiasing = (ZoriInterpolationType)-1;
+
+// One name for the single-channel operations: method, then the type.
 template <typename T> ZorStatus resize_op(ZoriInterpolationType m, const T* s, int32_t ss, T* d,
                                           int32_t ds, ZoriPoint o, ZoriSize z, int32_t border,
                                           const ZoriResizeSpec* r, Zor8u* b) {
     const ZoriBorderType bt = (ZoriBorderType)border;
     if constexpr (sizeof(T) == 1) {
         if (m == zoriInterNN) return zoriResizeNearest_8u_C1R(s, ss, d, ds, o, z, r, b);
-        auto f = m == zoriInterLinear ? zoriResizeLinear_8u_C1R : zoriResizeCubic_8u_C1R;
+        auto f = m == zoriInterLinear    ? zoriResizeLinear_8u_C1R
+                 : m == zoriInterCubic   ? zoriResizeCubic_8u_C1R
+                 : m == zoriInterLanczos ? zoriResizeLanczos_8u_C1R
+                                         : zoriResizeAntialiasing_8u_C1R;
         return f(s, ss, d, ds, o, z, bt, nullptr, r, b);
     } else {
         if (m == zoriInterNN) return zoriResizeNearest_32f_C1R(s, ss, d, ds, o, z, r, b);
-        auto f = m == zoriInterLinear ? zoriResizeLinear_32f_C1R : zoriResizeCubic_32f_C1R;
+        auto f = m == zoriInterLinear    ? zoriResizeLinear_32f_C1R
+                 : m == zoriInterCubic   ? zoriResizeCubic_32f_C1R
+                 : m == zoriInterLanczos ? zoriResizeLanczos_32f_C1R
+                                         : zoriResizeAntialiasing_32f_C1R;
         return f(s, ss, d, ds, o, z, bt, nullptr, r, b);
     }
 }
@@ -124,7 +135,8 @@ template <typename T> struct ResizeSource {
 // right-edge tiles ask past the destination (and the bottom one below it):
 // clipped, 48. `call(source offset, tile, size, buffer)`.
 template <typename F>
-void resize_tiles(const ZoriResizeSpec* record, ZoriSize dst, Rng& rng, bool over, F call) {
+void resize_tiles(const ZoriResizeSpec* record, ZoriSize dst, Rng& rng, bool over, F call,
+                  Zor32u channels = 1) {
     for (const ZoriRect& t : random_tiles(dst, rng)) {
         ZoriPoint off{-1, -1};
         ASSERT_EQ(zoriResizeGetSrcOffset_8u(record, {t.x, t.y}, &off), zorStsNoErr);
@@ -132,7 +144,7 @@ void resize_tiles(const ZoriResizeSpec* record, ZoriSize dst, Rng& rng, bool ove
         const ZoriSize size{past ? dst.width + 1 : t.width,
                             t.height + (past && t.y + t.height == dst.height)};
         int32_t n = 0;
-        std::vector<uint8_t> buf = resize_buffer(record, size, &n);
+        std::vector<uint8_t> buf = resize_buffer(record, size, &n, channels);
         ASSERT_EQ(call(off, t, size, buf.data()), past ? zorStsSizeWrn : zorStsNoErr)
             << t.x << "," << t.y << " " << size.width << "x" << size.height;
         ASSERT_TRUE(guard_intact(buf, (size_t)n));
@@ -167,7 +179,8 @@ void resize_init_checks(F init, ZoriSize S, ZoriSize D, int32_t least, bool init
 // offset after them). Then a tile past the destination: clipped, 48, written.
 template <typename T> void resize_op_checks(ZoriInterpolationType m, ZoriSize S, ZoriSize D,
                                             const ZoriResizeSpec* ok,
-                                            std::vector<const ZoriResizeSpec*> others) {
+                                            std::vector<const ZoriResizeSpec*> others,
+                                            ZorStatus otherKind = zorStsContextMatchErr) {
     ResizeRecord nn = resize_record(S, D, zoriInterNN);
     EXPECT_EQ(zoriResizeNearestInit_8u(S, D, nn.record()), zorStsNoErr);
     if (m != zoriInterNN) others.push_back(nn.record());
@@ -208,7 +221,7 @@ template <typename T> void resize_op_checks(ZoriInterpolationType m, ZoriSize S,
           row(zorStsOutOfRangeErr, "y", 1, st, {0, D.height}, D, ok, 0)})
         rows.push_back(r);
     for (const ZoriResizeSpec* r : others)
-        rows.push_back(row(zorStsContextMatchErr, "other record", 1, st, {0, 0}, D, r, 0));
+        rows.push_back(row(otherKind, "other record", 1, st, {0, 0}, D, r, 0));
     run_checks(rows, [&] { return (bool)same_bytes(dst, before); });
     if (sizeof(T) == 1)  // 8u rows may start anywhere and take odd steps
         EXPECT_EQ(row(zorStsNoErr, "", 1, odd, {0, 0}, {D.width - 1, D.height}, ok, 0, dodd).call(),
@@ -245,26 +258,89 @@ inline float window_sum(const float* x, const float* c, int32_t n, bool fused) {
 // index + 1 - taps on, each index clamped into the image on a side without
 // its in-memory flag (240: none clamps); one tap a side is the linear row
 // form a + (b - a) * w1. `get(col, row)` reads the (one-channel) source.
+// The four-tap passes (`fourTap`) read the last pixel four times once the
+// index passes len - 2 on a clamped side.
 template <typename Get>
 float window_model(Get get, int32_t W, int32_t H, const WindowAxis& ax, const WindowAxis& ay,
-                   int32_t border, bool fused, int32_t x, int32_t y) {
+                   int32_t border, bool fused, int32_t x, int32_t y, bool fourTap = false) {
     const bool mem = border == 240;
-    auto at = [&](int32_t v, int32_t n, int lowFlag, int highFlag) {
+    auto at = [&](int32_t index, int32_t v, int32_t n, int lowFlag, int highFlag) {
+        const bool high = !mem && !(border & highFlag);
         if (!mem && !(border & lowFlag) && v < 0) v = 0;
-        if (!mem && !(border & highFlag) && v > n - 1) v = n - 1;
+        if (high && (v > n - 1 || (fourTap && index > n - 2))) v = n - 1;
         return v;
     };
     const int32_t nx = 2 * ax.taps, ny = 2 * ay.taps;
     std::vector<float> rows((size_t)ny), px((size_t)nx);
     for (int32_t a = 0; a < ny; ++a) {
-        const int32_t sy = at(ay.index[y] + 1 - ay.taps + a, H, 16, 32);
+        const int32_t sy = at(ay.index[y], ay.index[y] + 1 - ay.taps + a, H, 16, 32);
         for (int32_t b = 0; b < nx; ++b)
-            px[b] = get(at(ax.index[x] + 1 - ax.taps + b, W, 64, 128), sy);
+            px[b] = get(at(ax.index[x], ax.index[x] + 1 - ax.taps + b, W, 64, 128), sy);
         const float f = ax.w[(size_t)nx * x + 1];
         rows[a] = nx == 2 ? (fused ? fmaf(px[1] - px[0], f, px[0]) : px[0] + (px[1] - px[0]) * f)
                           : window_sum(px.data(), &ax.w[(size_t)nx * x], nx, fused);
     }
     return window_sum(rows.data(), &ay.w[(size_t)ny * y], ny, fused);
+}
+
+inline uint8_t resize_u8(float v) {  // the caller's rounding, then 0..255
+    const int32_t i = _mm_cvtss_si32(_mm_set_ss(v));
+    return (uint8_t)(i < 0 ? 0 : i > 255 ? 255 : i);
+}
+
+// A filled record's operation `op` (C channels, 8u only for 3) on a fenced
+// random source against window_model, bit for bit; levels of one arithmetic
+// agree; random tiles give the one-call result. `margin`: pixels a tap may
+// reach past an in-memory side.
+template <typename T, typename Op>
+void window_case(Op op, ResizeRecord& rec, ZoriSize S, ZoriSize D, const WindowAxis& ax,
+                 const WindowAxis& ay, int32_t border, int32_t C, bool fused, bool fourTap,
+                 uint32_t seed) {
+    SCOPED_TRACE(::testing::Message() << Type<T>::name << " C" << C << " " << S.width << "x"
+                                      << S.height << " to " << D.width << "x" << D.height
+                                      << " taps " << ax.taps << "," << ay.taps << " border "
+                                      << border);
+    ASSERT_TRUE(record_guards_intact(rec));
+    Rng rng(seed);
+    const int32_t margin = std::max(ax.taps, ay.taps) + 1;
+    ResizeSource<T> s(S.width * C, S.height, border, margin * C, seed & 1);
+    s.f.fill([&](int32_t, int32_t) {
+        return sizeof(T) == 1 ? (T)rng.next() : (T)(((int32_t)rng.below(2001) - 1000) * 0.37f);
+    });
+    Image<T> out(D.width * C, D.height, (D.width * C + 3) * (int32_t)sizeof(T),
+                 seed % 4 * sizeof(T));
+    auto run = [&](ZoriPoint o, Image<T>& d, ZoriRect r, ZoriSize z, Zor8u* b) {
+        return op(s.ptr(o.x * C, o.y), s.f.step, d.ptr(r.x * C, r.y), d.step, ZoriPoint{r.x, r.y},
+                  z, (ZoriBorderType)border, nullptr, rec.record(), b);
+    };
+    int32_t n = 0;
+    std::vector<uint8_t> buf = resize_buffer(rec.record(), D, &n, (Zor32u)C);
+    ASSERT_EQ(run({0, 0}, out, {0, 0, D.width, D.height}, D, buf.data()), zorStsNoErr);
+    ASSERT_TRUE(guard_intact(buf, (size_t)n));
+    for (int32_t y = 0; y < D.height; ++y)
+        for (int32_t x = 0; x < D.width; ++x)
+            for (int32_t c = 0; c < C; ++c) {
+                auto get = [&](int32_t sx, int32_t sy) { return (float)s.get(sx * C + c, sy); };
+                const float v = window_model(get, S.width, S.height, ax, ay, border, fused, x, y,
+                                             fourTap);
+                const T want = sizeof(T) == 1 ? (T)resize_u8(v) : (T)v, got = out.get(x * C + c, y);
+                ASSERT_EQ(memcmp(&got, &want, sizeof(T)), 0)
+                    << x << "," << y << "." << c << ": " << (double)got << " vs " << (double)v;
+            }
+    const uint64_t key = seed ^ (uint64_t)S.width << 20 ^ (uint64_t)S.height << 32 ^
+                         (uint64_t)D.width << 42 ^ (uint64_t)D.height << 52 ^
+                         (uint64_t)(ax.taps + ay.taps) << 58 ^ (uint64_t)C << 62;
+    std::vector<uint8_t> pixels;
+    for (int32_t y = 0; y < D.height; ++y)
+        pixels.insert(pixels.end(), out.bytes(0, y), out.bytes(D.width * C, y));
+    ASSERT_TRUE(agrees_within_group(fused, key, pixels)) << "levels of one arithmetic differ";
+    Image<T> tiled = out;
+    tiled.fill([](int32_t, int32_t) { return 0; });
+    ASSERT_NO_FATAL_FAILURE(resize_tiles(
+        rec.record(), D, rng, seed & 2,
+        [&](ZoriPoint o, ZoriRect r, ZoriSize z, Zor8u* b) { return run(o, tiled, r, z, b); },
+        (Zor32u)C));
+    ASSERT_TRUE(same_bytes(tiled, out));
 }
 
 }  // namespace zortest
