@@ -6,6 +6,8 @@
 
 #include <string.h>
 
+#include <type_traits>
+
 ZOR_BEGIN
 
 namespace {
@@ -111,20 +113,255 @@ void horizontal(const Window& k, const T* row, int32_t i0, int32_t i1, Clamp c, 
     }
 }
 
-// Floats [off, off + n) of the rows r[0 .. ny) with one destination row's
-// weights, to dst[0 .. n).
-template <typename T>
-void vertical(const Window& k, float* const* r, int64_t off, const float* c, T* dst, int64_t n) {
-    float x[64];
-    for (int64_t i = 0; i < n; ++i) {
-        float acc = 0;
-        for (int32_t g = 0; g < k.ny; g += 64) {
-            const int32_t m = k.ny - g < 64 ? k.ny - g : 64;
-            for (int32_t a = 0; a < m; ++a) x[a] = r[g + a][off + i];
-            acc = window_sum(x, c + g, m, acc, g == 0);
-        }
-        put(dst + i, acc);
+// ---- vector passes ------------------------------------------------------------------
+// The horizontal pass takes four outputs at a time (an output is a column
+// and channel), one 128-bit lane set per output and group of four taps:
+// the products' pair sums, then the group sums, come out in output order,
+// and each group is added to the running sums as the scalar pass does.
+
+typedef __m128 v4;
+
+// [x0, -0, x2, -0]: a group's second pair, absent, adds nothing.
+inline v4 drop_odd_pairs(v4 v) {
+    const v4 keep = _mm_castsi128_ps(_mm_setr_epi32(-1, 0, -1, 0));
+    return _mm_or_ps(_mm_and_ps(v, keep), _mm_setr_ps(0.0f, -0.0f, 0.0f, -0.0f));
+}
+
+inline v4 pair_sums4(v4 xa, v4 ca, v4 xb, v4 cb) {  // [a01, a23, b01, b23]
+#if ZOR_HAS_FMA
+    const v4 even = _mm_shuffle_ps(_mm_mul_ps(xa, ca), _mm_mul_ps(xb, cb), 0x88);
+    return _mm_fmadd_ps(_mm_shuffle_ps(xa, xb, 0xDD), _mm_shuffle_ps(ca, cb, 0xDD), even);
+#else
+    return _mm_hadd_ps(_mm_mul_ps(xa, ca), _mm_mul_ps(xb, cb));
+#endif
+}
+
+inline __m128i widen_bytes(__m128i v) {  // the low four bytes as 32-bit lanes
+#if ZOR_HAS_SSE41
+    return _mm_cvtepu8_epi32(v);
+#else
+    const __m128i z = _mm_setzero_si128();
+    return _mm_unpacklo_epi16(_mm_unpacklo_epi8(v, z), z);
+#endif
+}
+
+// Four taps of one output from p (element index of the first tap).
+template <int C> inline v4 taps4(const Zor32f* p) { return _mm_loadu_ps(p); }
+template <int C> inline v4 taps4(const Zor8u* p) {
+    if (C == 1) {
+        int32_t b;
+        memcpy(&b, p, 4);
+        return _mm_cvtepi32_ps(widen_bytes(_mm_cvtsi32_si128(b)));
     }
+#if ZOR_HAS_SSSE3
+    const __m128i v = _mm_loadu_si128((const __m128i*)p);
+    return _mm_cvtepi32_ps(_mm_shuffle_epi8(
+        v, _mm_setr_epi8(0, -1, -1, -1, 3, -1, -1, -1, 6, -1, -1, -1, 9, -1, -1, -1)));
+#else
+    return _mm_cvtepi32_ps(_mm_setr_epi32(p[0], p[3], p[6], p[9]));
+#endif
+}
+
+#if ZOR_HAS_AVX2 && ZOR_HAS_FMA
+inline __m256 loadu_chunk(const float* p) { return _mm256_loadu_ps(p); }
+// Eight taps a chunk: a 256-bit vector holds two groups of four.
+constexpr int32_t kChunk = 8;
+typedef __m256 vc;
+
+template <int C> inline vc taps_chunk(const Zor32f* p) { return _mm256_loadu_ps(p); }
+template <int C> inline vc taps_chunk(const Zor8u* p) {
+    __m128i b;
+    if (C == 1) {
+        b = _mm_loadl_epi64((const __m128i*)p);
+    } else {  // every third byte of 24
+        const __m128i lo = _mm_loadu_si128((const __m128i*)p);
+        const __m128i hi = _mm_loadu_si128((const __m128i*)(p + 8));
+        b = _mm_or_si128(
+            _mm_shuffle_epi8(lo, _mm_setr_epi8(0, 3, 6, 9, 12, 15, -1, -1, -1, -1, -1, -1, -1,
+                                               -1, -1, -1)),
+            _mm_shuffle_epi8(hi, _mm_setr_epi8(-1, -1, -1, -1, -1, -1, 10, 13, -1, -1, -1, -1,
+                                               -1, -1, -1, -1)));
+    }
+    return _mm256_cvtepi32_ps(_mm256_cvtepu8_epi32(b));
+}
+
+// Per 128-bit half [a01, a23, b01, b23]: the fused pair sums of two outputs.
+inline vc pair_sums(vc xa, vc ca, vc xb, vc cb) {
+    const vc even = _mm256_shuffle_ps(_mm256_mul_ps(xa, ca), _mm256_mul_ps(xb, cb), 0x88);
+    return _mm256_fmadd_ps(_mm256_shuffle_ps(xa, xb, 0xDD), _mm256_shuffle_ps(ca, cb, 0xDD), even);
+}
+
+// The pairs of a last chunk past the window become -0 (adding nothing):
+// pair p of an output sits in lane p (p < 2) or p + 2 of its half.
+inline vc pairs_mask(int32_t pairs) {
+    const __m256i lane = _mm256_setr_epi32(0, 1, 0, 1, 2, 3, 2, 3);
+    return _mm256_castsi256_ps(_mm256_cmpgt_epi32(_mm256_set1_epi32(pairs), lane));
+}
+inline vc keep_pairs(vc v, vc keep) {
+    return _mm256_or_ps(_mm256_and_ps(keep, v), _mm256_andnot_ps(keep, _mm256_set1_ps(-0.0f)));
+}
+
+inline __m128 chunk_sums(vc ab, vc cd, __m128 acc, bool first) {
+    const vc q = _mm256_hadd_ps(ab, cd);  // [qa qb qc qd] of both groups
+    const __m128 lo = _mm256_castps256_ps128(q), hi = _mm256_extractf128_ps(q, 1);
+    return _mm_add_ps(first ? lo : _mm_add_ps(acc, lo), hi);
+}
+#else
+inline __m128 loadu_chunk(const float* p) { return _mm_loadu_ps(p); }
+// Four taps a chunk: one group.
+constexpr int32_t kChunk = 4;
+typedef __m128 vc;
+
+template <int C> inline vc taps_chunk(const Zor32f* p) { return taps4<C>(p); }
+template <int C> inline vc taps_chunk(const Zor8u* p) { return taps4<C>(p); }
+inline vc pair_sums(vc xa, vc ca, vc xb, vc cb) { return pair_sums4(xa, ca, xb, cb); }
+inline vc pairs_mask(int32_t) { return vc{}; }
+inline vc keep_pairs(vc v, vc) { return drop_odd_pairs(v); }
+inline __m128 chunk_sums(vc ab, vc cd, __m128 acc, bool first) {
+    const __m128 q = _mm_hadd_ps(ab, cd);
+    return first ? q : _mm_add_ps(acc, q);
+}
+#endif
+
+// Elements past a chunk's first tap that its load reads.
+template <typename T, int C> constexpr int32_t load_reach() {
+    return C == 1 ? kChunk - 1 : kChunk == 8 ? 2 + 23 : 2 + 15;
+}
+
+// Outputs [i0, i1) of one row, no clamping, for windows of four or more
+// taps; returns where it stopped: outputs whose loads would pass `limit`
+// (the last element the caller may read) or whose weights would pass the
+// table's end are left to the scalar pass.
+template <typename T, int C>
+int32_t horizontal_fast(const Window& k, const T* row, int32_t i0, int32_t i1, int64_t limit,
+                        int32_t tableEnd, float* out) {
+    const ResizeTile& t = *k.t;
+    const int32_t n = k.nx, chunks = (n + kChunk - 1) / kChunk, first = 1 - n / 2;
+    const int32_t lastPairs = (n - kChunk * (chunks - 1)) / 2;
+    // Columns only move right: the few that may not load whole chunks are
+    // the last ones.
+    int32_t end = i1;
+    while (end > i0 &&
+           ((int64_t)(t.localX[end - 1] + first + kChunk * (chunks - 1)) * C + load_reach<T, C>() >
+                limit ||
+            (n % kChunk != 0 && t.x0 + end >= tableEnd)))
+        --end;
+    const int32_t outs = (end - i0) * C;
+    const vc keep = pairs_mask(lastPairs);
+    const bool partial = 2 * lastPairs < kChunk;
+    // Four outputs from o on: the chunks of each, the last one's absent
+    // pairs dropped, added in order. Inlined, so the pointers stay in
+    // registers.
+    const int32_t* x = t.localX + i0;
+    const float* cx = k.cx + (int64_t)n * i0;
+    float* dst = out + (int64_t)i0 * C;
+    auto four = [=](int32_t o, auto oneChunk) __attribute__((always_inline)) {
+        const int32_t ia = o / C, ib = (o + 1) / C, ic = (o + 2) / C, id = (o + 3) / C;
+        const T* pa = row + (int64_t)(x[ia] + first) * C + o % C;
+        const T* pb = row + (int64_t)(x[ib] + first) * C + (o + 1) % C;
+        const T* pc = row + (int64_t)(x[ic] + first) * C + (o + 2) % C;
+        const T* pd = row + (int64_t)(x[id] + first) * C + (o + 3) % C;
+        const float *wa = cx + (int64_t)n * ia, *wb = cx + (int64_t)n * ib,
+                    *wc = cx + (int64_t)n * ic, *wd = cx + (int64_t)n * id;
+        __m128 acc = _mm_setzero_ps();
+        const int32_t last = decltype(oneChunk)::value ? 0 : chunks - 1;
+        for (int32_t g = 0; g <= last; ++g) {
+            const int32_t e = kChunk * g, te = e * C;
+            vc ab = pair_sums(taps_chunk<C>(pa + te), (vc)loadu_chunk(wa + e),
+                              taps_chunk<C>(pb + te), (vc)loadu_chunk(wb + e));
+            vc cd = pair_sums(taps_chunk<C>(pc + te), (vc)loadu_chunk(wc + e),
+                              taps_chunk<C>(pd + te), (vc)loadu_chunk(wd + e));
+            if (g == last && partial) {
+                ab = keep_pairs(ab, keep);
+                cd = keep_pairs(cd, keep);
+            }
+            acc = chunk_sums(ab, cd, acc, g == 0);
+        }
+        _mm_storeu_ps(dst + o, acc);
+    };
+    int32_t o = 0;
+    if (chunks == 1) {
+        for (; o + 8 <= outs; o += 8) {
+            four(o, std::true_type{});
+            four(o + 4, std::true_type{});
+        }
+        for (; o + 4 <= outs; o += 4) four(o, std::true_type{});
+    } else {
+        for (; o + 4 <= outs; o += 4) four(o, std::false_type{});
+    }
+    return i0 + o / C;
+}
+
+// The first n (<= L) lanes: 8u rounded in the caller's mode and saturated
+// to 0..255 (through signed 16 bits, as the scalar form), 32f as they are.
+inline void store_row(Zor8u* p, simd::vf32 v, int n) {
+#if ZOR_VECTOR_BYTES == 16
+    const __m128i i = _mm_cvtps_epi32((__m128)v);
+    const __m128i b = _mm_packus_epi16(_mm_packs_epi32(i, i), _mm_setzero_si128());
+#elif ZOR_VECTOR_BYTES == 32
+    const __m256i i = _mm256_cvtps_epi32((__m256)v);
+    const __m128i w = _mm_packs_epi32(_mm256_castsi256_si128(i), _mm256_extractf128_si256(i, 1));
+    const __m128i b = _mm_packus_epi16(w, w);
+#else
+    const __m512i i = _mm512_cvtps_epi32((__m512)v);
+    const __m512i c = _mm512_min_epi32(_mm512_max_epi32(i, _mm512_setzero_si512()),
+                                       _mm512_set1_epi32(255));
+    const __m128i b = _mm512_cvtepi32_epi8(c);
+#endif
+    memcpy(p, &b, (size_t)n);
+}
+inline void store_row(Zor32f* p, simd::vf32 v, int n) {
+    if (n == simd::Lanes<simd::vf32>::count)
+        simd::store(p, v);
+    else
+        simd::store_n(p, v, n);
+}
+
+// Floats [off, off + n) of the window's rows (logical row a lives in slot
+// (head + a) mod ny) with one destination row's weights, to dst.
+template <typename T>
+void vertical(const Window& k, const uint8_t* rows, int64_t rowBytes, int32_t head, int64_t off,
+              const float* c, T* dst, int64_t n) {
+    using simd::vf32;
+    constexpr int L = simd::Lanes<vf32>::count;
+    const int32_t ny = k.ny;
+    // The rows in window order, on the stack for the usual short windows.
+    const float* local[16];
+    auto row = [&](int32_t a) __attribute__((always_inline)) {
+        if (ny <= 16) return local[a];
+        const int32_t slot = head + a >= ny ? head + a - ny : head + a;
+        return (const float*)(rows + slot * rowBytes) + off;
+    };
+    if (ny <= 16)
+        for (int32_t a = 0; a < ny; ++a) {
+            const int32_t slot = head + a >= ny ? head + a - ny : head + a;
+            local[a] = (const float*)(rows + slot * rowBytes) + off;
+        }
+    auto run = [&](int64_t i, int lanes) __attribute__((always_inline)) {
+        auto ld = [&](int32_t a) __attribute__((always_inline)) {
+            return lanes == L ? simd::load<vf32>(row(a) + i) : simd::load_n<vf32>(row(a) + i, lanes);
+        };
+        auto vp = [&](int32_t a) __attribute__((always_inline)) {
+            const vf32 x0 = ld(a), x1 = ld(a + 1);
+            const vf32 c0 = simd::broadcast<vf32>(c[a]), c1 = simd::broadcast<vf32>(c[a + 1]);
+#if ZOR_HAS_FMA
+            return simd::fma(x1, c1, x0 * c0);
+#else
+            return x0 * c0 + x1 * c1;
+#endif
+        };
+        vf32 acc = vf32{};
+        int32_t a = 0;
+        for (; a + 4 <= ny; a += 4) {
+            const vf32 q = vp(a) + vp(a + 2);
+            acc = a ? acc + q : q;
+        }
+        if (a < ny) acc = a ? acc + vp(a) : vp(a);
+        store_row(dst + i, acc, lanes);
+    };
+    int64_t i = 0;
+    for (; i + L <= n; i += L) run(i, L);
+    if (i < n) run(i, (int)(n - i));
 }
 
 template <typename T, int C> struct Engine {
@@ -133,71 +370,80 @@ template <typename T, int C> struct Engine {
     int32_t srcStep;
     T* dst;
     int32_t dstStep;
-    float** ring;  // ny row buffers
+    int64_t rowBytes;
 
     const T* source_row(int32_t y) const { return row_at(src, srcStep, y); }
-    float* buffer(int32_t a) const {
-        return (float*)(k.t->rows + a * tile_row_bytes(*k.t, C));
+    float* slot(int32_t a) const { return (float*)(k.t->rows + a * rowBytes); }
+
+    // Columns [i0, i1) unclamped: the vector pass as far as it may read,
+    // the scalar one for the rest.
+    void filter(const T* row, int32_t i0, int32_t i1, float* out) const {
+        if (i0 >= i1) return;
+        int32_t i = i0;
+        if (k.nx >= 4) {
+            const int64_t limit = (int64_t)(k.t->localX[i1 - 1] + k.nx / 2) * C + C - 1;
+            i = horizontal_fast<T, C>(k, row, i0, i1, limit, (int32_t)k.s->dstWidth, out);
+        }
+        horizontal<T, C>(k, row, i, i1, Clamp{false, false}, out);
     }
 
-    // A row of the top or bottom strip: all its window's rows clamped on
-    // the sides with strips, every column clamped likewise.
-    void strip_row(int32_t j, Clamp rows, Clamp cols) {
+    void put_row(int32_t j, int32_t head, int32_t i0, int32_t i1) const {
+        vertical(k, k.t->rows, rowBytes, head, (int64_t)C * i0, k.cy + (int64_t)k.ny * j,
+                 row_at(dst, dstStep, j) + (int64_t)C * i0, (int64_t)C * (i1 - i0));
+    }
+
+    // A row of the top or bottom strip: its window's rows clamped on the
+    // sides with strips, the columns of the side strips clamped likewise.
+    void strip_row(int32_t j, Clamp rows, Clamp cols, const ResizeStrips& st) const {
         const ResizeTile& t = *k.t;
         const int32_t lo = -t.shiftY, hi = (int32_t)k.s->axisY.srcLen - 1 - t.shiftY;
         for (int32_t a = 0; a < k.ny; ++a) {
             int32_t y = t.localY[j] + 1 - k.ny / 2 + a;
             if (rows.low && y < lo) y = lo;
             if (rows.high && y > hi) y = hi;
-            ring[a] = buffer(a);
-            horizontal<T, C>(k, source_row(y), 0, t.w, cols, ring[a]);
+            const T* row = source_row(y);
+            const int32_t mid0 = st.left, mid1 = t.w - st.right;
+            horizontal<T, C>(k, row, 0, mid0 < mid1 ? mid0 : t.w, cols, slot(a));
+            if (mid0 < mid1) {
+                filter(row, mid0, mid1, slot(a));
+                horizontal<T, C>(k, row, mid1, t.w, cols, slot(a));
+            }
         }
-        vertical(k, ring, 0, k.cy + (int64_t)k.ny * j, row_at(dst, dstStep, j), (int64_t)C * t.w);
+        put_row(j, 0, 0, t.w);
     }
 
     // Columns [i0, i1) of a row between the strips, computed alone with
     // their columns clamped.
-    void side(int32_t j, int32_t i0, int32_t i1, Clamp cols) {
+    void side(int32_t j, int32_t i0, int32_t i1, Clamp cols) const {
         const ResizeTile& t = *k.t;
-        for (int32_t a = 0; a < k.ny; ++a) {
-            ring[a] = buffer(a);
+        for (int32_t a = 0; a < k.ny; ++a)
             horizontal<T, C>(k, source_row(t.localY[j] + 1 - k.ny / 2 + a), i0, i1, cols,
-                             ring[a]);
-        }
-        vertical(k, ring, (int64_t)C * i0, k.cy + (int64_t)k.ny * j,
-                 row_at(dst, dstStep, j) + (int64_t)C * i0, (int64_t)C * (i1 - i0));
+                             slot(a));
+        put_row(j, 0, i0, i1);
     }
 
-    // The ring over the core: ring[a] holds source row prev + 1 - ty + a.
-    void core(const ResizeStrips& st) {
+    // The ring over the core: logical row a (source row prev + 1 - ty + a)
+    // lives in slot (head + a) mod ny; a step of d rows turns head by d.
+    void core(const ResizeStrips& st) const {
         const ResizeTile& t = *k.t;
-        const int32_t w = t.w - st.left - st.right, h = t.h - st.top - st.bottom;
+        const int32_t i0 = st.left, i1 = t.w - st.right, h = t.h - st.top - st.bottom;
         const int32_t ty = k.ny / 2;
-        for (int32_t a = 0; a < k.ny; ++a) ring[a] = buffer(a);
-        auto filter = [&](int32_t y, float* out) {
-            horizontal<T, C>(k, source_row(y), st.left, st.left + w, Clamp{false, false}, out);
-        };
-        int32_t prev = t.localY[st.top];
-        for (int32_t a = 0; a < k.ny; ++a) filter(prev + 1 - ty + a, ring[a]);
+        int32_t prev = t.localY[st.top], head = 0;
+        for (int32_t a = 0; a < k.ny; ++a) filter(source_row(prev + 1 - ty + a), i0, i1, slot(a));
         for (int32_t j = st.top; j < st.top + h; ++j) {
             const int32_t y = t.localY[j];
             if (y > prev) {
                 const int32_t d = y - prev < k.ny ? y - prev : k.ny;
-                // Rotate by d: the oldest d buffers take the newest rows.
-                for (int32_t r = 0; r < d; ++r) {
-                    float* oldest = ring[0];
-                    memmove(ring, ring + 1, sizeof(float*) * (size_t)(k.ny - 1));
-                    ring[k.ny - 1] = oldest;
+                head = (int32_t)((head + (int64_t)d) % k.ny);
+                for (int32_t a = k.ny - 1; a >= k.ny - d; --a) {
+                    const int32_t sl = head + a >= k.ny ? head + a - k.ny : head + a;
+                    filter(source_row(y + 1 - ty + a), i0, i1, slot(sl));
                 }
-                for (int32_t a = k.ny - 1; a >= k.ny - d; --a) filter(y + 1 - ty + a, ring[a]);
                 prev = y;
             }
-            vertical(k, ring, (int64_t)C * st.left, k.cy + (int64_t)k.ny * j,
-                     row_at(dst, dstStep, j) + (int64_t)C * st.left, (int64_t)C * w);
+            put_row(j, head, i0, i1);
         }
     }
-
-    static constexpr int32_t kMaxStack = 64;
 };
 
 template <typename T, int C>
@@ -205,27 +451,21 @@ void run(const ResizeJob& job, const T* pSrc, int32_t srcStep, T* pDst, int32_t 
     const ResizeSpec* s = job.s;
     const ResizeTile& t = job.t;
     const ResizeStrips& st = job.st;
-    Window k{s,
-             &t,
-             2 * s->tapsX,
-             2 * s->tapsY,
-             s->axisX.coef32f + 2 * (int64_t)s->tapsX * t.x0,
-             s->axisY.coef32f + 2 * (int64_t)s->tapsY * t.y0,
-             s->coefSecond ? s->coefSecond + t.x0 : nullptr};
-    // Ring pointers: on the stack for short windows, else in the buffer
-    // room antialiasing records reserve behind the row buffers.
-    float* stackRing[Engine<T, C>::kMaxStack];
-    float** ring = stackRing;
-    if (k.ny > Engine<T, C>::kMaxStack)
-        ring = (float**)(t.rows + (int64_t)k.ny * tile_row_bytes(t, C));
-    Engine<T, C> e{k, pSrc, srcStep, pDst, dstStep, ring};
+    const Window k{s,
+                   &t,
+                   2 * s->tapsX,
+                   2 * s->tapsY,
+                   s->axisX.coef32f + 2 * (int64_t)s->tapsX * t.x0,
+                   s->axisY.coef32f + 2 * (int64_t)s->tapsY * t.y0,
+                   s->coefSecond ? s->coefSecond + t.x0 : nullptr};
+    const Engine<T, C> e{k, pSrc, srcStep, pDst, dstStep, tile_row_bytes(t, C)};
     const Clamp rows{st.top != 0, st.bottom != 0}, cols{st.left != 0, st.right != 0};
-    for (int32_t j = 0; j < st.top; ++j) e.strip_row(j, rows, cols);
+    for (int32_t j = 0; j < st.top; ++j) e.strip_row(j, rows, cols, st);
     for (int32_t j = st.top; j < t.h - st.bottom; ++j) {
         if (st.left) e.side(j, 0, st.left, cols);
         if (st.right) e.side(j, t.w - st.right, t.w, cols);
     }
-    for (int32_t j = t.h - st.bottom; j < t.h; ++j) e.strip_row(j, rows, cols);
+    for (int32_t j = t.h - st.bottom; j < t.h; ++j) e.strip_row(j, rows, cols, st);
     if (t.w - st.left - st.right >= 1 && t.h - st.top - st.bottom >= 1) e.core(st);
 }
 
