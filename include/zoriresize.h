@@ -1,4 +1,5 @@
-/* zor: whole-image resize (nearest, linear, cubic), called per tile.
+/* zor: whole-image resize (nearest, linear, cubic, Lanczos, antialiasing),
+ * called per tile.
  *
  * Calling order:
  *   1. zoriResizeGetSize_8u (or _32f): sizes of the record and of an init
@@ -48,14 +49,49 @@
  * smooths even at equal sizes. Any float B and C are accepted. AVX2 and
  * AVX-512 levels fuse the multiply-adds.
  *
- * Border (linear and cubic): pixels whose filter reaches outside the
+ * Lanczos: sinc(x) sinc(x / a) with a = 2 or 3 lobes, 2a taps per axis
+ * from index - (a - 1) to index + a. The function is sampled 200 (a = 2)
+ * or 100 (a = 3) times a unit into a float table and read with linear
+ * interpolation between samples; distances of a or more weigh 0. Per
+ * position the weights (float) are normalised by their sum S: the first
+ * four are multiplied by r' = (r + r) - (S * r) * r, r the processor's
+ * 12-bit reciprocal estimate of S, and the last two of three lobes are
+ * divided by S, so a row of weights need not sum exactly to one (an
+ * unchanged 8u size may move a pixel by the rounding of r'). Two lobes
+ * run exactly as cubic does with these weights; three lobes as below.
+ * Init refuses lobes other than 2 or 3 (-14) and sources below 2a pixels
+ * (-6) after it has begun the record, which is then unusable.
+ *
+ * Antialiasing (zoriResizeGetSize_8u with antialiasing 1): along an axis
+ * that shrinks by r = dst / src < 1 the kernel (linear, cubic (B, C) or
+ * Lanczos) is stretched by 1 / r and its taps a side grow to
+ * ceil(radius * src / dst); an axis that grows or keeps its size keeps the
+ * plain kernel. Per position, from the double fraction f: d = (1 - taps)
+ * - f in float, then for each tap w = K(|d * s|) * s (s = r or 1; x and w
+ * rounded to float, K in double; the Lanczos sine is the library's own),
+ * d += 1. The weights are divided by their float sum, except whole groups
+ * of eight at 32-byte boundaries of the table, which take the refined
+ * estimate r' above. Shrinking by 2 with the linear kernel gives 1/8,
+ * 3/8, 3/8, 1/8. The operations refuse a plain record and the plain
+ * operations an antialiasing record (-14); C3 filters each channel as C1.
+ *
+ * The general window (three-lobe Lanczos, antialiasing): each pixel's
+ * taps, in order, summed in groups of four as (p0 + p1) + (p2 + p3), each
+ * group added to the running sum, a last pair added alone; first along
+ * the row into float rows, then down the column the same way, 8u rounded
+ * to nearest even and saturated. One tap a side along the row is the
+ * linear form a + (b - a) * w1. Edge pixels clamp every tap into the
+ * image on the sides whose strips they lie in. AVX2 and AVX-512 levels
+ * fuse each pair as fma(x1, c1, x0 * c0).
+ *
+ * Border (every filtering method): pixels whose filter reaches outside the
  * source image are computed by replicating the edge pixels, one at a time;
  * the others by the row passes above. border is zorBorderRepl (1) with
  * any of the flags zorBorderInMemTop/Bottom/Left/Right (16/32/64/128): a
  * flagged side is read from memory beyond the image instead (one row or
- * column for linear, up to two for cubic). zorBorderInMem
- * (240) alone reads memory on all sides. Other values: zorStsBorderErr.
- * The border value pointer is never read. The edge pixels of the 8u
+ * column for linear, up to two for cubic, up to the taps a side for the
+ * others). zorBorderInMem (240) alone reads memory on all sides. Other
+ * values: zorStsBorderErr. The border value pointer is never read. The edge pixels of the 8u
  * fixed-point path round as ((v + ((v >> 14) & 1) + 8192) >> 14) of their
  * 14-bit sum, which may differ from the interior's rounding by one.
  *
@@ -65,7 +101,7 @@
  * not multiples of 4 (-16), dstOffset outside the destination (-11),
  * antialiasing record (-14), record of another method (-13). Steps are in
  * bytes; the 8u operation runs a float linear record. Images are
- * single-channel. */
+ * single-channel but for zoriResizeAntialiasing_8u_C3R. */
 #ifndef ZORIRESIZE_H
 #define ZORIRESIZE_H
 
@@ -78,8 +114,8 @@ extern "C" {
 typedef struct ZoriResizeSpec ZoriResizeSpec;
 
 /* Sizes in bytes of the record and the init buffer. Zero lengths give 1
- * (nothing written); linear needs a source of at least 2x2, cubic 4x4
- * (-6); zoriInterSuper gives a size although no Init takes it;
+ * (nothing written); linear needs a source of at least 2x2, cubic and
+ * Lanczos 4x4 (-6); zoriInterSuper gives a size although no Init takes it;
  * antialiasing with nearest or super gives the plain sizes and 46. */
 ZorStatus zoriResizeGetSize_8u(ZoriSize srcSize, ZoriSize dstSize,
                                ZoriInterpolationType interpolation, int32_t antialiasing,

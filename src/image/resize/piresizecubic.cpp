@@ -2,6 +2,7 @@
 // weights made once at Init, then per tile a border pass for the pixels
 // whose taps leave the image and a four-row ring for the rest.
 #include "resize_spec.h"
+#include "resize_lanes.h"
 
 #include <math.h>
 #include <string.h>
@@ -9,6 +10,8 @@
 ZOR_BEGIN
 
 namespace {
+
+using namespace resize_lanes;
 
 // ---- weights ------------------------------------------------------------------------
 
@@ -113,35 +116,8 @@ ZorStatus cubic_init(ZoriSize src, ZoriSize dst, float B, float C, ZoriResizeSpe
 
 // ---- arithmetic shared by every path ------------------------------------------------
 
-// x0*c0 + x1*c1; fusing levels round the second product into the first.
-inline float pair(float x0, float c0, float x1, float c1) {
-#if ZOR_HAS_FMA
-    return fmaf(x1, c1, x0 * c0);
-#else
-    return x0 * c0 + x1 * c1;
-#endif
-}
-
 inline float quad(const float* x, const float* c) {
     return pair(x[0], c[0], x[1], c[1]) + pair(x[2], c[2], x[3], c[3]);
-}
-
-// Conversion in the caller's rounding mode (NaN and overflow give the
-// integer indefinite), then saturation: through 16 bits to 0..255 is the
-// same as straight to 0..255.
-inline Zor8u to_u8(float v) {
-    const int32_t i = _mm_cvtss_si32(_mm_set_ss(v));
-    return (Zor8u)(i < 0 ? 0 : i > 255 ? 255 : i);
-}
-
-inline void put(Zor8u* p, float v) { *p = to_u8(v); }
-inline void put(Zor32f* p, float v) { memcpy(p, &v, 4); }
-
-inline float pixel(const Zor8u* p) { return (float)*p; }
-inline float pixel(const Zor32f* p) {
-    float v;
-    memcpy(&v, p, 4);
-    return v;
 }
 
 // ---- vector helpers -----------------------------------------------------------------
@@ -250,36 +226,6 @@ inline vf32 position_order(vf32 r) {
     return (vf32)_mm512_permutexvar_ps(
         _mm512_setr_epi32(0, 4, 8, 12, 1, 5, 9, 13, 2, 6, 10, 14, 3, 7, 11, 15), (__m512)r);
 #endif
-}
-
-// The first n (<= L) lanes rounded in the caller's mode, saturated to
-// 0..255 and stored as bytes.
-inline void store_u8(Zor8u* p, vf32 v, int n) {
-#if ZOR_VECTOR_BYTES == 16
-    const __m128i i = _mm_cvtps_epi32((__m128)v);
-    const __m128i b = _mm_packus_epi16(_mm_packs_epi32(i, i), _mm_setzero_si128());
-#elif ZOR_VECTOR_BYTES == 32
-    const __m256i i = _mm256_cvtps_epi32((__m256)v);
-    const __m128i w = _mm_packs_epi32(_mm256_castsi256_si128(i), _mm256_extractf128_si256(i, 1));
-    const __m128i b = _mm_packus_epi16(w, w);
-#else
-    const __m512i i = _mm512_cvtps_epi32((__m512)v);
-    const __m512i c = _mm512_min_epi32(_mm512_max_epi32(i, _mm512_setzero_si512()),
-                                       _mm512_set1_epi32(255));
-    const __m128i b = _mm512_cvtepi32_epi8(c);
-#endif
-    if (n == L)
-        memcpy(p, &b, L);
-    else
-        memcpy(p, &b, (size_t)n);
-}
-
-inline void store_row(Zor8u* p, vf32 v, int n) { store_u8(p, v, n); }
-inline void store_row(Zor32f* p, vf32 v, int n) {
-    if (n == L)
-        simd::store(p, v);
-    else
-        simd::store_n(p, v, n);
 }
 
 // ---- the two passes -----------------------------------------------------------------

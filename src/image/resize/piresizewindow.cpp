@@ -3,6 +3,7 @@
 // A pixel's taps are summed in groups of four, (p0 + p1) + (p2 + p3), each
 // group added to the running sum in order, a last pair added alone.
 #include "resize_spec.h"
+#include "resize_lanes.h"
 
 #include <string.h>
 
@@ -12,14 +13,7 @@ ZOR_BEGIN
 
 namespace {
 
-// x0*c0 + x1*c1; fusing levels round the second product into the first.
-inline float pair(float x0, float c0, float x1, float c1) {
-#if ZOR_HAS_FMA
-    return fmaf(x1, c1, x0 * c0);
-#else
-    return x0 * c0 + x1 * c1;
-#endif
-}
+using namespace resize_lanes;
 
 // n (even, >= 2) taps x[k] against weights c[k], each group added to acc
 // (the first group of a pixel starts the sum: `first`).
@@ -45,22 +39,6 @@ inline float lerp(float a, float b, float f) {
     return a + (b - a) * f;
 #endif
 }
-
-inline float pixel(const Zor8u* p) { return (float)*p; }
-inline float pixel(const Zor32f* p) {
-    float v;
-    memcpy(&v, p, 4);
-    return v;
-}
-
-// Conversion in the caller's rounding mode, then saturation to 0..255.
-inline void put(Zor8u* p, float v) {
-    const int32_t i = _mm_cvtss_si32(_mm_set_ss(v));
-    *p = (Zor8u)(i < 0 ? 0 : i > 255 ? 255 : i);
-}
-inline void put(Zor32f* p, float v) { memcpy(p, &v, 4); }
-
-inline int32_t clamp(int32_t v, int32_t lo, int32_t hi) { return v < lo ? lo : v > hi ? hi : v; }
 
 // Which image sides a pass clamps its taps to: the sides whose strips the
 // tile has (an in-memory side is read beyond the image).
@@ -290,31 +268,6 @@ int32_t horizontal_fast(const Window& k, const T* row, int32_t i0, int32_t i1, i
         for (; o + 4 <= outs; o += 4) four(o, std::false_type{});
     }
     return i0 + o / C;
-}
-
-// The first n (<= L) lanes: 8u rounded in the caller's mode and saturated
-// to 0..255 (through signed 16 bits, as the scalar form), 32f as they are.
-inline void store_row(Zor8u* p, simd::vf32 v, int n) {
-#if ZOR_VECTOR_BYTES == 16
-    const __m128i i = _mm_cvtps_epi32((__m128)v);
-    const __m128i b = _mm_packus_epi16(_mm_packs_epi32(i, i), _mm_setzero_si128());
-#elif ZOR_VECTOR_BYTES == 32
-    const __m256i i = _mm256_cvtps_epi32((__m256)v);
-    const __m128i w = _mm_packs_epi32(_mm256_castsi256_si128(i), _mm256_extractf128_si256(i, 1));
-    const __m128i b = _mm_packus_epi16(w, w);
-#else
-    const __m512i i = _mm512_cvtps_epi32((__m512)v);
-    const __m512i c = _mm512_min_epi32(_mm512_max_epi32(i, _mm512_setzero_si512()),
-                                       _mm512_set1_epi32(255));
-    const __m128i b = _mm512_cvtepi32_epi8(c);
-#endif
-    memcpy(p, &b, (size_t)n);
-}
-inline void store_row(Zor32f* p, simd::vf32 v, int n) {
-    if (n == simd::Lanes<simd::vf32>::count)
-        simd::store(p, v);
-    else
-        simd::store_n(p, v, n);
 }
 
 // Floats [off, off + n) of the window's rows (logical row a lives in slot
