@@ -338,6 +338,19 @@ void resize_tile(const ResizeSpec* s, ZoriPoint dstOffset, ZoriSize dstSize, uin
     for (int32_t j = 0; j < t->h; ++j) t->localY[j] = s->axisY.indexTable[t->y0 + j] - t->shiftY;
 }
 
+ZorStatus resize_job(const void* pSrc, int32_t srcStep, const void* pDst, int32_t dstStep,
+                     ZoriPoint dstOffset, ZoriSize dstSize, int32_t border,
+                     const ZoriResizeSpec* pSpec, Zor8u* pBuffer, bool stepsInFloats,
+                     int32_t interpolation, ResizeJob* job) {
+    if (!resize_border_ok(border)) return zorStsBorderErr;
+    const ZorStatus st = resize_check(pSrc, srcStep, pDst, dstStep, dstOffset, dstSize, pSpec,
+                                      pBuffer, stepsInFloats, interpolation, &job->s);
+    if (st != zorStsNoErr) return st;
+    resize_tile(job->s, dstOffset, dstSize, pBuffer, &job->t);
+    job->st = resize_strips(job->s, job->t, border);
+    return zorStsNoErr;
+}
+
 ResizeStrips resize_strips(const ResizeSpec* s, const ResizeTile& t, int32_t border) {
     ResizeStrips r{0, 0, 0, 0};
     if (border == 240) return r;

@@ -22,15 +22,7 @@ struct Kernel {
 double kernel_value(const Kernel& k, float xf) {
     const double x = xf;
     if (k.kind == kAaLinear) return x < 1 ? 1 - x : 0;
-    if (k.kind == kAaCubic) {
-        const double B = k.B, C = k.C;
-        if (x >= 2) return 0;
-        if (x < 1) return ((2 - 1.5 * B - C) * x + (-3 + 2 * B + C)) * (x * x) + (1 - B / 3);
-        if (x < 2)
-            return (((-B / 6 - C) * x + (B + 5 * C)) * x - (2 * B + 8 * C)) * x +
-                   (4 * B / 3 + 4 * C);
-        return 1.0;  // NaN distance
-    }
+    if (k.kind == kAaCubic) return resize_cubic_weight(x, k.B, k.C);
     if (x >= k.lobes) return 0;
     const double u = (double)3.1415927f * x;
     auto sinc = [](double v) { return v == 0 ? 1.0 : ZOR_NAME(zorsSinOne)(v) / v; };
@@ -47,20 +39,6 @@ AxisTaps axis_taps(int32_t src, int32_t dst, int32_t radius) {
     const double r = (double)dst / src;
     if (r < 1) return {(int32_t)ceil((double)radius * src / dst), r};
     return {radius, 1.0};
-}
-
-// Index and double fraction per destination position; strip counts on pos.
-void build_axis(ResizeAxis* a, int32_t taps, double* fractions) {
-    const double ratio = axis_ratio(*a);
-    a->lowCount = a->highCount = 0;
-    for (int32_t i = 0; i < a->dstLen; ++i) {
-        const double pos = ((double)i + 0.5) * ratio - 0.5;
-        const double index = floor(pos);
-        a->indexTable[i] = (int32_t)index;
-        fractions[i] = pos - index;
-        a->lowCount += pos < taps - 1;
-        a->highCount += pos >= (double)a->srcLen - taps;
-    }
 }
 
 // Every weight divided by the sum, except that whole groups of eight at
@@ -124,8 +102,8 @@ ZorStatus aa_init(ZoriSize src, ZoriSize dst, AaKernel kind, float B, float C, Z
     uint8_t* f = align_up(pInitBuf, 32);
     double* fy = take<double>(f, dst.height);
     double* fx = take<double>(f, dst.width);
-    build_axis(&s->axisY, ty.taps, fy);
-    build_axis(&s->axisX, tx.taps, fx);
+    resize_map_axis(&s->axisY, ty.taps, fy);
+    resize_map_axis(&s->axisX, tx.taps, fx);
     axis_weights(&s->axisX, fx, tx, kernel);
     axis_weights(&s->axisY, fy, ty, kernel);
     if (tx.taps == 1) {
@@ -140,13 +118,10 @@ template <typename T>
 ZorStatus antialiasing(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep,
                        ZoriPoint dstOffset, ZoriSize dstSize, int32_t border,
                        const ZoriResizeSpec* pSpec, Zor8u* pBuffer, int32_t channels) {
-    if (!resize_border_ok(border)) return zorStsBorderErr;
     ResizeJob k;
-    const ZorStatus st = resize_check(pSrc, srcStep, pDst, dstStep, dstOffset, dstSize, pSpec,
-                                      pBuffer, sizeof(T) == 4, kAntialiasingOp, &k.s);
+    const ZorStatus st = resize_job(pSrc, srcStep, pDst, dstStep, dstOffset, dstSize, border,
+                                    pSpec, pBuffer, sizeof(T) == 4, kAntialiasingOp, &k);
     if (st != zorStsNoErr) return st;
-    resize_tile(k.s, dstOffset, dstSize, pBuffer, &k.t);
-    k.st = resize_strips(k.s, k.t, border);
     resize_window(k, pSrc, srcStep, pDst, dstStep, channels);
     return tile_status(k.t, zorStsNoErr);
 }

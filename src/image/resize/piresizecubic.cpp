@@ -17,13 +17,7 @@ using namespace resize_lanes;
 
 // The family at distance x >= 0 in double; NaN distances weigh 1. The three
 // common pairs have the constants folded.
-double cubic_general(double x, double B, double C) {
-    if (x >= 2) return 0;
-    if (x < 1) return ((2 - 1.5 * B - C) * x + (-3 + 2 * B + C)) * (x * x) + (1 - B / 3);
-    if (x < 2)
-        return (((-B / 6 - C) * x + (B + 5 * C)) * x - (2 * B + 8 * C)) * x + (4 * B / 3 + 4 * C);
-    return 1.0;
-}
+double cubic_general(double x, double B, double C) { return resize_cubic_weight(x, B, C); }
 
 double cubic_catmull_rom(double x, double, double) {  // (0, 0.5)
     if (x >= 2) return 0;
@@ -53,21 +47,6 @@ CubicKernel cubic_kernel(float B, float C) {
     if (B == 1.0f && C == 0.0f) return cubic_bspline;
     if (B == 0.5f && C == 0.3f) return cubic_half_03;
     return cubic_general;
-}
-
-// One axis: source index and float fraction per destination position, the
-// strip counts, and room for four weights per position.
-void build_axis(ResizeAxis* a, float* fractions) {
-    const double ratio = axis_ratio(*a);
-    a->lowCount = a->highCount = 0;
-    for (int32_t i = 0; i < a->dstLen; ++i) {
-        const double pos = ((double)i + 0.5) * ratio - 0.5;
-        const double index = floor(pos);
-        a->indexTable[i] = (int32_t)index;
-        fractions[i] = (float)(pos - index);
-        a->lowCount += index < 1;
-        a->highCount += index >= a->srcLen - 2;
-    }
 }
 
 // Weights of index - 1 .. index + 2: the distances in float, the kernel
@@ -104,8 +83,8 @@ ZorStatus cubic_init(ZoriSize src, ZoriSize dst, float B, float C, ZoriResizeSpe
     uint8_t* f = align_up(pInitBuf, 32);
     float* fy = take<float>(f, dst.height);
     float* fx = take<float>(f, dst.width);
-    build_axis(&s->axisY, fy);
-    build_axis(&s->axisX, fx);
+    resize_map_axis(&s->axisY, 2, fy);
+    resize_map_axis(&s->axisX, 2, fx);
     const CubicKernel k = cubic_kernel(B, C);
     axis_weights(&s->axisX, fx, k, B, C);
     axis_weights(&s->axisY, fy, k, B, C);
@@ -148,16 +127,7 @@ inline int32_t bytes4(const Zor8u* p) {
     return b;
 }
 
-// Four bytes as four 32-bit lanes of a 128-bit vector.
-inline __m128i widen4(const Zor8u* p) {
-    const __m128i v = _mm_cvtsi32_si128(bytes4(p));
-#if ZOR_HAS_SSE41
-    return _mm_cvtepu8_epi32(v);
-#else
-    const __m128i z = _mm_setzero_si128();
-    return _mm_unpacklo_epi16(_mm_unpacklo_epi8(v, z), z);
-#endif
-}
+inline __m128i widen4(const Zor8u* p) { return widen_bytes(_mm_cvtsi32_si128(bytes4(p))); }
 
 inline vf32 taps(const Zor8u* row, const int32_t* x) {
 #if ZOR_VECTOR_BYTES == 16
@@ -399,13 +369,10 @@ void core(const Tile& k, const T* pSrc, int32_t srcStep, T* pDst, int32_t dstSte
 template <typename T>
 ZorStatus cubic(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriPoint dstOffset,
                 ZoriSize dstSize, int32_t border, const ZoriResizeSpec* pSpec, Zor8u* pBuffer) {
-    if (!resize_border_ok(border)) return zorStsBorderErr;
-    Tile k;
-    const ZorStatus st = resize_check(pSrc, srcStep, pDst, dstStep, dstOffset, dstSize, pSpec,
-                                      pBuffer, sizeof(T) == 4, kInterCubic, &k.s);
+    ResizeJob k;
+    const ZorStatus st = resize_job(pSrc, srcStep, pDst, dstStep, dstOffset, dstSize, border,
+                                    pSpec, pBuffer, sizeof(T) == 4, kInterCubic, &k);
     if (st != zorStsNoErr) return st;
-    resize_tile(k.s, dstOffset, dstSize, pBuffer, &k.t);
-    k.st = resize_strips(k.s, k.t, border);
     resize_four_taps(k, pSrc, srcStep, pDst, dstStep);
     return tile_status(k.t, zorStsNoErr);
 }

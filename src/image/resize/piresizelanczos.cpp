@@ -22,21 +22,6 @@ void sample_table(int32_t a, int32_t per, float* t) {
     }
 }
 
-// One axis: index, float fraction, and the strip counts of a window of
-// `lobes` taps a side.
-void build_axis(ResizeAxis* a, int64_t lobes, float* fractions) {
-    const double ratio = axis_ratio(*a);
-    a->lowCount = a->highCount = 0;
-    for (int32_t i = 0; i < a->dstLen; ++i) {
-        const double pos = ((double)i + 0.5) * ratio - 0.5;
-        const double index = floor(pos);
-        a->indexTable[i] = (int32_t)index;
-        fractions[i] = (float)(pos - index);
-        a->lowCount += index < lobes - 1;
-        a->highCount += index >= a->srcLen - lobes;
-    }
-}
-
 // Weights of index - (lobes - 1) .. index + lobes from the sampled table,
 // all in float. The first four are scaled by a refined reciprocal of their
 // sum, the last two of three lobes divided by it: the two do not agree to
@@ -86,8 +71,8 @@ ZorStatus lanczos_init(ZoriSize src, ZoriSize dst, Zor32u lobes, ZoriResizeSpec*
     uint8_t* f = align_up(pInitBuf, 32);
     float* fy = take<float>(f, dst.height);
     float* fx = take<float>(f, dst.width);
-    build_axis(&s->axisY, lobes, fy);
-    build_axis(&s->axisX, lobes, fx);
+    resize_map_axis(&s->axisY, lobes, fy);
+    resize_map_axis(&s->axisX, lobes, fx);
 
     ZorStatus status = zorStsNoErr;
     if (lobes != 2 && lobes != 3) {
@@ -109,13 +94,10 @@ ZorStatus lanczos_init(ZoriSize src, ZoriSize dst, Zor32u lobes, ZoriResizeSpec*
 template <typename T>
 ZorStatus lanczos(const T* pSrc, int32_t srcStep, T* pDst, int32_t dstStep, ZoriPoint dstOffset,
                   ZoriSize dstSize, int32_t border, const ZoriResizeSpec* pSpec, Zor8u* pBuffer) {
-    if (!resize_border_ok(border)) return zorStsBorderErr;
     ResizeJob k;
-    const ZorStatus st = resize_check(pSrc, srcStep, pDst, dstStep, dstOffset, dstSize, pSpec,
-                                      pBuffer, sizeof(T) == 4, kInterLanczos, &k.s);
+    const ZorStatus st = resize_job(pSrc, srcStep, pDst, dstStep, dstOffset, dstSize, border,
+                                    pSpec, pBuffer, sizeof(T) == 4, kInterLanczos, &k);
     if (st != zorStsNoErr) return st;
-    resize_tile(k.s, dstOffset, dstSize, pBuffer, &k.t);
-    k.st = resize_strips(k.s, k.t, border);
     if (k.s->lobes == 2)
         resize_four_taps(k, pSrc, srcStep, pDst, dstStep);
     else

@@ -114,15 +114,6 @@ inline v4 pair_sums4(v4 xa, v4 ca, v4 xb, v4 cb) {  // [a01, a23, b01, b23]
 #endif
 }
 
-inline __m128i widen_bytes(__m128i v) {  // the low four bytes as 32-bit lanes
-#if ZOR_HAS_SSE41
-    return _mm_cvtepu8_epi32(v);
-#else
-    const __m128i z = _mm_setzero_si128();
-    return _mm_unpacklo_epi16(_mm_unpacklo_epi8(v, z), z);
-#endif
-}
-
 // Four taps of one output from p (element index of the first tap).
 template <int C> inline v4 taps4(const Zor32f* p) { return _mm_loadu_ps(p); }
 template <int C> inline v4 taps4(const Zor8u* p) {

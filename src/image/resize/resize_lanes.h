@@ -39,6 +39,16 @@ inline float pixel(const Zor32f* p) {
     return v;
 }
 
+// The low four bytes as 32-bit lanes.
+inline __m128i widen_bytes(__m128i v) {
+#if ZOR_HAS_SSE41
+    return _mm_cvtepu8_epi32(v);
+#else
+    const __m128i z = _mm_setzero_si128();
+    return _mm_unpacklo_epi16(_mm_unpacklo_epi8(v, z), z);
+#endif
+}
+
 // The first n (<= lanes) lanes: 8u rounded in the caller's mode and
 // saturated to 0..255 as to_u8 does, 32f as they are.
 inline void store_row(Zor8u* p, simd::vf32 v, int n) {

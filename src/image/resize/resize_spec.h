@@ -82,6 +82,33 @@ uint8_t* resize_spec_begin(ResizeSpec* s, ZoriSize src, ZoriSize dst, int32_t in
 
 inline double axis_ratio(const ResizeAxis& a) { return (double)a.srcRed / (double)a.dstRed; }
 
+// The filtering methods' mapping of one axis: pos = (i + 0.5) * ratio - 0.5
+// and index = floor(pos) in double, the index to the table, the fraction
+// pos - index to `fractions` (float or double), and the strip counts of a
+// window of `taps` a side: low when index < taps - 1, high when
+// index >= srcLen - taps (the same on pos, the bounds being integers).
+template <typename F> void resize_map_axis(ResizeAxis* a, int64_t taps, F* fractions) {
+    const double ratio = axis_ratio(*a);
+    a->lowCount = a->highCount = 0;
+    for (int32_t i = 0; i < a->dstLen; ++i) {
+        const double pos = ((double)i + 0.5) * ratio - 0.5;
+        const double index = floor(pos);
+        a->indexTable[i] = (int32_t)index;
+        fractions[i] = (F)(pos - index);
+        a->lowCount += index < (double)(taps - 1);
+        a->highCount += index >= (double)(a->srcLen - taps);
+    }
+}
+
+// The (B, C) cubic family at distance x >= 0 in double; NaN weighs 1.
+inline double resize_cubic_weight(double x, double B, double C) {
+    if (x >= 2) return 0;
+    if (x < 1) return ((2 - 1.5 * B - C) * x + (-3 + 2 * B + C)) * (x * x) + (1 - B / 3);
+    if (x < 2)
+        return (((-B / 6 - C) * x + (B + 5 * C)) * x - (2 * B + 8 * C)) * x + (4 * B / 3 + 4 * C);
+    return 1.0;
+}
+
 // ---- operations -------------------------------------------------------------------
 
 // Border values the filtering methods accept: 240, or replicate (low four
@@ -140,6 +167,13 @@ struct ResizeJob {
     ResizeTile t;
     ResizeStrips st;
 };
+
+// The border (check 1), checks 2 to 9 and the tile with its strips: what
+// every filtering operation does before its passes.
+ZorStatus resize_job(const void* pSrc, int32_t srcStep, const void* pDst, int32_t dstStep,
+                     ZoriPoint dstOffset, ZoriSize dstSize, int32_t border,
+                     const ZoriResizeSpec* pSpec, Zor8u* pBuffer, bool stepsInFloats,
+                     int32_t interpolation, ResizeJob* job);
 
 // Cubic passes over a four-tap record (the border pass and the four-row
 // ring), for an operation whose checks are done.
