@@ -215,7 +215,6 @@ int32_t horizontal_fast(const Window& k, const T* row, int32_t i0, int32_t i1, i
                 limit ||
             (n % kChunk != 0 && t.x0 + end >= tableEnd)))
         --end;
-    const int32_t outs = (end - i0) * C;
     const vc keep = pairs_mask(lastPairs);
     const bool partial = 2 * lastPairs < kChunk;
     // Four outputs from o on: the chunks of each, the last one's absent
@@ -224,14 +223,12 @@ int32_t horizontal_fast(const Window& k, const T* row, int32_t i0, int32_t i1, i
     const int32_t* x = t.localX + i0;
     const float* cx = k.cx + (int64_t)n * i0;
     float* dst = out + (int64_t)i0 * C;
-    auto four = [=](int32_t o, auto oneChunk) __attribute__((always_inline)) {
-        const int32_t ia = o / C, ib = (o + 1) / C, ic = (o + 2) / C, id = (o + 3) / C;
-        const T* pa = row + (int64_t)(x[ia] + first) * C + o % C;
-        const T* pb = row + (int64_t)(x[ib] + first) * C + (o + 1) % C;
-        const T* pc = row + (int64_t)(x[ic] + first) * C + (o + 2) % C;
-        const T* pd = row + (int64_t)(x[id] + first) * C + (o + 3) % C;
-        const float *wa = cx + (int64_t)n * ia, *wb = cx + (int64_t)n * ib,
-                    *wc = cx + (int64_t)n * ic, *wd = cx + (int64_t)n * id;
+    // Four outputs (a column's channel each) to d: the chunks of each, the
+    // last one's absent pairs dropped, added in order. Inlined, so the
+    // pointers stay in registers.
+    auto four = [=](const T* pa, const float* wa, const T* pb, const float* wb, const T* pc,
+                    const float* wc, const T* pd, const float* wd, float* d,
+                    auto oneChunk) __attribute__((always_inline)) {
         __m128 acc = _mm_setzero_ps();
         const int32_t last = decltype(oneChunk)::value ? 0 : chunks - 1;
         for (int32_t g = 0; g <= last; ++g) {
@@ -246,19 +243,32 @@ int32_t horizontal_fast(const Window& k, const T* row, int32_t i0, int32_t i1, i
             }
             acc = chunk_sums(ab, cd, acc, g == 0);
         }
-        _mm_storeu_ps(dst + o, acc);
+        _mm_storeu_ps(d, acc);
     };
+    // Four columns a step: their C * 4 outputs in groups of four.
+    auto columns = [=](int32_t i, auto oneChunk) __attribute__((always_inline)) {
+        const T* p0 = row + (int64_t)(x[i] + first) * C;
+        const T* p1 = row + (int64_t)(x[i + 1] + first) * C;
+        const T* p2 = row + (int64_t)(x[i + 2] + first) * C;
+        const T* p3 = row + (int64_t)(x[i + 3] + first) * C;
+        const float *w0 = cx + (int64_t)n * i, *w1 = w0 + n, *w2 = w1 + n, *w3 = w2 + n;
+        float* d = dst + (int64_t)C * i;
+        if (C == 1) {
+            four(p0, w0, p1, w1, p2, w2, p3, w3, d, oneChunk);
+        } else {
+            four(p0, w0, p0 + 1, w0, p0 + 2, w0, p1, w1, d, oneChunk);
+            four(p1 + 1, w1, p1 + 2, w1, p2, w2, p2 + 1, w2, d + 4, oneChunk);
+            four(p2 + 2, w2, p3, w3, p3 + 1, w3, p3 + 2, w3, d + 8, oneChunk);
+        }
+    };
+    const int32_t cols = end - i0;
     int32_t o = 0;
     if (chunks == 1) {
-        for (; o + 8 <= outs; o += 8) {
-            four(o, std::true_type{});
-            four(o + 4, std::true_type{});
-        }
-        for (; o + 4 <= outs; o += 4) four(o, std::true_type{});
+        for (; o + 4 <= cols; o += 4) columns(o, std::true_type{});
     } else {
-        for (; o + 4 <= outs; o += 4) four(o, std::false_type{});
+        for (; o + 4 <= cols; o += 4) columns(o, std::false_type{});
     }
-    return i0 + o / C;
+    return i0 + o;
 }
 
 // Floats [off, off + n) of the window's rows (logical row a lives in slot
