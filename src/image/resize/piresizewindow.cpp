@@ -279,17 +279,20 @@ void vertical(const Window& k, const uint8_t* rows, int64_t rowBytes, int32_t he
     using simd::vf32;
     constexpr int L = simd::Lanes<vf32>::count;
     const int32_t ny = k.ny;
-    // The rows in window order, on the stack for the usual short windows.
+    // The rows in window order and their weights, on the stack for the
+    // usual short windows.
     const float* local[16];
     auto row = [&](int32_t a) __attribute__((always_inline)) {
         if (ny <= 16) return local[a];
         const int32_t slot = head + a >= ny ? head + a - ny : head + a;
         return (const float*)(rows + slot * rowBytes) + off;
     };
+    vf32 cw[16];
     if (ny <= 16)
         for (int32_t a = 0; a < ny; ++a) {
             const int32_t slot = head + a >= ny ? head + a - ny : head + a;
             local[a] = (const float*)(rows + slot * rowBytes) + off;
+            cw[a] = simd::broadcast<vf32>(c[a]);
         }
     auto run = [&](int64_t i, int lanes) __attribute__((always_inline)) {
         auto ld = [&](int32_t a) __attribute__((always_inline)) {
@@ -297,7 +300,8 @@ void vertical(const Window& k, const uint8_t* rows, int64_t rowBytes, int32_t he
         };
         auto vp = [&](int32_t a) __attribute__((always_inline)) {
             const vf32 x0 = ld(a), x1 = ld(a + 1);
-            const vf32 c0 = simd::broadcast<vf32>(c[a]), c1 = simd::broadcast<vf32>(c[a + 1]);
+            const vf32 c0 = ny <= 16 ? cw[a] : simd::broadcast<vf32>(c[a]);
+            const vf32 c1 = ny <= 16 ? cw[a + 1] : simd::broadcast<vf32>(c[a + 1]);
 #if ZOR_HAS_FMA
             return simd::fma(x1, c1, x0 * c0);
 #else
