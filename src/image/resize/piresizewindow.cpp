@@ -265,8 +265,11 @@ int32_t horizontal_fast(const Window& k, const T* row, int32_t i0, int32_t i1, i
     int32_t o = 0;
     if (chunks == 1) {
         for (; o + 4 <= cols; o += 4) columns(o, std::true_type{});
+        // The last few again from four before the end: the same values.
+        if (o < cols && cols >= 4) columns(o = cols - 4, std::true_type{}), o = cols;
     } else {
         for (; o + 4 <= cols; o += 4) columns(o, std::false_type{});
+        if (o < cols && cols >= 4) columns(o = cols - 4, std::false_type{}), o = cols;
     }
     return i0 + o;
 }
@@ -345,13 +348,25 @@ template <typename T, int C> struct Engine {
         horizontal<T, C>(k, row, i, i1, Clamp{false, false}, out);
     }
 
-    void put_row(int32_t j, int32_t head, int32_t i0, int32_t i1) const {
-        vertical(k, k.t->rows, rowBytes, head, (int64_t)C * i0, k.cy + (int64_t)k.ny * j,
-                 row_at(dst, dstStep, j) + (int64_t)C * i0, (int64_t)C * (i1 - i0));
+    // A whole row: the side strips' columns clamped, the others not.
+    void row_pass(const T* row, Clamp cols, const ResizeStrips& st, float* out) const {
+        const int32_t w = k.t->w, mid0 = st.left, mid1 = w - st.right;
+        if (mid0 >= mid1) {
+            horizontal<T, C>(k, row, 0, w, cols, out);
+            return;
+        }
+        horizontal<T, C>(k, row, 0, mid0, cols, out);
+        filter(row, mid0, mid1, out);
+        horizontal<T, C>(k, row, mid1, w, cols, out);
+    }
+
+    void put_row(int32_t j, int32_t head) const {
+        vertical(k, k.t->rows, rowBytes, head, 0, k.cy + (int64_t)k.ny * j,
+                 row_at(dst, dstStep, j), (int64_t)C * k.t->w);
     }
 
     // A row of the top or bottom strip: its window's rows clamped on the
-    // sides with strips, the columns of the side strips clamped likewise.
+    // sides with strips.
     void strip_row(int32_t j, Clamp rows, Clamp cols, const ResizeStrips& st) const {
         const ResizeTile& t = *k.t;
         const int32_t lo = -t.shiftY, hi = (int32_t)k.s->axisY.srcLen - 1 - t.shiftY;
@@ -359,35 +374,21 @@ template <typename T, int C> struct Engine {
             int32_t y = t.localY[j] + 1 - k.ny / 2 + a;
             if (rows.low && y < lo) y = lo;
             if (rows.high && y > hi) y = hi;
-            const T* row = source_row(y);
-            const int32_t mid0 = st.left, mid1 = t.w - st.right;
-            horizontal<T, C>(k, row, 0, mid0 < mid1 ? mid0 : t.w, cols, slot(a));
-            if (mid0 < mid1) {
-                filter(row, mid0, mid1, slot(a));
-                horizontal<T, C>(k, row, mid1, t.w, cols, slot(a));
-            }
+            row_pass(source_row(y), cols, st, slot(a));
         }
-        put_row(j, 0, 0, t.w);
+        put_row(j, 0);
     }
 
-    // Columns [i0, i1) of a row between the strips, computed alone with
+    // The ring over the rows between the strips: logical row a (source row
+    // prev + 1 - ty + a) lives in slot (head + a) mod ny; a step of d rows
+    // turns head by d. The side strips' pixels come out of the same rows,
     // their columns clamped.
-    void side(int32_t j, int32_t i0, int32_t i1, Clamp cols) const {
+    void core(Clamp cols, const ResizeStrips& st) const {
         const ResizeTile& t = *k.t;
-        for (int32_t a = 0; a < k.ny; ++a)
-            horizontal<T, C>(k, source_row(t.localY[j] + 1 - k.ny / 2 + a), i0, i1, cols,
-                             slot(a));
-        put_row(j, 0, i0, i1);
-    }
-
-    // The ring over the core: logical row a (source row prev + 1 - ty + a)
-    // lives in slot (head + a) mod ny; a step of d rows turns head by d.
-    void core(const ResizeStrips& st) const {
-        const ResizeTile& t = *k.t;
-        const int32_t i0 = st.left, i1 = t.w - st.right, h = t.h - st.top - st.bottom;
-        const int32_t ty = k.ny / 2;
+        const int32_t h = t.h - st.top - st.bottom, ty = k.ny / 2;
         int32_t prev = t.localY[st.top], head = 0;
-        for (int32_t a = 0; a < k.ny; ++a) filter(source_row(prev + 1 - ty + a), i0, i1, slot(a));
+        for (int32_t a = 0; a < k.ny; ++a)
+            row_pass(source_row(prev + 1 - ty + a), cols, st, slot(a));
         for (int32_t j = st.top; j < st.top + h; ++j) {
             const int32_t y = t.localY[j];
             if (y > prev) {
@@ -395,11 +396,11 @@ template <typename T, int C> struct Engine {
                 head = (int32_t)((head + (int64_t)d) % k.ny);
                 for (int32_t a = k.ny - 1; a >= k.ny - d; --a) {
                     const int32_t sl = head + a >= k.ny ? head + a - k.ny : head + a;
-                    filter(source_row(y + 1 - ty + a), i0, i1, slot(sl));
+                    row_pass(source_row(y + 1 - ty + a), cols, st, slot(sl));
                 }
                 prev = y;
             }
-            put_row(j, head, i0, i1);
+            put_row(j, head);
         }
     }
 };
@@ -419,12 +420,8 @@ void run(const ResizeJob& job, const T* pSrc, int32_t srcStep, T* pDst, int32_t 
     const Engine<T, C> e{k, pSrc, srcStep, pDst, dstStep, tile_row_bytes(t, C)};
     const Clamp rows{st.top != 0, st.bottom != 0}, cols{st.left != 0, st.right != 0};
     for (int32_t j = 0; j < st.top; ++j) e.strip_row(j, rows, cols, st);
-    for (int32_t j = st.top; j < t.h - st.bottom; ++j) {
-        if (st.left) e.side(j, 0, st.left, cols);
-        if (st.right) e.side(j, t.w - st.right, t.w, cols);
-    }
     for (int32_t j = t.h - st.bottom; j < t.h; ++j) e.strip_row(j, rows, cols, st);
-    if (t.w - st.left - st.right >= 1 && t.h - st.top - st.bottom >= 1) e.core(st);
+    if (t.h - st.top - st.bottom >= 1) e.core(cols, st);
 }
 
 }  // namespace
