@@ -93,9 +93,10 @@ void horizontal(const Window& k, const T* row, int32_t i0, int32_t i1, Clamp c, 
 
 // ---- vector passes ------------------------------------------------------------------
 // The horizontal pass takes four outputs at a time (an output is a column
-// and channel), one 128-bit lane set per output and group of four taps:
-// the products' pair sums, then the group sums, come out in output order,
-// and each group is added to the running sums as the scalar pass does.
+// and channel) and a chunk of each one's taps per vector: four taps (one
+// group) in 128 bits, eight (two groups) on the AVX2 levels. The pair
+// sums, then the group sums, come out in output order, and each group is
+// added to the running sums as the scalar pass does.
 
 typedef __m128 v4;
 
@@ -105,13 +106,9 @@ inline v4 drop_odd_pairs(v4 v) {
     return _mm_or_ps(_mm_and_ps(v, keep), _mm_setr_ps(0.0f, -0.0f, 0.0f, -0.0f));
 }
 
-inline v4 pair_sums4(v4 xa, v4 ca, v4 xb, v4 cb) {  // [a01, a23, b01, b23]
-#if ZOR_HAS_FMA
-    const v4 even = _mm_shuffle_ps(_mm_mul_ps(xa, ca), _mm_mul_ps(xb, cb), 0x88);
-    return _mm_fmadd_ps(_mm_shuffle_ps(xa, xb, 0xDD), _mm_shuffle_ps(ca, cb, 0xDD), even);
-#else
+// [a01, a23, b01, b23] (the levels that fuse take eight-tap chunks).
+inline v4 pair_sums4(v4 xa, v4 ca, v4 xb, v4 cb) {
     return _mm_hadd_ps(_mm_mul_ps(xa, ca), _mm_mul_ps(xb, cb));
-#endif
 }
 
 // Four taps of one output from p (element index of the first tap).
@@ -217,9 +214,6 @@ int32_t horizontal_fast(const Window& k, const T* row, int32_t i0, int32_t i1, i
         --end;
     const vc keep = pairs_mask(lastPairs);
     const bool partial = 2 * lastPairs < kChunk;
-    // Four outputs from o on: the chunks of each, the last one's absent
-    // pairs dropped, added in order. Inlined, so the pointers stay in
-    // registers.
     const int32_t* x = t.localX + i0;
     const float* cx = k.cx + (int64_t)n * i0;
     float* dst = out + (int64_t)i0 * C;
